@@ -1,0 +1,45 @@
+# The commands of the project; see README.md. Each installs what it needs from Debian's packages.
+BUILD := build
+
+.PHONY: run test bench check format tidy asan release install clean
+
+run:            ## start the real receiving chain on loopback and show what it received
+	scripts/install-deps.sh build run
+	scripts/build.sh default
+	scripts/run-demo.sh $(BUILD)/default
+
+test:           ## build and run the whole suite
+	scripts/install-deps.sh build run test
+	scripts/build.sh default
+	ctest --preset default
+
+bench:          ## measure speed and memory, side by side
+	scripts/install-deps.sh build bench
+	scripts/build.sh bench
+	scripts/run-bench.sh $(BUILD)/bench
+
+check: format tidy asan  ## formatting, lint, sanitizers
+
+format:
+	scripts/install-deps.sh check
+	scripts/check-format.sh
+
+tidy:           ## clang's warnings and clang-tidy
+	scripts/install-deps.sh build run test check
+	scripts/build.sh tidy
+	scripts/run-tidy.sh $(BUILD)/tidy
+
+asan:           ## the suite under AddressSanitizer and UndefinedBehaviorSanitizer
+	scripts/install-deps.sh build run test
+	scripts/build.sh asan
+	ctest --preset asan
+
+release:
+	scripts/install-deps.sh build
+	scripts/build.sh release
+
+install: release
+	cmake --install $(BUILD)/release
+
+clean:
+	rm -rf $(BUILD)

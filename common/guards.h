@@ -1,0 +1,51 @@
+// Owners of the platform's C handles: adopt a handle on the line after the call that made it.
+//
+//     quor::Connection connection(QUORDBConnect(nullptr, nullptr, nullptr, path));
+//     quor::Result result;
+//     if (QUORDBExecute(connection.get(), sql, quor::Adopt(result)) < 0) return -1;
+#ifndef COMMON_GUARDS_H
+#define COMMON_GUARDS_H
+
+#include <cstdio>
+#include <cstdlib>
+#include <memory>
+
+#include "quor/quorcore.h"
+#include "quor/quordb.h"
+
+namespace quor {
+
+template <auto Release>
+struct Releaser {
+    template <typename T>
+    void operator()(T* handle) const {
+        (void)Release(handle);  // nothing can be done about a failed release
+    }
+};
+
+using Connection = std::unique_ptr<DBConnect_tag, Releaser<QUORDBClose>>;
+using Result = std::unique_ptr<DBResult_tag, Releaser<QUORDBFreeResult>>;
+using StringTable = std::unique_ptr<QLIBSZHASH, Releaser<QLIBCSzHashFree>>;
+using StringList = std::unique_ptr<QLIBSZLIST, Releaser<QLIBCSzListFree>>;
+using PlatformText = std::unique_ptr<char, Releaser<QLIBCStrPut>>;
+using File = std::unique_ptr<FILE, Releaser<fclose>>;
+using CText = std::unique_ptr<char, Releaser<free>>;
+
+// Lends a guard to a call that replaces the handle it points to; the guard owns whatever the call leaves there.
+template <typename Guard>
+class Adopt {
+  public:
+    explicit Adopt(Guard& guard) : guard_(guard), handle_(guard.release()) {}
+    Adopt(const Adopt&) = delete;
+    Adopt& operator=(const Adopt&) = delete;
+    ~Adopt() { guard_.reset(handle_); }
+    operator typename Guard::pointer *() { return &handle_; }  // NOLINT(google-explicit-constructor): used in calls
+
+  private:
+    Guard& guard_;
+    typename Guard::pointer handle_;
+};
+
+}  // namespace quor
+
+#endif

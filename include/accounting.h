@@ -1,0 +1,73 @@
+// Accounting of received logs: counts by device and samples of the log rate. Conventions: see common.h; failures are
+// reported through Debuger::MSG.
+#ifndef QUORSYSLOG_ACCOUNTING_H
+#define QUORSYSLOG_ACCOUNTING_H
+
+#include <cstdint>
+#include <list>
+#include <map>
+#include <memory>
+#include <string>
+
+#include "dbutil.h"
+#include "notification.h"
+
+#pragma GCC visibility push(default)
+
+// One row of the histogram.
+struct QUORLOG_LOG_DEVICE_STATISTIC {
+    std::string device;
+    unsigned long long count = 0;  // read from the database at start plus counted since
+};
+
+// Counts logs in memory and writes closed samples and the histogram to the accounting database.
+class AccountingManager {
+  public:
+    // Loads the notification rules and seeds the histogram from the accounting database; an unreadable one gives an
+    // empty histogram.
+    AccountingManager();
+    AccountingManager(const AccountingManager&) = delete;
+    AccountingManager& operator=(const AccountingManager&) = delete;
+    // Flushes once more. The open sample is never written.
+    ~AccountingManager();
+
+    // Sets the path of the accounting database. Always 0.
+    int ConfigLoad();
+    // Counts one log of `device`, after closing the open sample if the second has changed. Always 0.
+    int LogInc(std::string device);
+    // Closes the open sample if the second has changed and it counted anything; a closed sample is checked against the
+    // EPS rules. Always 0.
+    int CurEpsUpdate();
+    // Logs counted since construction.
+    unsigned long long TotalCountGet();
+    // Logs in the open sample.
+    unsigned long long CurrentEpsGet();
+    // True when more than 5 seconds passed since the previous question (not since the previous flush).
+    bool isNeed2Flush();
+    // A copy of the histogram, in the order in which the devices first appeared.
+    std::list<QUORLOG_LOG_DEVICE_STATISTIC> HistogramGet();
+
+    // Writes the closed samples and the histogram in one transaction; without a closed sample it does nothing (0).
+    // -1 keeps the samples for the next flush.
+    int AccoutingFlush2DB();
+    // Prints the counters as debug messages at a level that the sink drops.
+    void AccountingDump();
+
+  private:
+    struct DeviceIndex;
+
+    std::string dbPath_;
+    unsigned long long totalCount_ = 0;
+    long long epsStamp_ = 0;
+    unsigned long long curEps_ = 0;
+    std::map<std::string, int32_t> epsDeviceCount_;
+    int32_t lastFlushCheck_ = 0;
+    std::list<SYSLOG_LOG_EPS> epsList_;
+    std::list<QUORLOG_LOG_DEVICE_STATISTIC> histogram_;
+    NotificationManager notifier_;
+    std::unique_ptr<DeviceIndex> index_;  // finds the histogram rows of a device
+};
+
+#pragma GCC visibility pop
+
+#endif

@@ -1,0 +1,47 @@
+/* Notification service: templates, filter, delivery; and the settings of its channels in /etc/quorinfo.conf. */
+#ifndef QUOR_QUORNOTIFY_H
+#define QUOR_QUORNOTIFY_H
+
+#include "quorcore.h"
+
+#ifdef __cplusplus
+extern "C" {
+#endif
+
+#pragma GCC visibility push(default)
+
+/* Renders the template "<textsDir>/<tag>.txt" with the values of the table, applies the filter file, and hands the
+ * notice to the configured channels. Delivery goes on in a process of its own: the call never waits for a server, and 0
+ * says that the notice was accepted (or suppressed by the filter), not that it arrived. `flags` is not used. Negative
+ * for a missing template and when delivery cannot be started. */
+int QUORSysNotifySendNotificationCustomized(const char* tag, const char* textsDir, const char* filterFile,
+                                            QLIBSZHASH* values, int flags);
+
+typedef struct QUORMAIL_tag {
+    char server[256];     /* host name or address of the SMTP server */
+    char recipient[1024]; /* one or more addresses, separated by commas */
+    char sender[256];
+    char user[256]; /* empty: no login */
+    char password[256];
+    int port;
+    int security; /* 0 none, 1 STARTTLS, 2 TLS from the start */
+} QUORMAIL;
+
+/* Fills `mail` from the settings; a key that is absent leaves its default. Negative when they cannot be read. */
+int QUORMailGet(QUORMAIL* mail);
+
+typedef struct QUORSMSCONF_tag {
+    int enabled;
+} QUORSMSCONF;
+
+/* The SMS settings, null when they cannot be read. Release with QUORSmsConfFree(), which accepts null. */
+QUORSMSCONF* QUORSmsConfGet(void);
+void QUORSmsConfFree(QUORSMSCONF* conf);
+
+#pragma GCC visibility pop
+
+#ifdef __cplusplus
+}
+#endif
+
+#endif

@@ -1,0 +1,8 @@
+#!/bin/sh
+# Fails when a source file is not formatted as .clang-format says; --fix formats it.
+set -eu
+cd "$(dirname "$0")/.."
+mode="--dry-run --Werror"
+[ "${1:-}" = --fix ] && mode=-i
+# shellcheck disable=SC2086  # two words
+git ls-files -co --exclude-standard '*.cpp' '*.h' '*.c' | xargs clang-format-14 $mode

@@ -1,0 +1,37 @@
+#!/bin/sh
+# Installs the Debian packages of the named sets that are missing, through sudo when not root.
+# Usage: install-deps.sh SET...   sets: build run test bench check
+set -eu
+
+packages_of() {
+    case "$1" in
+    build) echo g++ cmake ninja-build pkg-config libsqlite3-dev sqlite3 libjsoncpp-dev \
+        libcurl4-openssl-dev libcli11-dev ;;
+    run) echo syslog-ng-core syslog-ng-mod-sql libdbd-sqlite3 bsdutils procps python3 python3-aiosmtpd ;;
+    test) echo libgtest-dev openssl ;;
+    bench) echo libbenchmark-dev ;;
+    check) echo clang-14 clang-format-14 clang-tidy-14 git ;;
+    *) echo "install-deps.sh: unknown set '$1'; use build, run, test, bench or check" >&2; return 1 ;;
+    esac
+}
+
+missing=
+for set in "$@"; do
+    for package in $(packages_of "$set"); do
+        dpkg-query -W -f '${Status}' "$package" 2> /dev/null | grep -q 'ok installed' || missing="$missing $package"
+    done
+done
+[ -n "$missing" ] || exit 0
+
+as_root=
+if [ "$(id -u)" -ne 0 ]; then
+    command -v sudo > /dev/null || {
+        echo "install-deps.sh: needs root to install:$missing; install sudo or run as root" >&2
+        exit 1
+    }
+    as_root=sudo
+fi
+echo "Installing:$missing"
+$as_root apt-get update -qq
+# shellcheck disable=SC2086  # a list of words
+$as_root env DEBIAN_FRONTEND=noninteractive apt-get install -y -qq --no-install-recommends $missing > /dev/null

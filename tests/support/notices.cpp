@@ -1,0 +1,29 @@
+#include "support/notices.h"
+
+#include "quor/quornotify.h"
+
+namespace quor::test {
+
+Notices& FakeNotices() {
+    static Notices notices;
+    return notices;
+}
+
+}  // namespace quor::test
+
+int QUORSysNotifySendNotificationCustomized(const char* tag, const char* textsDir, const char* filterFile,
+                                            QLIBSZHASH* values, int /*flags*/) {
+    quor::test::Notice notice{tag, textsDir, filterFile, {}};
+    for (const char* key : {"%HOST%", "%SEV%", "%KEYWORD%", "%EPS%", "%SYSLOG_CONTENT%", "%SHARED_FOLDER%", "%DBPATH%",
+                            "DESKTOP_NOTIFY_CLASSNAME"}) {
+        if (const char* value = QLIBCSzHashGetValue(values, key)) {
+            notice.values[key] = value;
+        }
+    }
+    quor::test::Notices& notices = quor::test::FakeNotices();
+    notices.sent.push_back(std::move(notice));
+    if (notices.onSend) {
+        notices.onSend();
+    }
+    return notices.fail ? -1 : 0;
+}

@@ -1,0 +1,56 @@
+// A database seen by SQLite itself, beside the code under test. Throws when a statement fails.
+#ifndef TESTS_SUPPORT_SQLITE_FILE_H
+#define TESTS_SUPPORT_SQLITE_FILE_H
+
+#include <sqlite3.h>
+
+#include <memory>
+#include <stdexcept>
+#include <string>
+#include <vector>
+
+namespace quor::test {
+
+class SqliteFile {
+  public:
+    // Creates the file when it is missing.
+    explicit SqliteFile(const std::string& path) {
+        sqlite3* handle = nullptr;
+        const int status = sqlite3_open(path.c_str(), &handle);
+        db_.reset(handle);
+        check(status);
+    }
+
+    // Any number of statements.
+    void run(const std::string& sql) { check(sqlite3_exec(db_.get(), sql.c_str(), nullptr, nullptr, nullptr)); }
+
+    // Every field of every row, in order; NULL as "NULL".
+    std::vector<std::string> query(const std::string& sql) {
+        std::vector<std::string> fields;
+        check(sqlite3_exec(db_.get(), sql.c_str(), append, &fields, nullptr));
+        return fields;
+    }
+
+  private:
+    static int append(void* fields, int count, char** values, char** /*names*/) {
+        for (int i = 0; i < count; ++i) {
+            static_cast<std::vector<std::string>*>(fields)->push_back(values[i] != nullptr ? values[i] : "NULL");
+        }
+        return 0;
+    }
+
+    void check(int status) {
+        if (status != SQLITE_OK) {
+            throw std::runtime_error(sqlite3_errmsg(db_.get()));
+        }
+    }
+
+    struct Closer {
+        void operator()(sqlite3* db) const { sqlite3_close(db); }
+    };
+    std::unique_ptr<sqlite3, Closer> db_;
+};
+
+}  // namespace quor::test
+
+#endif
