@@ -1,0 +1,49 @@
+// One statement on a connection of its own, as every call of the query layer runs it.
+#ifndef DBUTIL_QUERY_H
+#define DBUTIL_QUERY_H
+
+#include <string>
+
+#include "common/guards.h"
+#include "common/numbers.h"
+#include "dbutil.h"
+
+namespace quor {
+
+// Only absolute paths are taken.
+inline bool IsValidDbPath(const std::string& path) {
+    return !path.empty() && path.front() == '/';
+}
+
+// Owns the connection and what came back; the result goes before the connection.
+struct Query {
+    Connection connection;
+    Result result;
+
+    // False when the database cannot be opened.
+    bool connect(const std::string& path) {
+        connection.reset(QUORDBConnect(nullptr, nullptr, nullptr, path.c_str()));
+        return connection != nullptr;
+    }
+
+    // Negative on failure.
+    int execute(const std::string& sql) { return QUORDBExecute(connection.get(), sql.c_str(), Adopt(result)); }
+
+    // Through the wrapper's limited select, which takes the low 32 bits, when there is a limit.
+    int execute(const std::string& sql, const _SYSLOG_SQL_LIMIT_tag* limit) {
+        if (limit == nullptr) {
+            return execute(sql);
+        }
+        return QUORDBSelectLimit(connection.get(), sql.c_str(), static_cast<uint32_t>(limit->limit),
+                                 static_cast<uint32_t>(limit->offset), Adopt(result));
+    }
+
+    // NULL reads as the empty text.
+    const char* text(unsigned int row, const char* column) const {
+        return OrEmpty(QUORDBFetchField(result.get(), row, column));
+    }
+};
+
+}  // namespace quor
+
+#endif
