@@ -1,0 +1,31 @@
+#include "table.h"
+
+#include <new>
+
+#include "platform/guarded.h"
+
+QLIBSZHASH* QLIBCSzHashAlloc(int size) {
+    return quor::Guarded<QLIBSZHASH*>(nullptr, [size] { return size < 1 ? nullptr : new QLIBSZHASH; });
+}
+
+int QLIBCSzHashSetValue(QLIBSZHASH** hash, const char* key, const char* value) {
+    if (hash == nullptr || *hash == nullptr || key == nullptr || value == nullptr) {
+        return -1;
+    }
+    return quor::Guarded(-1, [&] {
+        (*hash)->set(key, value);
+        return 0;
+    });
+}
+
+const char* QLIBCSzHashGetValue(QLIBSZHASH* hash, const char* key) {
+    if (hash == nullptr || key == nullptr) {
+        return nullptr;
+    }
+    const auto found = hash->index.find(key);
+    return found != hash->index.end() ? found->second->value.c_str() : nullptr;
+}
+
+void QLIBCSzHashFree(QLIBSZHASH* hash) {
+    delete hash;
+}
