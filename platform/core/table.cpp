@@ -1,7 +1,5 @@
 #include "table.h"
 
-#include <new>
-
 #include "platform/guarded.h"
 
 QLIBSZHASH* QLIBCSzHashAlloc(int size) {
@@ -22,8 +20,8 @@ const char* QLIBCSzHashGetValue(QLIBSZHASH* hash, const char* key) {
     if (hash == nullptr || key == nullptr) {
         return nullptr;
     }
-    const auto found = hash->index.find(key);
-    return found != hash->index.end() ? found->second->value.c_str() : nullptr;
+    const QLIBSZHASH::Entry* found = hash->find(key);
+    return found != nullptr ? found->value.c_str() : nullptr;
 }
 
 void QLIBCSzHashFree(QLIBSZHASH* hash) {

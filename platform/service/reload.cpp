@@ -1,15 +1,12 @@
-#include <fcntl.h>
 #include <sys/types.h>
-#include <unistd.h>
 
-#include <array>
 #include <charconv>
 #include <csignal>
-#include <cstring>
 #include <string>
 #include <string_view>
 
 #include "common/paths.h"
+#include "platform/core/textfile.h"
 #include "platform/guarded.h"
 #include "quor/quorcore.h"
 #include "quor/quorservice.h"
@@ -29,14 +26,12 @@ bool isServiceName(std::string_view name) {
 
 // The number alone in the file; 0 for anything else.
 pid_t readPid(const std::string& path) {
-    const int file = open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK);
-    if (file < 0) {
+    constexpr size_t kLimit = 32;
+    std::string text;
+    if (quor::ReadTextFile(path, kLimit, text) != quor::ReadOutcome::Done) {
         return 0;
     }
-    std::array<char, 32> text{};
-    const ssize_t length = read(file, text.data(), text.size());
-    close(file);
-    const char* const end = text.data() + (length > 0 ? length : 0);
+    const char* const end = text.data() + text.size();
     pid_t pid = 0;
     const auto number = std::from_chars(text.data(), end, pid);
     const bool alone = number.ec == std::errc{} && (number.ptr == end || *number.ptr == '\n');

@@ -30,17 +30,22 @@ void QLIBCSzHashFree(QLIBSZHASH* hash);
 QLIBSZLIST* QLIBCSzListAlloc(int size);
 void QLIBCSzListFree(QLIBSZLIST* list);
 
-/* Section files: "[name]" headers, key="value" lines (a value without quotes is read too; nothing is escaped inside the
- * quotes, the last quote of the line ends the value), "#" and ";" comments. */
+/* Section files: "[name]" headers, key="value" lines (a value without quotes is read too, without the blanks around it;
+ * nothing is escaped inside the quotes, the last quote of the line ends the value), "#" and ";" comment lines. Of
+ * several sections with one name, and of several lines with one key in a section, the first counts. Lines after a
+ * header that is not closed belong to no section; a line that is nothing of this is ignored. Line ends may be CRLF. A
+ * file with a zero byte, one above 1 MiB and anything but a regular file cannot be read. */
 
 /* Appends the section names to `*list` in file order. */
 int QLIBCFileEnumSection(const char* file, QLIBSZLIST** list);
 /* Puts the entries of a section into `*hash`. Negative when the file or the section is missing. */
 int QLIBCFileGetSection(const char* file, const char* section, QLIBSZHASH** hash);
-/* Writes `hash` as the section, renaming it to `newName`; everything else in the file stays. Entries are written with
- * `lineFormat`, a printf format of two strings. A missing file is created, a new section appended. The file is replaced
- * whole, keeping owner and mode, so a power cut leaves the old or the new one. A name, key or value that cannot be read
- * back (a newline in it, for instance) is refused and nothing changes. */
+/* Writes `hash` as the section, renaming it to `newName`, which no other section may have. Entries keep their places in
+ * the section, new ones follow the last, others go; everything else in the file stays as it is, byte for byte. A
+ * missing file is created (mode 0644), a new section appended. `lineFormat` is one line with two "%s", for key and
+ * value, and no other "%". The file is replaced whole, keeping owner, mode and a symbolic link to it, so a power cut
+ * leaves the old or the new one. What would not read back the same (a newline in a value, for instance) is refused and
+ * nothing changes. */
 int QLIBCFileSetSection(const char* file, const char* section, const char* newName, QLIBSZHASH* hash,
                         const char* lineFormat);
 /* Copies the value of the first line with this key, in any section or none, to `out`, truncated to fit. `flags` is not
