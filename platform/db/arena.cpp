@@ -1,0 +1,148 @@
+#include "arena.h"
+
+#include <unistd.h>
+
+#include <algorithm>
+#include <cstdlib>
+#include <cstring>
+#include <new>
+
+namespace quor {
+namespace {
+
+constexpr size_t kFirstChunk = 16U << 10U;  // a page of a search
+constexpr size_t kLargestChunk = 4U << 20U;
+constexpr uint64_t kMemoryBudget = 64U << 20U;
+constexpr uint64_t kShareOfMemory = 16;  // on a small machine
+
+uint64_t memoryBudget() {
+    const auto pages = static_cast<uint64_t>(sysconf(_SC_PHYS_PAGES));
+    const auto pageSize = static_cast<uint64_t>(sysconf(_SC_PAGESIZE));
+    return std::min(kMemoryBudget, pages * pageSize / kShareOfMemory);
+}
+
+char* resize(char* memory, size_t size) {
+    void* moved = realloc(memory, size);
+    if (moved == nullptr) {
+        throw std::bad_alloc();
+    }
+    return static_cast<char*>(moved);
+}
+
+}  // namespace
+
+Arena::~Arena() {
+    for (size_t i = 0; i < chunks_.size() && !inFile(i); ++i) {
+        free(chunks_[i].data);
+    }
+    free(buffer_);
+}
+
+bool Arena::grow(size_t kept, size_t size) {
+    if (size > UINT32_MAX) {
+        return false;
+    }
+    if (!chunks_.empty() && chunks_.back().used == 0) {
+        enlarge(size);
+        return true;
+    }
+    if (buffer_ != nullptr) {
+        return moveToFile(kept, size);
+    }
+    addChunk(kept, size);
+    return true;
+}
+
+// Larger and larger, so that a small result stays small.
+void Arena::addChunk(size_t kept, size_t size) {
+    const size_t next =
+        chunks_.empty() ? kFirstChunk : std::min<size_t>(kLargestChunk, chunks_.back().size * size_t{2});
+    const size_t taken = std::max(size, next);
+    chunks_.reserve(chunks_.size() + 1);
+    char* data = resize(nullptr, taken);
+    if (kept > 0) {
+        memcpy(data, end_, kept);
+    }
+    if (memory_ + taken > memoryBudget()) {
+        firstInFile_ = chunks_.size();
+        buffer_ = data;
+    }
+    memory_ += taken;
+    chunks_.push_back({data, 0, static_cast<uint32_t>(taken)});
+    end_ = data;
+    room_ = taken;
+}
+
+// The record is alone in its chunk.
+void Arena::enlarge(size_t size) {
+    Chunk& chunk = chunks_.back();
+    const size_t taken = std::max(size, std::min<size_t>(UINT32_MAX, chunk.size * size_t{2}));
+    char* data = resize(chunk.data, taken);
+    if (buffer_ != nullptr) {
+        buffer_ = data;
+    }
+    chunk.data = end_ = data;
+    chunk.size = static_cast<uint32_t>(taken);
+    room_ = taken;
+}
+
+// Writes the full buffer and starts the next chunk in it.
+bool Arena::moveToFile(size_t kept, size_t size) {
+    Chunk& full = chunks_.back();
+    if (!file_.write(buffer_, full.used)) {
+        return false;
+    }
+    memmove(buffer_, end_, kept);
+    full.data = nullptr;
+    chunks_.push_back({buffer_, 0, full.size});
+    end_ = buffer_;
+    room_ = chunks_.back().size;
+    return reserve(kept, size);
+}
+
+Arena::Position Arena::commit(size_t size) {
+    Chunk& chunk = chunks_.back();
+    const Position position{static_cast<uint32_t>(chunks_.size() - 1), chunk.used};
+    chunk.used += static_cast<uint32_t>(size);
+    end_ += size;
+    room_ -= size;
+    return position;
+}
+
+bool Arena::finish() {
+    if (chunks_.empty()) {
+        return true;
+    }
+    Chunk& last = chunks_.back();
+    if (buffer_ == nullptr) {
+        last.data = resize(last.data, std::max<size_t>(last.used, 1));
+        return true;
+    }
+    if (!file_.write(buffer_, last.used)) {
+        return false;
+    }
+    free(buffer_);
+    buffer_ = nullptr;
+    char* data = file_.map();
+    for (size_t i = firstInFile_; i < chunks_.size(); ++i) {
+        chunks_[i].data = data;
+        data += chunks_[i].used;
+    }
+    return chunks_[firstInFile_].data != nullptr;
+}
+
+Arena::Position Arena::after(Position position, size_t size) const {
+    position.offset += static_cast<uint32_t>(size);
+    if (position.offset == chunks_[position.chunk].used) {
+        return {position.chunk + 1, 0};
+    }
+    return position;
+}
+
+void Arena::leave(uint32_t chunk) const {
+    if (inFile(chunk)) {
+        file_.drop(chunks_[chunk].data, chunks_[chunk].used);
+    }
+}
+
+}  // namespace quor

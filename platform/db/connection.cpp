@@ -1,0 +1,54 @@
+// Opening and closing a database file, and its errors.
+#include "connection.h"
+
+#include <sys/stat.h>
+
+#include <memory>
+#include <new>
+#include <string>
+
+namespace {
+
+// How long a lock of another process is waited for: longer than any batch of the log writer takes.
+constexpr int kBusyMilliseconds = 4000;
+
+// SQLite takes some relative names for a URI or a database in memory.
+std::string plainName(const char* path) {
+    return path[0] == '/' ? path : std::string("./") + path;
+}
+
+bool isFile(const char* path) {
+    struct stat status {};
+    return stat(path, &status) == 0 && S_ISREG(status.st_mode);
+}
+
+}  // namespace
+
+DBConnect_tag* QUORDBConnect(const char* /*host*/, const char* /*user*/, const char* /*password*/,
+                             const char* path) try {
+    if (path == nullptr || !isFile(path)) {
+        return nullptr;
+    }
+    auto connection = std::make_unique<DBConnect_tag>();
+    // One thread at a time uses a connection. A file that cannot be written is opened for reading.
+    const int flags = SQLITE_OPEN_READWRITE | SQLITE_OPEN_NOMUTEX;
+    if (sqlite3_open_v2(plainName(path).c_str(), &connection->db, flags, nullptr) != SQLITE_OK) {
+        return nullptr;
+    }
+    sqlite3_busy_timeout(connection->db, kBusyMilliseconds);
+    return connection.release();
+} catch (const std::bad_alloc&) {
+    return nullptr;
+}
+
+void QUORDBClose(DBConnect_tag* connection) {
+    delete connection;
+}
+
+const char* QUORDBErrorGet(DBConnect_tag* connection) {
+    return connection != nullptr ? sqlite3_errmsg(connection->db) : "no database connection";
+}
+
+void* QUORDBInternalDBHdlGet(DBConnect_tag* connection) {
+    return connection != nullptr ? connection->db : nullptr;
+}

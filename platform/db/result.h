@@ -1,0 +1,47 @@
+// A result complete in itself: every row one record of the arena, found by its number.
+#ifndef PLATFORM_DB_RESULT_H
+#define PLATFORM_DB_RESULT_H
+
+#include <sqlite3.h>
+
+#include <cstdint>
+#include <string>
+#include <vector>
+
+#include "arena.h"
+#include "quor/quordb.h"
+
+struct DBResult_tag {
+  public:
+    // ---- building: the columns first, then each row of the statement, then finish()
+    void setColumns(sqlite3_stmt* statement);
+    // False when there is no room for the row.
+    bool append(sqlite3_stmt* statement);
+    bool finish();
+
+    // ---- reading
+    uint32_t rows() const { return rows_; }
+    bool next(uint32_t& row);
+    const char* field(uint32_t row, const char* column);
+
+  private:
+    using Position = quor::Arena::Position;
+
+    template <typename Offset>
+    bool write(sqlite3_stmt* statement, size_t& size);
+    int columnNumber(const char* name);
+    const char* record(uint32_t row);
+    void moveTo(Position position);
+
+    std::vector<std::string> names_;
+    std::vector<uint16_t> successors_;  // the column that was asked for after this one
+    size_t lastColumn_ = 0;
+    quor::Arena arena_;
+    std::vector<Position> marks_;  // of every 64th row
+    uint32_t rows_ = 0;
+    uint32_t next_ = 0;
+    uint32_t current_ = 0;  // the row that was asked for last, and where it stands
+    Position position_;
+};
+
+#endif

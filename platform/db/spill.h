@@ -1,0 +1,33 @@
+// A temporary file without a name, for a result that memory should not hold.
+#ifndef PLATFORM_DB_SPILL_H
+#define PLATFORM_DB_SPILL_H
+
+#include <cstddef>
+#include <cstdint>
+
+namespace quor {
+
+class SpillFile {
+  public:
+    SpillFile() = default;
+    SpillFile(const SpillFile&) = delete;
+    SpillFile& operator=(const SpillFile&) = delete;
+    ~SpillFile();
+
+    // Appends, creating the file when it is first needed. False when there is no room for it.
+    bool write(const char* data, size_t size);
+    // The whole file in memory, read page by page when it is touched; null when it does not fit the address space.
+    // It stays until the destructor runs, and nothing can be appended any more.
+    char* map();
+    // Gives the memory of a part back; it is read again when it is touched.
+    void drop(const char* data, size_t size) const;
+
+  private:
+    int file_ = -1;
+    uint64_t size_ = 0;
+    char* map_ = nullptr;
+};
+
+}  // namespace quor
+
+#endif

@@ -1,0 +1,265 @@
+#include <gtest/gtest.h>
+#include <sqlite3.h>
+#include <sys/resource.h>
+#include <unistd.h>
+
+#include <climits>
+#include <csignal>
+#include <cstring>
+#include <string>
+#include <thread>
+#include <vector>
+
+#include "common/guards.h"
+#include "support/sqlite_file.h"
+#include "support/temp_folder.h"
+
+namespace {
+
+using quor::Adopt;
+using quor::Connection;
+using quor::Result;
+
+class Database : public ::testing::Test {
+  protected:
+    Database() {
+        file_.run("CREATE TABLE t(id INTEGER PRIMARY KEY, name TEXT); INSERT INTO t(name) VALUES('a'), ('b'), ('c');");
+        connection_ = connect(path_);
+    }
+
+    static Connection connect(const std::string& path) {
+        return Connection(QUORDBConnect(nullptr, nullptr, nullptr, path.c_str()));
+    }
+
+    int execute(const std::string& sql) {
+        result_.reset();
+        return QUORDBExecute(connection_.get(), sql.c_str(), Adopt(result_));
+    }
+
+    int selectLimit(const std::string& sql, unsigned int count, unsigned int skip) {
+        result_.reset();
+        return QUORDBSelectLimit(connection_.get(), sql.c_str(), count, skip, Adopt(result_));
+    }
+
+    int errorCode() { return sqlite3_errcode(static_cast<sqlite3*>(QUORDBInternalDBHdlGet(connection_.get()))); }
+
+    std::string field(unsigned int row, const char* column) {
+        const char* text = QUORDBFetchField(result_.get(), row, column);
+        return text != nullptr ? text : "NULL";
+    }
+
+    std::string names() {
+        std::string all;
+        unsigned int row = 0;
+        while (QUORDBFetchRow(result_.get(), &row) >= 0) {
+            all += field(row, "name");
+        }
+        return all;
+    }
+
+    quor::test::TempFolder folder_;
+    std::string path_ = folder_.path("logs.db");
+    quor::test::SqliteFile file_{path_};
+    Connection connection_;
+    Result result_;
+};
+
+TEST_F(Database, OnlyAnExistingFileIsOpened) {
+    for (const std::string& path : {std::string(), folder_.path(), folder_.path("absent.db"), std::string(":memory:"),
+                                    "file:" + path_, path_ + "?mode=ro"}) {
+        EXPECT_EQ(connect(path), nullptr) << path;
+    }
+    EXPECT_EQ(access(folder_.path("absent.db").c_str(), F_OK), -1);
+    EXPECT_EQ(QUORDBConnect(nullptr, nullptr, nullptr, nullptr), nullptr);
+    EXPECT_NE(connect(folder_.write("damaged.db", "not a database")), nullptr);  // noticed when it is read
+}
+
+TEST_F(Database, OneStatementIsRunAndNothingBehindIt) {
+    for (const char* sql : {"DELETE FROM t WHERE id=1; DROP TABLE t", "SELECT 1;;/* */ -- x\n DELETE FROM t",
+                            "DELETE FROM t;\xEF\xBB\xBF 2", "SELECT 1; x", "DELETE FROM t; '"}) {
+        EXPECT_LT(execute(sql), 0) << sql;
+        EXPECT_EQ(result_, nullptr);
+        EXPECT_EQ(errorCode(), SQLITE_ERROR) << sql;
+        EXPECT_STREQ(QUORDBErrorGet(connection_.get()), "only one statement can be run at a time");
+        EXPECT_LT(QUORDBExecute(connection_.get(), sql, nullptr), 0) << sql;
+        EXPECT_LT(selectLimit(sql, 1, 0), 0) << sql;
+    }
+    EXPECT_EQ(file_.query("SELECT count(*) FROM t"), std::vector<std::string>{"3"});
+    EXPECT_EQ(execute("SELECT name FROM t;; /* end */ ; -- of it"), 0);
+    EXPECT_EQ(names(), "abc");
+}
+
+TEST_F(Database, FailureLeavesTheErrorOnTheConnection) {
+    const struct {
+        const char* sql;
+        int code;
+        const char* text;
+    } cases[] = {
+        {"", SQLITE_EMPTY, "empty statement"},
+        {" -- nothing\n;", SQLITE_EMPTY, "empty statement"},
+        {"SELECT * FROM absent", SQLITE_ERROR, "no such table: absent"},
+        {"SELECT 'open", SQLITE_ERROR, "unrecognized token: \"'open\""},
+        {"SELECT abs(-9223372036854775807 - 1)", SQLITE_ERROR, "integer overflow"},
+        {"INSERT INTO t(id) VALUES(1)", SQLITE_CONSTRAINT, "UNIQUE constraint failed: t.id"},
+    };
+    for (const auto& c : cases) {
+        EXPECT_LT(execute(c.sql), 0) << c.sql;
+        EXPECT_EQ(errorCode(), c.code) << c.sql;
+        EXPECT_STREQ(QUORDBErrorGet(connection_.get()), c.text);
+    }
+    EXPECT_EQ(execute("SELECT * FROM t"), 0);  // the connection is still good
+}
+
+TEST_F(Database, LimitStandsInFrontOfWhateverEndsTheText) {
+    const struct {
+        const char* sql;
+        unsigned int count;
+        unsigned int skip;
+        const char* names;
+    } cases[] = {
+        {"SELECT name FROM t", 2, 0, "ab"},
+        {"SELECT name FROM t;", 2, 1, "bc"},
+        {"SELECT name FROM t -- to the end", 1, 1, "b"},
+        {"SELECT name FROM t /* not closed", 1, 0, "a"},
+        {" ;SELECT name FROM t; /* ; */ ;", 1, 2, "c"},
+        {"SELECT name FROM t WHERE name != ';--/*' AND \"name\" <> '''' ORDER BY [name] DESC", 2, 0, "cb"},
+        {"SELECT name FROM t", 0, 0, "abc"},
+        {"SELECT name FROM t", 0, 2, "c"},
+        {"SELECT name FROM t", UINT_MAX, UINT_MAX, ""},
+    };
+    for (const auto& c : cases) {
+        EXPECT_EQ(selectLimit(c.sql, c.count, c.skip), 0) << c.sql;
+        EXPECT_EQ(names(), c.names) << c.sql << " " << c.count << " " << c.skip;
+    }
+    EXPECT_LT(selectLimit("SELECT name FROM t LIMIT 1", 2, 0), 0);
+    EXPECT_LT(selectLimit("", 2, 0), 0);
+}
+
+TEST_F(Database, FieldsAreSqlitesOwnText) {
+    file_.run("CREATE TABLE v(a, b, c); PRAGMA encoding");
+    const std::string values =
+        "NULL, '', -9223372036854775808, 9223372036854775807, 0.1, 1e300, -1e999, x'00ff', 'a' || char(0) || 'b', "
+        "CAST(x'fffe41' AS TEXT), char(0x20ac), x''";
+    ASSERT_EQ(execute("WITH v(a,b,c,d,e,f,g,h,i,j,k,l) AS (VALUES(" + values + ")) SELECT * FROM v"), 0);
+    const char* expected[] = {"NULL", "",  "-9223372036854775808", "9223372036854775807", "0.1", "1.0e+300", "-Inf",
+                              "",     "a", "\xff\xfe\x41",         "\xe2\x82\xac",        ""};
+    for (size_t i = 0; i < std::size(expected); ++i) {
+        EXPECT_EQ(field(0, std::string(1, static_cast<char>('a' + i)).c_str()), expected[i]) << i;
+    }
+    EXPECT_EQ(std::string(QUORDBFetchField(result_.get(), 0, "h"), 3), std::string("\0\xff\0", 3));
+}
+
+TEST_F(Database, NonsenseFailsAndNeverCrashes) {
+    unsigned int row = 0;
+    char out[8];
+    EXPECT_LT(QUORDBExecute(nullptr, "SELECT 1", nullptr), 0);
+    EXPECT_LT(QUORDBExecute(connection_.get(), nullptr, Adopt(result_)), 0);
+    EXPECT_LT(QUORDBSelectLimit(nullptr, "SELECT 1", 1, 0, nullptr), 0);
+    EXPECT_LT(QUORDBSelectLimit(connection_.get(), nullptr, 1, 0, nullptr), 0);
+    EXPECT_LT(QUORDBFetchRow(nullptr, &row), 0);
+    EXPECT_EQ(QUORDBFetchField(nullptr, 0, "name"), nullptr);
+    EXPECT_EQ(QUORDBNumRows(nullptr), 0);
+    EXPECT_EQ(QUORDBInternalDBHdlGet(nullptr), nullptr);
+    EXPECT_NE(QUORDBErrorGet(nullptr), nullptr);
+    EXPECT_LT(QUORDBEscapeStringEX(nullptr, nullptr, 8, "a", 1), 0);
+    EXPECT_LT(QUORDBEscapeStringEX2(nullptr, out, 8, nullptr, 1), 0);
+    EXPECT_LT(QUORDBEscapeBackslashEX2(nullptr, out, 0, "a"), 0);
+    QUORDBFreeResult(nullptr);
+    QUORDBClose(nullptr);
+
+    ASSERT_EQ(execute("SELECT * FROM t"), 0);
+    EXPECT_LT(QUORDBFetchRow(result_.get(), nullptr), 0);
+    for (const char* column : {"nam", "names", "NAME", "", static_cast<const char*>(nullptr)}) {
+        EXPECT_EQ(QUORDBFetchField(result_.get(), 0, column), nullptr);
+    }
+    EXPECT_EQ(QUORDBFetchField(result_.get(), 3, "name"), nullptr);
+    EXPECT_EQ(QUORDBFetchField(result_.get(), UINT_MAX, "name"), nullptr);
+}
+
+TEST_F(Database, StatementWithoutRowsHasAnEmptyResult) {
+    for (const char* sql : {"INSERT INTO t(name) VALUES('d')", "SELECT name FROM t WHERE 0", "CREATE TABLE u(a)"}) {
+        ASSERT_EQ(execute(sql), 0) << sql;
+        EXPECT_EQ(QUORDBNumRows(result_.get()), 0);
+        EXPECT_EQ(names(), "");
+        EXPECT_EQ(QUORDBFetchField(result_.get(), 0, "name"), nullptr);
+    }
+    EXPECT_EQ(QUORDBExecute(connection_.get(), "DELETE FROM t RETURNING id", nullptr), 0);
+    EXPECT_EQ(file_.query("SELECT count(*) FROM t"), std::vector<std::string>{"0"});
+}
+
+TEST_F(Database, ResultOutlivesItsConnectionAndSchema) {
+    ASSERT_EQ(execute("SELECT * FROM t"), 0);
+    file_.run("ALTER TABLE t ADD COLUMN more DEFAULT 'new'");
+    Result first = std::move(result_);
+    ASSERT_EQ(execute("SELECT * FROM t"), 0);
+    connection_.reset();
+    EXPECT_EQ(QUORDBFetchField(first.get(), 0, "more"), nullptr);
+    EXPECT_EQ(field(2, "more") + field(2, "name"), "newc");
+}
+
+TEST_F(Database, LockedDatabaseIsWaitedForThenFails) {
+    file_.run("BEGIN IMMEDIATE");
+    std::thread writer([this] {
+        usleep(200'000);
+        file_.run("COMMIT");
+    });
+    EXPECT_EQ(execute("INSERT INTO t(name) VALUES('d')"), 0);
+    writer.join();
+    file_.run("BEGIN IMMEDIATE");
+    EXPECT_LT(execute("INSERT INTO t(name) VALUES('e')"), 0);
+    EXPECT_EQ(errorCode(), SQLITE_BUSY);
+}
+
+// Rows of every shape, more than memory holds: read in order, at random, by names in another order.
+TEST_F(Database, AnySizeOfResultIsReadBackWhole) {
+    constexpr unsigned int kRows = 400'000;
+    ASSERT_EQ(execute("WITH RECURSIVE n(i) AS (SELECT 0 UNION ALL SELECT i + 1 FROM n LIMIT 400000) SELECT i, "
+                      "CASE i % 100000 WHEN 7 THEN hex(zeroblob(5000000)) WHEN 8 THEN hex(zeroblob(40000)) ELSE "
+                      "printf('%0200d', i) END AS text, i AS last FROM n"),
+              0);
+    ASSERT_EQ(QUORDBNumRows(result_.get()), static_cast<int>(kRows));
+    const auto lengthOf = [](unsigned int i) -> size_t {
+        return i % 100'000 == 7 ? 10'000'000 : i % 100'000 == 8 ? 80'000 : 200;
+    };
+    const char* early = QUORDBFetchField(result_.get(), 399'999, "last");
+    for (unsigned int i = 0; i < kRows; ++i) {
+        ASSERT_EQ(field(i, "last"), std::to_string(i));
+        ASSERT_EQ(strlen(QUORDBFetchField(result_.get(), i, "text")), lengthOf(i));
+    }
+    for (unsigned int i = 13; i != 0; i = i * 7919 % kRows, i = i == 13 ? 0 : i) {
+        ASSERT_EQ(field(i, "i"), std::to_string(i));
+    }
+    EXPECT_STREQ(early, "399999");
+}
+
+TEST_F(Database, FullTemporaryFolderIsAFailure) {
+    (void)signal(SIGXFSZ, SIG_IGN);
+    rlimit before{};
+    getrlimit(RLIMIT_FSIZE, &before);
+    const rlimit small{1U << 20U, before.rlim_max};
+    setrlimit(RLIMIT_FSIZE, &small);
+    EXPECT_LT(execute("WITH RECURSIVE n(i) AS (SELECT 0 UNION ALL SELECT i + 1 FROM n LIMIT 20) SELECT "
+                      "hex(zeroblob(4000000)) FROM n"),
+              0);
+    setrlimit(RLIMIT_FSIZE, &before);
+    EXPECT_EQ(result_, nullptr);
+    EXPECT_EQ(errorCode(), SQLITE_FULL);
+    EXPECT_EQ(execute("SELECT * FROM t"), 0);
+}
+
+TEST(Escape, DoublesQuotesAndMarksWildcards) {
+    const std::string zero("a\0'b", 4);
+    char out[16];
+    EXPECT_EQ(QUORDBEscapeStringEX(nullptr, out, 16, "O'N''eil\n\xff", 10), 0);
+    EXPECT_STREQ(out, "O''N''''eil\n\xff");
+    EXPECT_EQ(QUORDBEscapeStringEX2(nullptr, out, 9, zero.data(), 4), 0);
+    EXPECT_STREQ(out, "a");
+    EXPECT_EQ(QUORDBEscapeBackslashEX2(nullptr, out, 16, "a\\%_*?'"), 0);
+    EXPECT_STREQ(out, "a\\\\\\%\\_*?'");
+    EXPECT_EQ(QUORDBEscapeStringEX(nullptr, out, 5, "''", 2), 0);  // twice the length plus one
+    EXPECT_STREQ(out, "''''");
+    EXPECT_LT(QUORDBEscapeStringEX(nullptr, out, 4, "''", 2), 0);
+    EXPECT_STREQ(out, "");
+}
+
+}  // namespace
