@@ -88,9 +88,9 @@ class DBHandler {
     int DBInfoDevSet(std::string device);
 
   private:
-    int TranStatement(const char* name, const char* statement, int wanted, const char* failure);
-    long long LogTimeGet(const char* order);
-    int UpdateInfo(const std::string& assignment);
+    int TranStatement(const char* operation, const char* statement, int32_t afterwards, const char* failure);
+    long long LogTimeGet(const char* direction);
+    int UpdateInfo(const std::string& column, const std::string& value);
 
     std::string schemaPath_;
     std::string dbPath_;

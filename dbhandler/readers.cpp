@@ -1,0 +1,57 @@
+#include "dbhandler/readers.h"
+
+#include "common/numbers.h"
+#include "dbhandler.h"
+#include "quor/quordb.h"
+
+namespace quor {
+namespace {
+
+// The first row, or nothing.
+class FirstRow {
+  public:
+    explicit FirstRow(DBResult_tag* result) : result_(result), found_(QUORDBFetchRow(result, &row_) >= 0) {}
+    explicit operator bool() const { return found_; }
+    const char* operator[](const char* column) const { return OrEmpty(QUORDBFetchField(result_, row_, column)); }
+
+  private:
+    DBResult_tag* result_;
+    unsigned int row_ = 0;
+    bool found_;
+};
+
+}  // namespace
+
+int ReadTime(DBResult_tag* result, void* info) {
+    const FirstRow row(result);
+    if (!row) {
+        return -1;
+    }
+    static_cast<_ARCH_DB_INFO_tag*>(info)->start_time = ToInt32(row["utcsec"]);
+    return 0;
+}
+
+int ReadCount(DBResult_tag* result, void* info) {
+    const FirstRow row(result);
+    if (!row) {
+        return -1;
+    }
+    const int64_t count = ToInt32(row["count_result"]);
+    static_cast<_ARCH_DB_INFO_tag*>(info)->log_count = static_cast<uint64_t>(count);
+    return 0;
+}
+
+int ReadInfo(DBResult_tag* result, void* info) {
+    const FirstRow row(result);
+    if (!row) {
+        return -1;
+    }
+    auto& target = *static_cast<_ARCH_DB_INFO_tag*>(info);
+    target.start_time = ToInt32(row["start_time"]);
+    target.end_time = ToInt32(row["end_time"]);
+    target.log_count = ToUint64(row["log_count"]);
+    target.device = row["device"];
+    return 0;
+}
+
+}  // namespace quor

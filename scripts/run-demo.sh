@@ -1,0 +1,92 @@
+#!/usr/bin/env bash
+# Starts the receiving chain on loopback, sends it messages, and shows what came of them.
+# Usage: run-demo.sh BUILD_FOLDER       ONCE=1: end by itself, with status 0 when everything sent was found again.
+set -euo pipefail
+cd "$(dirname "$0")/.."
+. scripts/demo/messages.sh
+
+build=$(cd "$1" && pwd)
+root=$build/root
+port=${QUOR_DEMO_PORT:-15514}
+framed_port=$((port + 1))
+smtp_port=$((port + 2))
+db=$root/var/log/quorlog/syslog.db
+rules=$root/etc/quorsyslog/notify.conf
+mails=$root/mails.txt
+quorlog=$build/tools/quorlog/quorlog
+children=()
+
+say() { printf '\n\033[1m%s\033[0m\n' "$*"; }
+show() {
+    say "\$ quorlog $*"
+    "$quorlog" "$@"
+}
+fail() {
+    echo "run-demo.sh: $*" >&2
+    exit 1
+}
+
+stop() {
+    for child in "${children[@]}"; do kill "$child" 2> /dev/null || true; done
+    for child in "${children[@]}"; do wait "$child" 2> /dev/null || true; done
+    children=()
+}
+trap stop EXIT
+
+# Polls a condition for at most 20 seconds.
+await() {
+    local what=$1
+    shift
+    for _ in $(seq 200); do
+        if "$@" > /dev/null 2>&1; then return 0; fi
+        sleep 0.1
+    done
+    fail "$what did not happen within 20 seconds; see $root/syslog-ng.log"
+}
+listening() { (exec 3<> "/dev/tcp/127.0.0.1/$1") 2> /dev/null; }
+
+fresh_root() {
+    rm -rf "$root/var/log" "$root/var/spool" "$root/usr/quor/etc" "$root/etc" "$root/run" "$mails"
+    mkdir -p "$root/var/log/quorlog" "$root/etc/quorsyslog" "$root/etc/syslog-ng" "$root/run"
+    cp etc/notify.filter "$root/etc/quorsyslog/notify.filter"
+    cp scripts/demo/notify.conf "$rules"
+    sed "s/@PORT@/$smtp_port/" scripts/demo/quorinfo.conf > "$root/etc/quorinfo.conf"
+}
+
+start_mail_server() {
+    /usr/bin/python3 -u -m aiosmtpd -n -l "127.0.0.1:$smtp_port" -c aiosmtpd.handlers.Debugging stdout > "$mails" &
+    children+=($!)
+    await "the start of the mail server on port $smtp_port" listening "$smtp_port"
+}
+
+# The shipped configuration, with the values of this folder.
+start_syslog_ng() {
+    local conf=$root/etc/syslog-ng
+    sed -e "/^@define quor_address /s|\".*\"|\"127.0.0.1\"|" \
+        -e "/^@define quor_port /s|\".*\"|\"$port\"|" \
+        -e "/^@define quor_port_framed /s|\".*\"|\"$framed_port\"|" \
+        -e "/^@define quor_database /s|\".*\"|\"$db\"|" \
+        -e "/^@define quor_receiver /s|\".*\"|\"$build/tools/quorlogd/quorlogd\"|" \
+        etc/syslog-ng/quorsyslog.conf > "$conf/quorsyslog.conf"
+    printf '@version: 3.38\n@include "%s"\n' "$conf/quorsyslog.conf" > "$conf/syslog-ng.conf"
+    /usr/sbin/syslog-ng -F --no-caps -f "$conf/syslog-ng.conf" --persist-file "$root/run/syslog-ng.persist" \
+        --control "$root/run/syslog-ng.ctl" > "$root/syslog-ng.log" 2>&1 &
+    children+=($!)
+    echo $! > "$root/run/syslog-ng.pid"
+    await "the start of syslog-ng on port $port" listening "$port"
+}
+
+all_stored() { [ "$("$quorlog" count --db "$db" --from 1970-01-01 --format csv | tail -n 1)" -ge "${#sent[@]}" ]; }
+
+# Every message carries its number; each must come back by it.
+check_found() {
+    local missing=0
+    for token in "${sent[@]}"; do
+        "$quorlog" count --db "$db" --keyword "$token" > /dev/null || {
+            echo "not found: $token" >&2
+            missing=$((missing + 1))
+        }
+    done
+    [ "$missing" -eq 0 ] || fail "$missing of ${#sent[@]} messages were not found"
+    say "All ${#sent[@]} messages sent were found again."
+}

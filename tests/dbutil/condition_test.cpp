@@ -1,0 +1,61 @@
+#include <gtest/gtest.h>
+
+#include "dbutil.h"
+
+namespace {
+
+_SYSLOG_SQL_COND_tag cond(_SYSLOG_DB_ATTRI_tag attr, int op, const std::string& value) {
+    return {attr, op, value, {}};
+}
+
+std::string rendered(const _SYSLOG_SQL_COND_tag& condition) {
+    std::string text = "replaced";
+    EXPECT_EQ(SqlCondToStr(condition, text), 0);
+    return text;
+}
+
+}  // namespace
+
+TEST(Condition, EscapesTheValueForItsOperator) {
+    struct Case {
+        _SYSLOG_DB_ATTRI_tag attr;
+        int op;
+        const char* value;
+        const char* text;
+    };
+    for (const Case& c : {
+             Case{SYSLOG_ATTRI_HOST, 0, "ab", "(host = 'ab')"},
+             Case{SYSLOG_ATTRI_HOST, 1, "O'Neil", "(host != 'O''Neil')"},
+             Case{SYSLOG_ATTRI_HOST, 0, "a\\%_*?[]", "(host = 'a\\%_*?[]')"},
+             Case{SYSLOG_ATTRI_MSG, 6, "a*b", "(msg LIKE 'a%b' escape '\\')"},
+             Case{SYSLOG_ATTRI_MSG, 7, "50%_*?\\'", "(msg NOT LIKE '50\\%\\_%_\\\\''' escape '\\')"},
+             Case{SYSLOG_ATTRI_MSG, 8, "[x]", "(msg GLOB '[[]x[]]')"},
+             Case{SYSLOG_ATTRI_MSG, 9, "*e'r?", "(msg NOT GLOB '*e''r?')"},
+             Case{SYSLOG_ATTRI_MSG, 8, "**", "(msg GLOB '**')"},
+             Case{SYSLOG_ATTRI_ID, 4, "10", "(id > 10)"},
+             Case{SYSLOG_ATTRI_UTCSEC, 6, "1_*", "(utcsec LIKE 1\\_%)"},
+             Case{SYSLOG_ATTRI_ISDIR, 2, "1", "(isdir < '1')"},
+             Case{SYSLOG_ATTRI_XFERIP, 3, "", "(ip <= '')"},
+         }) {
+        EXPECT_EQ(rendered(cond(c.attr, c.op, c.value)), c.text);
+    }
+    EXPECT_EQ(CondValueEscape(nullptr), "");
+}
+
+TEST(Condition, JoinsAlternativesOneLevelDeep) {
+    _SYSLOG_SQL_COND_tag head = cond(SYSLOG_ATTRI_HOST, 0, "a");
+    head.orList = {cond(SYSLOG_ATTRI_HOST, 0, "b"), cond(SYSLOG_ATTRI_MSG, 6, "c")};
+    head.orList.front().orList = {cond(SYSLOG_ATTRI_HOST, 0, "never")};
+    EXPECT_EQ(rendered(head), "((host = 'a') OR (host = 'b') OR (msg LIKE 'c' escape '\\'))");
+}
+
+TEST(Condition, ListIsAppendedWithAndBetween) {
+    std::list<_SYSLOG_SQL_COND_tag> conds;
+    std::string text = "x ";
+    EXPECT_EQ(SqlCondListToStr(conds, text), 0);
+    EXPECT_EQ(text, "x ");
+
+    conds = {cond(SYSLOG_ATTRI_HOST, 0, "a"), cond(SYSLOG_ATTRI_FAC, 0, "kern")};
+    EXPECT_EQ(SqlCondListToStr(conds, text), 0);
+    EXPECT_EQ(text, "x (host = 'a') AND (fac = 'kern')");
+}
