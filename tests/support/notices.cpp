@@ -1,7 +1,5 @@
 #include "support/notices.h"
 
-#include "quor/quornotify.h"
-
 namespace quor::test {
 
 Notices& FakeNotices() {
@@ -26,4 +24,19 @@ int QUORSysNotifySendNotificationCustomized(const char* tag, const char* textsDi
         notices.onSend();
     }
     return notices.fail ? -1 : 0;
+}
+
+int QUORMailGet(QUORMAIL* mail) {
+    *mail = quor::test::FakeNotices().mail;
+    return quor::test::FakeNotices().mailUnreadable ? -1 : 0;
+}
+
+QUORSMSCONF* QUORSmsConfGet() {
+    quor::test::Notices& notices = quor::test::FakeNotices();
+    notices.smsLent += notices.smsUnreadable ? 0 : 1;
+    return notices.smsUnreadable ? nullptr : &notices.sms;
+}
+
+void QUORSmsConfFree(QUORSMSCONF* conf) {
+    quor::test::FakeNotices().smsLent -= conf != nullptr ? 1 : 0;
 }

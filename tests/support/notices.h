@@ -1,4 +1,5 @@
-// The notification service of the test program: notices are recorded, not delivered, and fail on demand.
+// The notification service of the test program: notices are recorded, not delivered, and fail on demand; the settings
+// of its channels are what the test says.
 #ifndef TESTS_SUPPORT_NOTICES_H
 #define TESTS_SUPPORT_NOTICES_H
 
@@ -6,6 +7,8 @@
 #include <map>
 #include <string>
 #include <vector>
+
+#include "quor/quornotify.h"
 
 namespace quor::test {
 
@@ -20,6 +23,12 @@ struct Notices {
     std::vector<Notice> sent;
     bool fail = false;
     std::function<void()> onSend;  // called for each notice, to look at the world at that moment
+
+    QUORMAIL mail{};
+    QUORSMSCONF sms{};
+    bool mailUnreadable = false;
+    bool smsUnreadable = false;
+    int smsLent = 0;  // settings that were not given back yet
 };
 
 Notices& FakeNotices();
