@@ -27,7 +27,7 @@ Magnitude readMagnitude(const char* text) {
     }
     for (; *text >= '0' && *text <= '9'; ++text) {
         const auto digit = static_cast<unsigned>(*text - '0');
-        number.overflow = number.overflow || number.value > (kMax - digit) / 10;
+        number.overflow = number.overflow || number.value > kMax / 10 || number.value * 10 > kMax - digit;
         number.value = number.overflow ? kMax : number.value * 10 + digit;
     }
     return number;
