@@ -2,6 +2,8 @@
 #ifndef DBUTIL_QUERY_H
 #define DBUTIL_QUERY_H
 
+#include <syslog.h>
+
 #include <string>
 
 #include "common/guards.h"
@@ -13,6 +15,15 @@ namespace quor {
 // Only absolute paths are taken.
 inline bool IsValidDbPath(const std::string& path) {
     return !path.empty() && path.front() == '/';
+}
+
+// The same with a report; `line` is the place that a reader of the system log knows the function by.
+inline bool CheckDbPath(const std::string& path, int line) {
+    if (!IsValidDbPath(path)) {
+        syslog(LOG_ERR, "%s:%d Invalid syslog db path!", "dbutil", line);
+        return false;
+    }
+    return true;
 }
 
 // Owns the connection and what came back; the result goes before the connection.
@@ -41,6 +52,20 @@ struct Query {
     // NULL reads as the empty text.
     const char* text(unsigned int row, const char* column) const {
         return OrEmpty(QUORDBFetchField(result.get(), row, column));
+    }
+
+    // Hands every row number to `visit`; false as soon as a counted row cannot be fetched.
+    template <typename Visit>
+    bool eachRow(Visit visit) const {
+        const int count = QUORDBNumRows(result.get());
+        for (int i = 0; i < count; ++i) {
+            unsigned int row = 0;
+            if (QUORDBFetchRow(result.get(), &row) < 0) {
+                return false;
+            }
+            visit(row);
+        }
+        return true;
     }
 };
 

@@ -14,15 +14,6 @@ constexpr const char kMatchAll[] = "(msg GLOB '**')";
 
 constexpr const char kLogs[] = "logs";
 
-// `line` is the place that a reader of the system log knows the function by.
-bool checkPath(const std::string& path, int line) {
-    if (quor::IsValidDbPath(path)) {
-        return true;
-    }
-    syslog(LOG_ERR, "%s:%d Invalid syslog db path!", "dbutil", line);
-    return false;
-}
-
 bool isUnfiltered(const std::string& where) {
     return where.empty() || where == kMatchAll;
 }
@@ -77,7 +68,7 @@ int walkRows(const quor::Query& query, std::string& table, RecordCallback callba
 
 int SyslogDBSelectByTable(std::string& dbPath, std::string& table, Conditions& conds, _SYSLOG_SQL_LIMIT_tag* limit,
                           _SYSLOG_SQL_ORDER_tag* order, RecordCallback callback, void* ctx, bool trim) {
-    if (!checkPath(dbPath, 464)) {
+    if (!quor::CheckDbPath(dbPath, 464)) {
         return -1;
     }
     std::string where;
@@ -107,7 +98,7 @@ int SyslogDBSelect(std::string& dbPath, Conditions& conds, _SYSLOG_SQL_LIMIT_tag
 int SyslogDBSelectCountByTable(std::string& dbPath, std::string& table, Conditions& conds, _SYSLOG_SQL_LIMIT_tag* limit,
                                _SYSLOG_SQL_ORDER_tag* order) {
     constexpr int kNotOneRow = -2;
-    if (!checkPath(dbPath, 573)) {
+    if (!quor::CheckDbPath(dbPath, 573)) {
         return -1;
     }
     std::string where;
@@ -134,7 +125,7 @@ int SyslogDBSelectCount(std::string& dbPath, Conditions& conds, _SYSLOG_SQL_LIMI
 }
 
 int SyslogDBDelete(std::string& dbPath, Conditions& conds) {
-    if (!checkPath(dbPath, 653)) {
+    if (!quor::CheckDbPath(dbPath, 653)) {
         return -1;
     }
     std::string where;
