@@ -1,0 +1,148 @@
+#include <algorithm>
+#include <string_view>
+
+#include "common.h"
+#include "common/numbers.h"
+#include "parser.h"
+
+namespace {
+
+// Takes the words of a text as strtok_r() does for a blank, without writing to it: like there, the text ends at its
+// first zero byte.
+class Words {
+  public:
+    explicit Words(const char* text) : next_(text) {}
+
+    // Each leaves `field` alone and answers false when no word is left.
+    bool take(std::string& field) {
+        const std::string_view word = nextWord();
+        if (!word.empty()) {
+            field.assign(word);
+        }
+        return !word.empty();
+    }
+    bool take(long long& field) {
+        const std::string_view word = nextWord();
+        if (!word.empty()) {
+            field = toNumber(word);
+        }
+        return !word.empty();
+    }
+    bool take(_SYSLOG_DB_PRIORITY_tag& field) {
+        const std::string word(nextWord());
+        if (!word.empty()) {
+            field = PriorStrToType(word.c_str());
+        }
+        return !word.empty();
+    }
+
+    // What follows the blank after the last word.
+    const char* rest() const { return next_; }
+
+  private:
+    std::string_view nextWord() {
+        while (*next_ == ' ') {
+            ++next_;
+        }
+        const char* const word = next_;
+        while (*next_ != ' ' && *next_ != '\0') {
+            ++next_;
+        }
+        const auto length = static_cast<size_t>(next_ - word);
+        if (*next_ == ' ') {
+            ++next_;
+        }
+        return {word, length};
+    }
+
+    // A number ends with its word, unless white space inside the word lets the conversion skip to the next one.
+    static long long toNumber(std::string_view word) {
+        return word.front() > ' ' ? quor::ToInt64(word.data()) : quor::ToInt64(std::string(word).c_str());
+    }
+
+    const char* next_;
+};
+
+}  // namespace
+
+LogParser::LogParser() = default;
+
+LogParser::~LogParser() = default;
+
+int LogParser::ParseSingleEntry(const std::string& entry, _SYSLOG_LOG_DATA_tag& record) {
+    Words words(entry.c_str());
+    const bool complete = words.take(record.fac) && words.take(record.prio) && words.take(record.ldate) &&
+                          words.take(record.ltime) && words.take(record.utcsec) && words.take(record.xsec) &&
+                          words.take(record.tzoffset) && words.take(record.host) && words.take(record.ip) &&
+                          words.take(record.prog) && words.take(record.tag);
+    if (!complete) {
+        return -1;
+    }
+    record.msg.assign(words.rest());
+    return 0;
+}
+
+std::list<std::string> LogParser::Tokenize(const std::string& text, const std::string& delimiters) {
+    std::list<std::string> pieces;
+    for (size_t end = 0, start = text.find_first_not_of(delimiters); start != std::string::npos;
+         start = text.find_first_not_of(delimiters, end)) {
+        end = std::min(text.find_first_of(delimiters, start), text.size());
+        pieces.emplace_back(text, start, end - start);
+    }
+    return pieces;
+}
+
+int LogParser::isValidLog(_SYSLOG_LOG_DATA_tag& record) {
+    const bool complete = !record.host.empty() && !record.ip.empty() && !record.ldate.empty() &&
+                          !record.ltime.empty() && !record.prog.empty() && !record.msg.empty();
+    if (complete) {
+        return 1;
+    }
+    Debuger::MSG(0, "Invalid log!!!!!!!!!!!!! (Attention Please)");
+    partialList_.push_back(record);
+    return 0;
+}
+
+int LogParser::LogAdd(std::string& chunk) {
+    if (!compensation_.empty()) {
+        Debuger::MSG(2, "Paritial log compensation: " + compensation_ + " " + chunk);
+        chunk.insert(0, compensation_);
+    }
+    for (const std::string& line : Tokenize(chunk, "\n")) {
+        _SYSLOG_LOG_DATA_tag record;
+        if (ParseSingleEntry(line, record) == 0) {
+            logList_.push_back(std::move(record));
+        } else {
+            Debuger::MSG(0, "Fail to parse log");
+        }
+    }
+    return 0;
+}
+
+int LogParser::LogGetCount() {
+    return static_cast<int>(logList_.size());
+}
+
+std::list<_SYSLOG_LOG_DATA_tag> LogParser::LogListGet() {
+    return logList_;
+}
+
+int LogParser::LogReset() {
+    logList_.clear();
+    return 0;
+}
+
+void LogParser::LogDump() {
+    Debuger::MSG(2, "Log count: " + ullNumberToString(logList_.size()));
+    for (const _SYSLOG_LOG_DATA_tag& record : logList_) {
+        Debuger::MSG(2, "Log countent: " + record.msg);
+    }
+}
+
+void LogParser::PartialLogDump() {
+    Debuger::MSG(2, "Partial log count: " + ullNumberToString(partialList_.size()));
+    for (const _SYSLOG_LOG_DATA_tag& record : partialList_) {
+        Debuger::MSG(2, "Log countent: " + record.host + " " + record.ip + " " + record.ldate + " " + record.ltime +
+                            " " + record.prog + " " + record.msg);
+    }
+}

@@ -1,0 +1,145 @@
+#include "parser.h"
+
+#include <gtest/gtest.h>
+
+#include <cstring>
+#include <random>
+
+#include "support/system_log.h"
+
+namespace {
+
+using quor::test::TakeSystemLogTexts;
+using Texts = std::vector<std::string>;
+
+const std::string kFields = "local0 err 2026-11-21 05:15:54 1795238154 17 +00:00 router1 10.0.0.1 kernel";
+const std::string kEntry = kFields + " 84 link  is down ";
+
+// Every field that parsing may touch.
+auto content(const _SYSLOG_LOG_DATA_tag& r) {
+    return std::tie(r.fac, r.prio, r.ldate, r.ltime, r.utcsec, r.xsec, r.tzoffset, r.host, r.ip, r.prog, r.tag, r.msg,
+                    r.id, r.luser);
+}
+
+// The plain way, on a copy of the text that may be written to.
+int parseInPlace(std::string text, _SYSLOG_LOG_DATA_tag& record) {
+    char* rest = nullptr;
+    char* next = text.data();
+    const auto word = [&] { return strtok_r(std::exchange(next, nullptr), " ", &rest); };
+    const auto set = [&](auto& field, auto convert) {
+        const char* const found = word();
+        if (found != nullptr) {
+            field = convert(found);
+        }
+        return found != nullptr;
+    };
+    const auto asText = [](const char* found) { return std::string(found); };
+    const auto asNumber = [](const char* found) { return strtoll(found, nullptr, 10); };
+    if (!set(record.fac, asText) || !set(record.prio, PriorStrToType) || !set(record.ldate, asText) ||
+        !set(record.ltime, asText) || !set(record.utcsec, asNumber) || !set(record.xsec, asNumber) ||
+        !set(record.tzoffset, asText) || !set(record.host, asText) || !set(record.ip, asText) ||
+        !set(record.prog, asText) || !set(record.tag, asText)) {
+        return -1;
+    }
+    record.msg = rest;
+    return 0;
+}
+
+std::string randomEntry(std::mt19937& random) {
+    static const Texts kPieces{" ",        " ",
+                               " ",        "  ",
+                               "a",        "err",
+                               "debug",    "12",
+                               "-7",       "\t",
+                               "+",        "x\ty",
+                               "\xff\x80", std::string(1, '\0'),
+                               "\n",       "99999999999999999999"};
+    // Zero bytes stay rare, or few entries would be whole.
+    std::string entry;
+    for (auto left = random() % 60; left > 0; --left) {
+        const std::string& piece = kPieces[random() % kPieces.size()];
+        entry += piece[0] == '\0' && random() % 8 != 0 ? "z" : piece;
+    }
+    return entry;
+}
+
+}  // namespace
+
+TEST(ParseSingleEntry, FillsTheFieldsInOrder) {
+    LogParser parser;
+    _SYSLOG_LOG_DATA_tag record;
+    ASSERT_EQ(parser.ParseSingleEntry(kEntry, record), 0);
+    _SYSLOG_LOG_DATA_tag expected;
+    expected.fac = "local0", expected.prio = SYSLOG_PRIORITY_ERR, expected.ldate = "2026-11-21";
+    expected.ltime = "05:15:54", expected.utcsec = 1795238154, expected.xsec = 17, expected.tzoffset = "+00:00";
+    expected.host = "router1", expected.ip = "10.0.0.1", expected.prog = "kernel", expected.tag = "84";
+    expected.msg = "link  is down ";
+    EXPECT_EQ(content(record), content(expected));
+}
+
+TEST(ParseSingleEntry, AgreesWithStrtokOnAnyText) {
+    std::mt19937 random(1);  // the same texts in every run
+    LogParser parser;
+    int whole = 0;
+    for (int i = 0; i < 30000; ++i) {
+        const std::string entry = i == 0 ? kFields + " 84" : randomEntry(random);
+        const std::string before = entry;
+        _SYSLOG_LOG_DATA_tag record;
+        record.id = 7, record.fac = record.tag = record.msg = record.luser = "old", record.utcsec = record.xsec = -1;
+        _SYSLOG_LOG_DATA_tag expected = record;
+        const int status = parseInPlace(entry, expected);
+        ASSERT_EQ(parser.ParseSingleEntry(entry, record), status) << testing::PrintToString(entry);
+        ASSERT_EQ(content(record), content(expected)) << testing::PrintToString(entry);
+        ASSERT_EQ(entry, before);
+        whole += status == 0 ? 1 : 0;
+    }
+    EXPECT_GT(whole, 2000);
+}
+
+TEST(LogParser, TokenizeDropsEmptyPieces) {
+    const struct {
+        std::string text, delimiters;
+        std::list<std::string> pieces;
+    } cases[] = {
+        {"", "\n", {}},
+        {"\n\n", "\n", {}},
+        {"one\n\ntwo\nthree", "\n", {"one", "two", "three"}},
+        {",;a;,b,", ",;", {"a", "b"}},
+        {"whole", "", {"whole"}},
+    };
+    LogParser parser;
+    for (const auto& c : cases) {
+        EXPECT_EQ(parser.Tokenize(c.text, c.delimiters), c.pieces) << testing::PrintToString(c.text);
+    }
+}
+
+TEST(LogParser, KeepsTheLinesThatParse) {
+    LogParser parser;
+    std::string chunk = "\n" + kEntry + "\n\ntoo short\n" + kEntry + "\n" + kFields + " last";
+    TakeSystemLogTexts();
+    EXPECT_EQ(parser.LogAdd(chunk), 0);
+    EXPECT_EQ(TakeSystemLogTexts(), Texts{"Fail to parse log"});
+    EXPECT_EQ(parser.LogGetCount(), 3);
+    const std::list<_SYSLOG_LOG_DATA_tag> logs = parser.LogListGet();
+    EXPECT_EQ(parser.LogReset(), 0);
+    EXPECT_EQ(parser.LogGetCount(), 0);
+    EXPECT_EQ(logs.front().msg, "link  is down ");
+    EXPECT_EQ(logs.back().tag, "last");
+}
+
+TEST(LogParser, RejectsRecordsThatLackWhatIdentifiesALog) {
+    LogParser parser;
+    _SYSLOG_LOG_DATA_tag whole;
+    ASSERT_EQ(parser.ParseSingleEntry(kEntry, whole), 0);
+    whole.fac = whole.tag = whole.tzoffset = "";
+    TakeSystemLogTexts();
+    EXPECT_EQ(parser.isValidLog(whole), 1);
+    EXPECT_EQ(TakeSystemLogTexts(), Texts{});
+    for (const auto field : {&_SYSLOG_LOG_DATA_tag::host, &_SYSLOG_LOG_DATA_tag::ip, &_SYSLOG_LOG_DATA_tag::ldate,
+                             &_SYSLOG_LOG_DATA_tag::ltime, &_SYSLOG_LOG_DATA_tag::prog, &_SYSLOG_LOG_DATA_tag::msg}) {
+        _SYSLOG_LOG_DATA_tag record = whole;
+        (record.*field).clear();
+        EXPECT_EQ(parser.isValidLog(record), 0);
+        EXPECT_EQ(TakeSystemLogTexts(), Texts{"Invalid log!!!!!!!!!!!!! (Attention Please)"});
+    }
+}
