@@ -33,6 +33,8 @@ class AccountingManager {
 
     // Sets the path of the accounting database. Always 0.
     int ConfigLoad();
+    // Reads the notification rules anew.
+    void RulesReload();
     // Counts one log of `device`, after closing the open sample if the second has changed. Always 0.
     int LogInc(std::string device);
     // Closes the open sample if the second has changed and it counted anything; a closed sample is checked against the
@@ -50,6 +52,9 @@ class AccountingManager {
     // Writes the closed samples and the histogram in one transaction; without a closed sample it does nothing (0).
     // -1 keeps the samples for the next flush.
     int AccoutingFlush2DB();
+    // Forgets the oldest closed samples until those left hold at most `maxCounts` counts of devices, for an owner whose
+    // database stays unwritable. The number of samples forgotten; the histogram still counts their logs.
+    unsigned long long EpsListTrim(unsigned long long maxCounts);
     // Prints the counters as debug messages at a level that the sink drops.
     void AccountingDump();
 

@@ -1,0 +1,278 @@
+#include "accounting.h"
+
+#include <gtest/gtest.h>
+#include <unistd.h>
+
+#include <filesystem>
+#include <random>
+
+#include "common/paths.h"
+#include "support/clock.h"
+#include "support/notices.h"
+#include "support/sqlite_file.h"
+#include "support/system_log.h"
+#include "support/temp_folder.h"
+
+namespace {
+
+using quor::test::FakeNotices;
+using quor::test::SqliteFile;
+using quor::test::TakeSystemLogTexts;
+using Texts = std::vector<std::string>;
+using Histogram = std::vector<std::pair<std::string, unsigned long long>>;
+namespace paths = quor::paths;
+
+const std::string kDb = paths::kAccountingDb;
+constexpr off_t kPurgeBytes = off_t{5} * 1024 * 1024;
+
+void writeFile(const std::filesystem::path& path, const std::string& text) {
+    std::filesystem::create_directories(path.parent_path());
+    std::ofstream(path) << text;
+}
+
+class Accounting : public testing::Test {
+  protected:
+    void SetUp() override {
+        std::filesystem::remove_all(std::filesystem::path(kDb).parent_path());
+        std::filesystem::create_directories(std::filesystem::path(kDb).parent_path());
+        std::filesystem::remove(paths::kEventDb);
+        writeFile(paths::kNotifyRules, "");
+        FakeNotices() = {};
+        at(1000);
+    }
+    void TearDown() override { quor::test::ResetClock(); }
+
+    static void at(time_t now) { quor::test::SetClock(now); }
+
+    // Closes one sample of one log for each device, at `now` + 1. Whole only when the last one was closed at `now`, or
+    // with a single log: the second log of another second closes a sample itself.
+    static void sample(AccountingManager& accounting, time_t now, const Texts& devices) {
+        at(now);
+        for (const std::string& device : devices) {
+            accounting.LogInc(device);
+        }
+        at(now + 1);
+        accounting.CurEpsUpdate();
+    }
+
+    static Texts rows() { return SqliteFile(kDb).query("SELECT stamp, device, eps FROM eps ORDER BY id"); }
+};
+
+Histogram histogramOf(AccountingManager& accounting) {
+    Histogram rows;
+    for (const QUORLOG_LOG_DEVICE_STATISTIC& row : accounting.HistogramGet()) {
+        rows.emplace_back(row.device, row.count);
+    }
+    return rows;
+}
+
+// The counters kept in the plainest way: a walk of the histogram for every log.
+struct Model {
+    Histogram histogram;
+    std::map<std::string, int> open;
+    unsigned long long eps = 0;
+    time_t stamp = 0;
+    Texts rows;
+
+    void log(time_t now, const std::string& device) {
+        if (now != stamp && eps != 0) {
+            stamp = now;
+            for (const auto& [name, count] : open) {
+                rows.insert(rows.end(), {std::to_string(now), name, std::to_string(count)});
+            }
+            open.clear();
+            eps = 0;
+        }
+        ++open[device];
+        ++eps;
+        bool known = false;
+        for (auto& row : histogram) {
+            row.second += row.first == device ? 1 : 0;
+            known = known || row.first == device;
+        }
+        if (!known) {
+            histogram.emplace_back(device, 1);
+        }
+    }
+};
+
+}  // namespace
+
+TEST_F(Accounting, CountsAsAWalkOfTheHistogramWould) {
+    SqliteFile(kDb).run(quor::test::ReadFile(paths::kAccountingSchema));
+    SqliteFile(kDb).run("INSERT INTO histogram VALUES (NULL, 'd7', 40), (NULL, 'D7', 2)");
+    std::mt19937 random(3);
+    AccountingManager accounting;
+    Model model;
+    model.histogram = {{"D7", 2}, {"d7", 40}};
+    time_t now = 1000;
+    for (unsigned long long i = 1; i <= 3000; ++i) {
+        now += random() % 10 == 0 ? static_cast<time_t>(random() % 3) - 1 : 0;  // the clock may go back
+        at(now);
+        std::string device = (random() % 4 == 0 ? "D" : "d") + std::to_string(random() % 12);
+        device += random() % 6 == 0 ? std::string(1, '\0') : "";
+        model.log(now, device);
+        accounting.LogInc(device);
+        ASSERT_EQ(accounting.CurrentEpsGet(), model.eps);
+        ASSERT_EQ(accounting.TotalCountGet(), i);
+    }
+    EXPECT_EQ(histogramOf(accounting), model.histogram);
+    EXPECT_EQ(accounting.AccoutingFlush2DB(), 0);
+    for (std::string& field : model.rows) {
+        field.resize(strlen(field.c_str()));  // a statement ends a text at its zero byte
+    }
+    EXPECT_EQ(rows(), model.rows);
+}
+
+TEST_F(Accounting, TheFirstLogOfAnIdleSpellClosesNothing) {
+    AccountingManager accounting;
+    accounting.LogInc("a");
+    EXPECT_EQ(accounting.CurrentEpsGet(), 1U);
+    accounting.LogInc("a");  // the stamp is still 0, so this closes a sample of one log
+    EXPECT_EQ(accounting.CurrentEpsGet(), 1U);
+    at(1001);
+    accounting.CurEpsUpdate();
+    at(1002);
+    accounting.CurEpsUpdate();
+    EXPECT_EQ(accounting.CurrentEpsGet(), 0U);
+    accounting.LogInc("b");
+    EXPECT_EQ(accounting.CurrentEpsGet(), 1U);
+    EXPECT_EQ(accounting.AccoutingFlush2DB(), 0);
+    EXPECT_EQ(rows(), (Texts{"1000", "a", "1", "1001", "a", "1"}));
+}
+
+TEST_F(Accounting, AFlushIsDueMoreThanFiveSecondsAfterTheLastQuestion) {
+    AccountingManager accounting;
+    const struct {
+        time_t now;
+        bool due;
+    } questions[] = {{100, true}, {103, false},       {108, false},         {114, true},
+                     {50, false}, {0x7ffffffd, true}, {0x80000001L, false}, {0x80000007L, true}};
+    for (const auto& question : questions) {
+        at(question.now);
+        EXPECT_EQ(accounting.isNeed2Flush(), question.due) << question.now;
+    }
+}
+
+TEST_F(Accounting, ASampleAtTheThresholdIsNotifiedAndRecorded) {
+    writeFile(paths::kNotifyRules,
+              "[rate]\nnotify_type=\"1\"\nnotify_pri=\"0\"\nnotify_eps=\"3\"\nnotify_pat=\"\"\nnotify_enable=\"1\"\n");
+    AccountingManager accounting;
+    sample(accounting, 1000, {"a"});
+    sample(accounting, 1001, {"a", "b"});
+    EXPECT_TRUE(FakeNotices().sent.empty());
+    sample(accounting, 1002, {"a", "b", "a"});
+    FakeNotices().fail = true;
+    TakeSystemLogTexts();
+    sample(accounting, 1003, {"a", "b", "a", "a"});
+    ASSERT_EQ(FakeNotices().sent.size(), 2U);
+    EXPECT_EQ(FakeNotices().sent[0].tag, "QUORSYSLOG_EPS_EXCEED");
+    EXPECT_EQ(FakeNotices().sent[0].values["%EPS%"], "3");
+    EXPECT_EQ(TakeSystemLogTexts().back(), "Fail to send syslog notification");
+    EXPECT_EQ(SqliteFile(paths::kEventDb).query("SELECT event FROM log"),
+              (Texts{"Event detection: EPS is larger than [3].", "Event detection: EPS is larger than [4]."}));
+}
+
+TEST_F(Accounting, NothingIsWrittenWithoutAClosedSample) {
+    AccountingManager accounting;
+    accounting.LogInc("a");
+    EXPECT_EQ(accounting.AccoutingFlush2DB(), 0);
+    EXPECT_FALSE(std::filesystem::exists(kDb));
+}
+
+TEST_F(Accounting, DestructionWritesAndTheNextStartReadsBack) {
+    {
+        AccountingManager accounting;
+        sample(accounting, 1000, {"it's"});
+        sample(accounting, 1001, {"b", "it's"});
+    }
+    {
+        AccountingManager accounting;
+        EXPECT_EQ(histogramOf(accounting), (Histogram{{"b", 1}, {"it's", 2}}));
+        EXPECT_EQ(accounting.TotalCountGet(), 0U);
+        sample(accounting, 1002, {"b"});
+    }
+    EXPECT_EQ(SqliteFile(kDb).query("SELECT device, count FROM histogram ORDER BY device"),
+              (Texts{"b", "2", "it's", "2"}));
+    EXPECT_EQ(rows(), (Texts{"1001", "it's", "1", "1002", "b", "1", "1002", "it's", "1", "1003", "b", "1"}));
+}
+
+TEST_F(Accounting, AFailedSampleKeepsTheOnesBeforeIt) {
+    SqliteFile(kDb).run(quor::test::ReadFile(paths::kAccountingSchema));
+    SqliteFile(kDb).run(
+        "CREATE TRIGGER t BEFORE INSERT ON eps WHEN NEW.device = 'b' BEGIN SELECT RAISE(ABORT, 'no'); END");
+    AccountingManager accounting;
+    sample(accounting, 1000, {"a"});
+    sample(accounting, 1001, {"b"});
+    TakeSystemLogTexts();
+    EXPECT_EQ(accounting.AccoutingFlush2DB(), -1);
+    EXPECT_EQ(TakeSystemLogTexts().back(),
+              "Fail to execute SQL command: INSERT INTO eps VALUES(NULL, '1002', 'b', '1');");
+    EXPECT_EQ(rows(), (Texts{"1001", "a", "1"}));
+    EXPECT_EQ(SqliteFile(kDb).query("SELECT device FROM histogram"), Texts{});
+    SqliteFile(kDb).run("DROP TRIGGER t");
+    EXPECT_EQ(accounting.AccoutingFlush2DB(), 0);
+    EXPECT_EQ(rows(), (Texts{"1001", "a", "1", "1001", "a", "1", "1002", "b", "1"}));
+}
+
+TEST_F(Accounting, AFailedHistogramUndoesTheSamples) {
+    SqliteFile(kDb).run(quor::test::ReadFile(paths::kAccountingSchema));
+    SqliteFile(kDb).run("ALTER TABLE histogram RENAME TO aside");
+    AccountingManager accounting;
+    sample(accounting, 1000, {"a"});
+    TakeSystemLogTexts();
+    EXPECT_EQ(accounting.AccoutingFlush2DB(), -1);
+    const Texts messages = TakeSystemLogTexts();
+    ASSERT_GE(messages.size(), 2U);
+    EXPECT_EQ(Texts(messages.end() - 2, messages.end()),
+              (Texts{"Fail to execute SQL command: INSERT OR REPLACE INTO histogram VALUES(NULL, 'a', 1);",
+                     "Fail to check sanity (DBTranEnd)"}));
+    EXPECT_EQ(rows(), Texts{});
+    SqliteFile(kDb).run("ALTER TABLE aside RENAME TO histogram");
+    EXPECT_EQ(accounting.AccoutingFlush2DB(), 0);
+    EXPECT_EQ(rows(), (Texts{"1001", "a", "1"}));
+}
+
+TEST_F(Accounting, OldSamplesGoOnceTheFileIsLarge) {
+    SqliteFile db(kDb);
+    db.run("PRAGMA page_size=4096");
+    db.run(quor::test::ReadFile(paths::kAccountingSchema));
+    db.run("INSERT INTO eps VALUES (NULL, 1000, 'old', 1), (NULL, strftime('%s', 'now') - 3600, 'recent', 1);"
+           "CREATE TABLE filler (data BLOB); INSERT INTO filler VALUES (zeroblob(5200000))");
+    std::filesystem::resize_file(kDb, kPurgeBytes);
+    AccountingManager accounting;
+    const auto devices = [&db] { return db.query("SELECT DISTINCT device FROM eps ORDER BY device"); };
+    sample(accounting, 1000, {"new"});
+    ASSERT_EQ(accounting.AccoutingFlush2DB(), 0);
+    EXPECT_EQ(devices(), (Texts{"new", "old", "recent"}));
+    std::filesystem::resize_file(kDb, kPurgeBytes + 1);
+    sample(accounting, 1001, {"new"});
+    ASSERT_EQ(accounting.AccoutingFlush2DB(), 0);
+    EXPECT_EQ(devices(), Texts{"recent"});  // the new samples carry stamps of the test's clock
+}
+
+TEST_F(Accounting, FailsWhereTheDatabaseIsNoFile) {
+    std::filesystem::create_directories(kDb);
+    AccountingManager accounting;
+    sample(accounting, 1000, {"a"});
+    TakeSystemLogTexts();
+    EXPECT_EQ(accounting.AccoutingFlush2DB(), -1);
+    EXPECT_FALSE(TakeSystemLogTexts().empty());
+    std::filesystem::remove(kDb);
+    EXPECT_EQ(accounting.AccoutingFlush2DB(), 0);
+    EXPECT_EQ(rows(), (Texts{"1001", "a", "1"}));
+}
+
+TEST_F(Accounting, TrimForgetsTheOldestSamples) {
+    AccountingManager accounting;
+    sample(accounting, 1000, {"a"});
+    sample(accounting, 1001, {"a", "b"});
+    sample(accounting, 1002, {"a", "b"});
+    sample(accounting, 1003, {"c"});
+    EXPECT_EQ(accounting.EpsListTrim(5), 1U);
+    EXPECT_EQ(accounting.EpsListTrim(5), 0U);
+    EXPECT_EQ(accounting.EpsListTrim(2), 2U);
+    EXPECT_EQ(accounting.AccoutingFlush2DB(), 0);
+    EXPECT_EQ(rows(), (Texts{"1004", "c", "1"}));
+    EXPECT_EQ(SqliteFile(kDb).query("SELECT sum(count) FROM histogram"), Texts{"6"});
+}
