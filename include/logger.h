@@ -1,8 +1,9 @@
 // The package's own event log, in an SQLite database of its own. Conventions: see common.h; failures are reported
 // through Debuger::MSG.
 //
-// Texts are not escaped on their way into the database or the HTML page: an event whose text holds an apostrophe is
-// refused (-1), never stored in part.
+// Texts are not escaped on their way into the database or the HTML page. One with an apostrophe is as a rule refused
+// (-1), never stored in part, but a crafted one can add events of its own: callers keep apostrophes out of what strangers
+// wrote. See docs/security.md.
 #ifndef QUORSYSLOG_LOGGER_H
 #define QUORSYSLOG_LOGGER_H
 

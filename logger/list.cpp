@@ -49,10 +49,7 @@ std::list<_SSYSLOG_LOG_LOG_tag> Logger::LogEnum(std::string dbPath, int offset, 
 }
 
 int Logger::LogClear(std::string dbPath, std::string user) {
-    // The companions of a database in use would be taken for those of the new one.
-    for (const char* suffix : {"", "-wal", "-shm"}) {
-        (void)unlink((dbPath + suffix).c_str());
-    }
+    (void)unlink(dbPath.c_str());  // what is recorded next says that it was asked for
     if (LogAddLogClear(dbPath, user) < 0) {
         syslog(LOG_ERR, "%s:%d Fail to add log [%s]", "logger", __LINE__,
                quor::CatalogueRow(quor::Event::LogClear).format);

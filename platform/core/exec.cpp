@@ -1,3 +1,4 @@
+#include <fcntl.h>
 #include <spawn.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -18,12 +19,15 @@
 
 namespace {
 
-// What a program starts with, whatever its caller does: descriptors 0 to 2, no blocked signal, none of the signals
-// ignored that daemons like to ignore.
+// What a program starts with, whatever its caller does: the caller's standard error and no other open file (what it
+// reads or prints is not to mix with the caller's own input and output), no blocked signal, none of the signals ignored
+// that daemons like to ignore.
 class CleanStart {
   public:
     CleanStart() {
         posix_spawn_file_actions_init(&actions_);
+        posix_spawn_file_actions_addopen(&actions_, STDIN_FILENO, "/dev/null", O_RDONLY, 0);
+        posix_spawn_file_actions_addopen(&actions_, STDOUT_FILENO, "/dev/null", O_WRONLY, 0);
 #ifdef QUOR_SPAWN_CLOSE_FROM
         posix_spawn_file_actions_addclosefrom_np(&actions_, STDERR_FILENO + 1);
 #endif

@@ -30,6 +30,7 @@ TEST(Exec, PassesArgumentsWithoutAShell) {
 
 TEST(Exec, GivesNoDescriptorAndNoBlockedSignal) {
     const int inherited = dup2(STDERR_FILENO, 57);  // no close-on-exec
+    EXPECT_EQ(shell("test /dev/null -ef /proc/self/fd/0 && test /dev/null -ef /proc/self/fd/1"), 0);
     sigset_t term;
     sigemptyset(&term);
     sigaddset(&term, SIGTERM);
