@@ -2,8 +2,8 @@
 // through Debuger::MSG.
 //
 // Texts are not escaped on their way into the database or the HTML page. One with an apostrophe is as a rule refused
-// (-1), never stored in part, but a crafted one can add events of its own: callers keep apostrophes out of what strangers
-// wrote. See docs/security.md.
+// (-1), never stored in part, but a crafted one can add events of its own: callers keep apostrophes out of what
+// strangers wrote. See docs/security.md.
 #ifndef QUORSYSLOG_LOGGER_H
 #define QUORSYSLOG_LOGGER_H
 
