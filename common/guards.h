@@ -6,9 +6,12 @@
 #ifndef COMMON_GUARDS_H
 #define COMMON_GUARDS_H
 
+#include <unistd.h>
+
 #include <cstdio>
 #include <cstdlib>
 #include <memory>
+#include <utility>
 
 #include "quor/quorcore.h"
 #include "quor/quordb.h"
@@ -30,6 +33,27 @@ using StringList = std::unique_ptr<QLIBSZLIST, Releaser<QLIBCSzListFree>>;
 using PlatformText = std::unique_ptr<char, Releaser<QLIBCStrPut>>;
 using File = std::unique_ptr<FILE, Releaser<fclose>>;
 using CText = std::unique_ptr<char, Releaser<free>>;
+
+// An open file descriptor, or none.
+class Descriptor {
+  public:
+    explicit Descriptor(int number = -1) : number_(number) {}
+    Descriptor(Descriptor&& other) noexcept : number_(std::exchange(other.number_, -1)) {}
+    Descriptor& operator=(Descriptor&& other) noexcept {
+        std::swap(number_, other.number_);
+        return *this;
+    }
+    ~Descriptor() {
+        if (*this) {
+            (void)close(number_);  // what matters was written before, and checked
+        }
+    }
+    explicit operator bool() const { return number_ >= 0; }
+    int get() const { return number_; }
+
+  private:
+    int number_;
+};
 
 // Lends a guard to a call that replaces the handle it points to; the guard owns whatever the call leaves there.
 template <typename Guard>

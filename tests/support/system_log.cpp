@@ -2,6 +2,7 @@
 
 #include <cstdarg>
 #include <cstdio>
+#include <fstream>
 #include <utility>
 
 namespace {
@@ -11,9 +12,18 @@ std::vector<quor::test::SystemLogLine>& written() {
     return lines;
 }
 
+std::string& copyPath() {
+    static std::string path;
+    return path;
+}
+
 }  // namespace
 
 namespace quor::test {
+
+void CopySystemLogTo(const std::string& path) {
+    copyPath() = path;
+}
 
 std::vector<SystemLogLine> TakeSystemLog() {
     return std::exchange(written(), {});
@@ -37,6 +47,9 @@ extern "C" void syslog(int priority, const char* format, ...) {
     va_end(arguments);
     if (length >= 0) {
         written().push_back({priority, text});
+        if (!copyPath().empty()) {
+            std::ofstream(copyPath(), std::ios::app) << text << std::endl;
+        }
         free(text);
     }
 }

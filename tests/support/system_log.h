@@ -18,6 +18,9 @@ std::vector<SystemLogLine> TakeSystemLog();
 // The texts alone.
 std::vector<std::string> TakeSystemLogTexts();
 
+// Lines written from now on also go to this file, which shows those of forked processes; empty ends it.
+void CopySystemLogTo(const std::string& path);
+
 }  // namespace quor::test
 
 #endif

@@ -12,8 +12,10 @@ extern "C" {
 
 /* Renders the template "<textsDir>/<tag>.txt" with the values of the table, applies the filter file, and hands the
  * notice to the configured channels. Delivery goes on in a process of its own: the call never waits for a server, and 0
- * says that the notice was accepted (or suppressed by the filter), not that it arrived. `flags` is not used. Negative
- * for a missing template and when delivery cannot be started. */
+ * says that the notice was accepted (or held back by the filter or a full queue, and counted), not that it arrived.
+ * "%SYSLOG_CONTENT%" is taken as escaped for JSON and shown as it was before. `flags` is not used. Negative for a
+ * template that is missing or has no subject, and when delivery cannot be started. The caller forks: it should have no
+ * other threads. */
 int QUORSysNotifySendNotificationCustomized(const char* tag, const char* textsDir, const char* filterFile,
                                             QLIBSZHASH* values, int flags);
 
@@ -24,8 +26,15 @@ typedef struct QUORMAIL_tag {
     char user[256]; /* empty: no login */
     char password[256];
     int port;
-    int security; /* 0 none, 1 STARTTLS, 2 TLS from the start */
+    int security;     /* 0 none, 1 STARTTLS, 2 TLS from the start */
+    char caFile[256]; /* certificates that the server's is checked against; empty: the system's */
+    int verify;       /* 0: any certificate will do */
 } QUORMAIL;
+
+/* Delivers a test notice on every configured channel, past the filter and the queue, and waits for each. `report` hears
+ * of each one: its name, 1 or 0, and the cause of a failure (else empty). The number of channels that were tried,
+ * negative when the settings cannot be read. */
+int QUORNotifyTest(void (*report)(const char* channel, int ok, const char* detail, void* context), void* context);
 
 /* Fills `mail` from the settings; a key that is absent leaves its default. Negative when they cannot be read. */
 int QUORMailGet(QUORMAIL* mail);

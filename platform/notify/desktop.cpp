@@ -1,0 +1,39 @@
+#include <fcntl.h>
+#include <sys/file.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstring>
+
+#include "common/paths.h"
+#include "platform/notify/notify.h"
+
+namespace quor::notify {
+namespace {
+
+constexpr const char kFile[] = "/desktop.jsonl";
+constexpr off_t kMostBytes = off_t{1} << 20U;
+
+std::string append(const std::string& path, const std::string& line) {
+    const Descriptor file(open(path.c_str(), O_WRONLY | O_APPEND | O_CREAT | O_CLOEXEC | O_NOFOLLOW, 0600));
+    if (!file || write(file.get(), line.data(), line.size()) != static_cast<ssize_t>(line.size())) {
+        return path + ": " + strerror(errno);
+    }
+    return "";
+}
+
+}  // namespace
+
+// When the file has grown to its bound it becomes "desktop.jsonl.1", in place of the one before.
+std::string DeliverToDesktop(const Settings& /*settings*/, const Notice& notice) {
+    const Spool spool(kPatientlyMs);
+    const std::string path = std::string(paths::kNotifySpool) + kFile;
+    struct stat found {};
+    if (stat(path.c_str(), &found) == 0 && found.st_size >= kMostBytes) {
+        (void)rename(path.c_str(), (path + ".1").c_str());
+    }
+    return append(path, NoticeAsJson(notice) + "\n");
+}
+
+}  // namespace quor::notify

@@ -1,0 +1,123 @@
+#include <fcntl.h>
+#include <sys/file.h>
+#include <sys/prctl.h>
+#include <sys/stat.h>
+#include <sys/syscall.h>
+#include <sys/wait.h>
+#include <syslog.h>
+#include <unistd.h>
+
+#include <csignal>
+
+#include "platform/notify/notify.h"
+
+namespace quor::notify {
+namespace {
+
+constexpr int kSlotDescriptor = 3;
+
+// No handler of the caller runs in the children.
+class SignalsHeld {
+  public:
+    SignalsHeld() {
+        sigset_t all;
+        (void)sigfillset(&all);
+        (void)sigprocmask(SIG_SETMASK, &all, &before_);
+    }
+    SignalsHeld(const SignalsHeld&) = delete;
+    SignalsHeld& operator=(const SignalsHeld&) = delete;
+    ~SignalsHeld() { (void)sigprocmask(SIG_SETMASK, &before_, nullptr); }
+
+  private:
+    sigset_t before_{};
+};
+
+void resetSignals() {
+    for (int number = 1; number < NSIG; ++number) {
+        (void)signal(number, SIG_DFL);
+    }
+    (void)signal(SIGPIPE, SIG_IGN);
+    sigset_t none;
+    (void)sigemptyset(&none);
+    (void)sigprocmask(SIG_SETMASK, &none, nullptr);
+}
+
+void closeFrom(int first) {
+#ifdef SYS_close_range
+    if (syscall(SYS_close_range, static_cast<unsigned int>(first), ~0U, 0U) == 0) {
+        return;
+    }
+#endif
+    const auto end = static_cast<int>(sysconf(_SC_OPEN_MAX));
+    for (int descriptor = first; descriptor < end; ++descriptor) {
+        (void)close(descriptor);
+    }
+}
+
+// Keeps the slot alone. The system log's connection must be closed by its owner, or its number would be written to
+// after something else got it.
+void closeInherited(int slot) {
+    closelog();
+    (void)dup2(fcntl(slot, F_DUPFD, kSlotDescriptor), kSlotDescriptor);
+    closeFrom(kSlotDescriptor + 1);
+    const int null = open("/dev/null", O_RDWR);
+    for (int standard = STDIN_FILENO; standard <= STDERR_FILENO; ++standard) {
+        (void)dup2(null, standard);
+    }
+    closeFrom(kSlotDescriptor + 1);
+}
+
+// Finding the queue empty and giving the slot back happen under one lock: a caller that saw no free slot has its notice
+// in the queue already, and this worker finds it.
+void deliverQueue() {
+    for (;;) {
+        std::optional<Notice> notice;
+        {
+            const Spool spool(kPatientlyMs);
+            notice = spool ? spool.take() : std::nullopt;
+            if (!notice) {
+                (void)flock(kSlotDescriptor, LOCK_UN);
+                return;
+            }
+        }
+        Deliver(*notice);
+    }
+}
+
+// Forked from the caller, which has no threads. An exception ends the process instead of unwinding the caller's frames,
+// and _exit leaves the caller's buffers and exit handlers alone.
+[[noreturn]] void becomeWorker(int slot) noexcept {
+    (void)setsid();
+    const pid_t worker = fork();
+    if (worker != 0) {
+        _exit(worker < 0 ? 1 : 0);
+    }
+    closeInherited(slot);
+    resetSignals();
+    (void)umask(077);
+    (void)prctl(PR_SET_NAME, "quornotify");
+    if (chdir("/") == 0) {
+        deliverQueue();
+    }
+    _exit(0);
+}
+
+}  // namespace
+
+int StartWorker(const Descriptor& slot) {
+    const SignalsHeld held;
+    const pid_t child = fork();
+    if (child < 0) {
+        return -1;
+    }
+    if (child == 0) {
+        becomeWorker(slot.get());
+    }
+    int status = 0;
+    if (waitpid(child, &status, 0) != child) {
+        return 0;  // the caller ignores its children: the system has reaped it
+    }
+    return status == 0 ? 0 : -1;
+}
+
+}  // namespace quor::notify

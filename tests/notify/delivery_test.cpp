@@ -1,0 +1,179 @@
+#include <sys/wait.h>
+
+#include <chrono>
+
+#include "notify/fixture.h"
+
+namespace quor::test {
+namespace {
+
+constexpr const char kAbsentPort[] = "9";  // nothing listens there
+
+class Delivery : public Notify {
+  protected:
+    // What servers.py keeps of a mail: sessions, sender, recipients, login, header names, defects, subject; the body.
+    struct Mail {
+        std::vector<std::string> lines;
+        std::string body;
+    };
+    static Mail mailOf(std::string record) {
+        Mail mail;
+        for (int i = 0; i < 7; ++i) {
+            const size_t end = record.find('\n');
+            mail.lines.push_back(record.substr(0, end));
+            record.erase(0, end == std::string::npos ? end : end + 1);
+        }
+        mail.body = record;
+        return mail;
+    }
+
+    static double secondsOf(const std::function<void()>& work) {
+        const auto begin = std::chrono::steady_clock::now();
+        work();
+        return std::chrono::duration<double>(std::chrono::steady_clock::now() - begin).count();
+    }
+
+    static size_t openDescriptors() {
+        const std::filesystem::directory_iterator entries("/proc/self/fd");
+        return static_cast<size_t>(std::distance(begin(entries), end(entries)));
+    }
+};
+
+TEST_F(Delivery, MailsCarryWhatWasReceivedAndNoHeaderOfItsMaking) {
+    const Server server("smtp good");
+    settings(mailTo(server.port(), "smtp_sender=\"log@example.com\"\n"));
+    folder_.write("T.txt", "About %KEYWORD%\n\n%SYSLOG_CONTENT%\n");
+    const std::string longWord = "k\xC3\xA4\xE2\x82\xAC" + std::string(100, 'y') + "\xF0\x9F\x98\x80";
+    struct Case {
+        std::string keyword, content, subject, body;
+    };
+    const std::vector<Case> cases{
+        {"x", "a\\\"b\\\\c\t\x1b[2J .\r\n.\r\nQUIT", "About x", "a\"b\\c\t\x1b[2J .\r\n.\r\nQUIT"},
+        {"x\r\nBcc: evil@example.com\r\n\r\n", "caf\xC3\xA9", "About x  Bcc: evil@example.com    ", "caf\xC3\xA9"},
+        {longWord, "caf\xE9 \xFF\xC3\xA9", "About " + longWord, "caf\xE9 \xFF\xC3\xA9"},
+        {"=?UTF-8?B?eA==?=", "", "About =?UTF-8?B?eA==?=", ""},
+    };
+    for (size_t i = 0; i < cases.size(); ++i) {
+        ASSERT_EQ(send({{"%KEYWORD%", cases[i].keyword}, {"%SYSLOG_CONTENT%", cases[i].content}}), 0);
+        const Mail mail = mailOf(server.received(static_cast<int>(i) + 1));
+        EXPECT_EQ(mail.lines[1], "log@example.com");
+        EXPECT_EQ(mail.lines[2], "one@example.com,two@example.com");
+        EXPECT_EQ(mail.lines[4], "auto-submitted,content-transfer-encoding,content-type,date,from,message-id,"
+                                 "mime-version,subject,to");
+        EXPECT_EQ(mail.lines[5], "0");
+        EXPECT_EQ(mail.lines[6], cases[i].subject);
+        EXPECT_EQ(mail.body, cases[i].body + "\n");
+    }
+}
+
+TEST_F(Delivery, EncryptedMailLogsInAndChecksTheCertificate) {
+    const std::string key = folder_.path("key.pem");
+    const std::string certificate = folder_.path("cert.pem");
+    const std::string files = certificate + " " + key;
+    std::string command = "openssl req -x509 -newkey rsa:2048 -nodes -subj /CN=127.0.0.1 2>/dev/null";
+    command.append(" -addext subjectAltName=IP:127.0.0.1 -keyout ").append(key).append(" -out ").append(certificate);
+    ASSERT_EQ(system(command.c_str()), 0);
+    const std::string login = "smtp_user=\"user\"\nsmtp_password=\"pass\"word\"\n";
+    for (const std::string security : {"starttls", "tls"}) {
+        SCOPED_TRACE(security);
+        const Server server("smtp-" + security + " good", files);
+        const std::string base = mailTo(server.port(), login);
+        const auto with = [&](const std::string& more) {
+            std::string text = base;
+            text += more;
+            text.replace(text.find("none"), 4, security);
+            settings(text);
+            ASSERT_EQ(send({{"%SYSLOG_CONTENT%", more}}), 0);
+        };
+        std::filesystem::remove(folder_.path("syslog"));
+        with("");
+        EXPECT_NE(systemLog(1)[0].find("Failed to send email."), std::string::npos);
+        with("smtp_ca_file=\"" + certificate + "\"\n");
+        EXPECT_EQ(mailOf(server.received(1)).lines[3], "user");
+        with("smtp_tls_verify=\"no\"\n");
+        EXPECT_NE(server.received(2).find("verify"), std::string::npos);
+    }
+}
+
+TEST_F(Delivery, MailThatFailsIsToldInTheSystemLog) {
+    const Server refusing("smtp refuse");
+    const Server stuck("smtp stuck");
+    const std::vector<std::pair<std::string, std::string>> cases{
+        {mailTo(refusing.port()), "550"},
+        {mailTo(stuck.port(), "notify_timeout=\"1\"\n"), "timed out"},
+        {mailTo(kAbsentPort), "onnect"},
+        {"smtp_mail_enabled=yes\nsmtp_server=a/b\nsmtp_recipient=a@b\n", "check smtp_server"}};
+    for (size_t i = 0; i < cases.size(); ++i) {
+        settings(cases[i].first);
+        ASSERT_EQ(send({}), 0);
+        const auto lines = systemLog(i + 1);
+        ASSERT_EQ(lines.size(), i + 1);
+        EXPECT_EQ(lines[i].rfind("Failed to send email.", 0), 0U) << lines[i];
+        EXPECT_NE(lines[i].find(cases[i].second), std::string::npos) << lines[i];
+    }
+}
+
+TEST_F(Delivery, OneUnknownRecipientDoesNotCostTheOthersTheirMail) {
+    const Server server("smtp good");
+    std::string text = mailTo(server.port());
+    text.replace(text.find("one@"), 3, "unknown");
+    settings(text);
+    ASSERT_EQ(send({}), 0);
+    EXPECT_EQ(mailOf(server.received(1)).lines[2], "two@example.com");
+}
+
+TEST_F(Delivery, WebhooksGetValidJsonAndTellTheirFailures) {
+    const Server good("http good");
+    const Server refusing("http refuse");
+    const auto url = [](const std::string& port) { return "http://127.0.0.1:" + port + "/hook"; };
+    settings("webhook_url=\"" + url(refusing.port()) + " " + url(good.port()) + "\"\n");
+    ASSERT_EQ(send({{"%HOST%", "h\"\x01\xFF"}, {"%SYSLOG_CONTENT%", std::string(2000, '\x02')}}), 0);
+    const std::string record = good.received(1);
+    EXPECT_EQ(record.rfind("post\napplication/json\n{\"tag\":\"T\",", 0), 0U) << record;
+    EXPECT_EQ(systemLog(1)[0], "Failed to send notice. webhook: the server answered 500");
+
+    ASSERT_EQ(send({{"%SYSLOG_CONTENT%", "quorlogd: Failed to send notice. webhook"}}), 0);
+    settings("webhook_url=\"" + url(kAbsentPort) + " file:///etc/passwd\"\n");
+    ASSERT_EQ(send({}), 0);
+    EXPECT_EQ(systemLog(2).size(), 2U) << "a notice about the failed notice would fail again";
+}
+
+TEST_F(Delivery, TheCallerNeitherWaitsNorKeepsAnything) {
+    const Server server("smtp slow");
+    settings(mailTo(server.port()));
+    int ends[2];
+    ASSERT_EQ(pipe(ends), 0);
+    const size_t before = openDescriptors();
+    const double seconds = secondsOf([&] {
+        for (int i = 0; i < 6; ++i) {
+            ASSERT_EQ(send({}), 0);
+        }
+    });
+    EXPECT_LT(seconds, 1.0) << "one answer of the server takes longer than six calls";
+    EXPECT_EQ(openDescriptors(), before);
+    EXPECT_EQ(waitpid(-1, nullptr, WNOHANG), 0) << "a zombie";  // the server alone is a child
+
+    close(ends[1]);
+    char end = 0;
+    EXPECT_LT(secondsOf([&] { EXPECT_EQ(read(ends[0], &end, 1), 0); }), 1.0) << "a worker holds the caller's pipe";
+    close(ends[0]);
+    EXPECT_EQ(mailOf(server.received(6)).lines[0], "3") << "deliveries at a time";
+}
+
+TEST_F(Delivery, TheTestNoticeTellsTheOutcomeOfEachChannel) {
+    const Server server("http good");
+    settings(mailTo(kAbsentPort,
+                    "desktop_notify_enabled=\"yes\"\nwebhook_url=\"http://127.0.0.1:" + server.port() + "\"\n"));
+    std::vector<std::string> heard;
+    const auto report = [](const char* channel, int ok, const char* detail, void* context) {
+        static_cast<std::vector<std::string>*>(context)->push_back(
+            std::string(channel) + (ok != 0 ? " ok" : " failed") + (*detail != '\0' ? ", cause" : ""));
+    };
+    EXPECT_EQ(QUORNotifyTest(report, &heard), 3);
+    EXPECT_EQ(heard, (std::vector<std::string>{"desktop ok", "webhook ok", "mail failed, cause"}));
+    settings("");
+    EXPECT_EQ(QUORNotifyTest(report, &heard), 0);
+}
+
+}  // namespace
+}  // namespace quor::test

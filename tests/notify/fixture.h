@@ -1,0 +1,131 @@
+// A fresh world for one test: spool, settings, templates and the servers that notices go to.
+#ifndef TESTS_NOTIFY_FIXTURE_H
+#define TESTS_NOTIFY_FIXTURE_H
+
+#include <fcntl.h>
+#include <gtest/gtest.h>
+#include <sys/file.h>
+#include <unistd.h>
+
+#include <functional>
+#include <map>
+#include <sstream>
+#include <string>
+#include <vector>
+
+#include "common/guards.h"
+#include "common/paths.h"
+#include "quor/quornotify.h"
+#include "support/clock.h"
+#include "support/system_log.h"
+#include "support/temp_folder.h"
+
+namespace quor::test {
+
+// Polls for at most ten seconds.
+inline bool Eventually(const std::function<bool()>& holds) {
+    for (int i = 0; i < 1000; ++i) {
+        if (holds()) {
+            return true;
+        }
+        usleep(10000);
+    }
+    return holds();
+}
+
+// A server of servers.py, with its own folder for what it received.
+class Server {
+  public:
+    explicit Server(const std::string& kindAndMood, const std::string& certificate = "") {
+        const std::string portFile = folder_.path("port");
+        const std::string command = "/usr/bin/python3 " SOURCE_FOLDER "/tests/notify/servers.py " + kindAndMood + " " +
+                                    folder_.path() + " " + certificate + " > " + portFile;
+        pipe_ = popen(command.c_str(), "we");
+        Eventually([&] { return ReadFile(portFile).find('\n') != std::string::npos; });
+        port_ = ReadFile(portFile).substr(0, ReadFile(portFile).find('\n'));
+    }
+    Server(const Server&) = delete;
+    Server& operator=(const Server&) = delete;
+    ~Server() { pclose(pipe_); }
+
+    const std::string& port() const { return port_; }
+    // What the server recorded of its n-th message; empty when none comes.
+    std::string received(int n) const {
+        const std::string path = folder_.path(std::to_string(n));
+        return Eventually([&] { return access(path.c_str(), F_OK) == 0; }) ? ReadFile(path) : "";
+    }
+
+  private:
+    TempFolder folder_;
+    FILE* pipe_ = nullptr;
+    std::string port_;
+};
+
+class Notify : public ::testing::Test {
+  protected:
+    Notify() {
+        std::filesystem::remove_all(paths::kNotifySpool);
+        std::filesystem::create_directories(std::filesystem::path(paths::kSystemSettings).parent_path());
+        std::filesystem::remove(paths::kSystemSettings);
+        CopySystemLogTo(folder_.path("syslog"));
+        folder_.write("T.txt", "Subject\n\nHost %HOST%\n%SYSLOG_CONTENT%\n");
+    }
+    ~Notify() override {
+        EXPECT_TRUE(Eventually([] { return takeSlots().size() == 3; })) << "a worker goes on";
+        std::filesystem::remove(paths::kSystemSettings);
+        CopySystemLogTo("");
+        ResetClock();
+    }
+
+    void settings(const std::string& text) { std::ofstream(paths::kSystemSettings) << text; }
+    std::string mailTo(const std::string& port, const std::string& more = "") {
+        return "smtp_mail_enabled=\"yes\"\nsmtp_server=\"127.0.0.1\"\nsmtp_port=\"" + port +
+               "\"\nsmtp_recipient=\"one@example.com, two@example.com\"\nsmtp_security=\"none\"\n" + more;
+    }
+
+    int send(const std::map<std::string, std::string>& values, const std::string& tag = "T",
+             const std::string& filter = "") {
+        StringTable table(QLIBCSzHashAlloc(16));
+        for (const auto& [key, value] : values) {
+            QLIBSZHASH* raw = table.get();
+            EXPECT_EQ(QLIBCSzHashSetValue(&raw, key.c_str(), value.c_str()), 0);
+        }
+        return QUORSysNotifySendNotificationCustomized(tag.c_str(), texts_.c_str(), filter.c_str(), table.get(), 0);
+    }
+
+    // The workers' slots that are free, held as long as the result lives.
+    static std::vector<Descriptor> takeSlots() {
+        std::filesystem::create_directories(paths::kNotifySpool);
+        std::vector<Descriptor> taken;
+        for (const char* name : {"/worker0", "/worker1", "/worker2"}) {
+            Descriptor slot(
+                open((paths::kNotifySpool + std::string(name)).c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0600));
+            if (flock(slot.get(), LOCK_EX | LOCK_NB) == 0) {
+                taken.push_back(std::move(slot));
+            }
+        }
+        return taken;
+    }
+
+    static std::vector<std::string> linesOf(const std::string& text) {
+        std::vector<std::string> lines;
+        std::istringstream stream(text);
+        for (std::string line; std::getline(stream, line);) {
+            lines.push_back(line);
+        }
+        return lines;
+    }
+    // The lines of a file that workers append to, once there are that many.
+    static std::vector<std::string> awaitLines(const std::string& path, size_t count) {
+        Eventually([&] { return linesOf(ReadFile(path)).size() >= count; });
+        return linesOf(ReadFile(path));
+    }
+    std::vector<std::string> systemLog(size_t count) { return awaitLines(folder_.path("syslog"), count); }
+
+    TempFolder folder_;
+    std::string texts_ = folder_.path();
+};
+
+}  // namespace quor::test
+
+#endif

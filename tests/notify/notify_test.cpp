@@ -1,0 +1,200 @@
+#include <json/reader.h>
+#include <json/value.h>
+
+#include "notify/fixture.h"
+
+namespace quor::test {
+namespace {
+
+constexpr const char kDesktopOn[] = "desktop_notify_enabled=\"yes\"\n";
+const std::string kSpool = paths::kNotifySpool;
+
+// Notices as they arrive on the desktop.
+class Notices : public Notify {
+  protected:
+    Notices() { settings(kDesktopOn); }
+
+    static std::vector<Json::Value> arrived(size_t count) {
+        std::vector<Json::Value> notices;
+        for (const std::string& line : awaitLines(kSpool + "/desktop.jsonl", count)) {
+            Json::Reader reader(Json::Features::strictMode());
+            EXPECT_TRUE(reader.parse(line, notices.emplace_back())) << line;
+        }
+        EXPECT_EQ(notices.size(), count);
+        notices.resize(count);
+        return notices;
+    }
+
+    // Sends one notice and waits for it: workers side by side may change the order.
+    Json::Value sent(const std::map<std::string, std::string>& values, const std::string& tag = "T",
+                     const std::string& filter = "") {
+        EXPECT_EQ(send(values, tag, filter), 0);
+        return arrived(++sent_).back();
+    }
+
+  private:
+    size_t sent_ = 0;
+};
+
+TEST_F(Notices, ShowValuesAsTheyWereReceived) {
+    struct Case {
+        const char* text;
+        std::map<std::string, std::string> values;
+        const char* subject;
+        const char* body;
+    };
+    const std::vector<Case> cases{
+        {"%A% of %\n\n100%%A%% %B\n", {{"%A%", "x"}}, "x of %", "100%x% %B\n"},
+        {"S\r\n\r\nHost: %HOST%\r\nEnd", {}, "S", "End\n"},
+        {"%NONE%s\nno blank line\n", {}, "s", "no blank line\n"},
+        {"%A%\n\n%A%\n", {{"%A%", "%HOST%"}, {"%HOST%", "h"}}, "%HOST%", "%HOST%\n"},
+        {"S\n\n%SYSLOG_CONTENT%|%A%\n", {{"%SYSLOG_CONTENT%", R"(\"\\n\x)"}, {"%A%", R"(\")"}}, "S", "\"\\n\\x|\\\"\n"},
+        {"%A%\n\n%A%\n", {{"%A%", "a\r\nBcc: x\x1b[31m\x7f"}}, "a  Bcc: x [31m ", "a\r\nBcc: x\x1b[31m\x7f\n"},
+        {"%A%\n\n%A%\n",
+         {{"%A%", "\xE9\xED\xA0\x80\xC0\xAF\xF4\x90\x80\x80z"}},
+         "\xEF\xBF\xBD\xEF\xBF\xBD\xEF\xBF\xBD\xEF\xBF\xBD\xEF\xBF\xBD\xEF\xBF\xBD\xEF\xBF\xBD\xEF\xBF\xBD\xEF\xBF\xBD"
+         "\xEF\xBF\xBDz",
+         "\xEF\xBF\xBD\xEF\xBF\xBD\xEF\xBF\xBD\xEF\xBF\xBD\xEF\xBF\xBD\xEF\xBF\xBD\xEF\xBF\xBD\xEF\xBF\xBD\xEF\xBF\xBD"
+         "\xEF\xBF\xBDz\n"},
+    };
+    Json::Value notice;
+    for (const Case& c : cases) {
+        SCOPED_TRACE(c.text);
+        folder_.write("T.txt", c.text);
+        notice = sent(c.values);
+        EXPECT_EQ(notice["subject"].asString(), c.subject);
+        EXPECT_EQ(notice["body"].asString(), c.body);
+    }
+    EXPECT_EQ(notice["bodyBase64"].asString(), "6e2ggMCv9JCAgHoK");
+}
+
+TEST_F(Notices, FailWithoutATemplateThatHasASubject) {
+    folder_.write("EMPTY.txt", "");
+    folder_.write("BLANK.txt", " \n\nbody\n");
+    for (const char* tag : {"EMPTY", "BLANK", "MISSING", "", "../T", "./T"}) {
+        EXPECT_LT(send({}, tag), 0) << tag;
+    }
+    settings("");
+    EXPECT_EQ(send({}), 0);
+    std::filesystem::remove(paths::kSystemSettings);
+    EXPECT_EQ(send({}), 0);
+    EXPECT_FALSE(std::filesystem::exists(kSpool)) << "no channel, nothing to do";
+    EXPECT_LT(QUORSysNotifySendNotificationCustomized(nullptr, "", "", nullptr, 0), 0);
+}
+
+TEST_F(Notices, TheShippedFilesServeEveryTag) {
+    texts_ = SOURCE_FOLDER "/texts";
+    std::filesystem::copy_file(SOURCE_FOLDER "/etc/quorinfo.conf.example", paths::kSystemSettings,
+                               std::filesystem::copy_options::overwrite_existing);
+    std::map<std::string, std::string> values{{"DESKTOP_NOTIFY_CLASSNAME", "App"}};
+    for (const char* name : {"EPS", "SEV", "KEYWORD", "SYSLOG_CONTENT", "SHARED_FOLDER", "DBPATH"}) {
+        values["%" + std::string(name) + "%"] = "<" + std::string(name) + ">";
+    }
+    const std::vector<std::pair<const char*, const char*>> tags{{"EPS_EXCEED", "<EPS>"},
+                                                                {"SEV_EXCEED", "<SYSLOG_CONTENT>"},
+                                                                {"KEYWORD_MATCH", "<SYSLOG_CONTENT>"},
+                                                                {"VOL_FULL", "<SHARED_FOLDER>"},
+                                                                {"DB_CORRUPT", "<DBPATH>"},
+                                                                {"ShareRemove", "<SHARED_FOLDER>"},
+                                                                {"ShareRename", "<SHARED_FOLDER>"},
+                                                                {"ShareEncMount", "<SHARED_FOLDER>"},
+                                                                {"ShareEncUnmount", "<SHARED_FOLDER>"}};
+    for (const auto& [tag, value] : tags) {
+        const Json::Value notice = sent(values, "QUORSYSLOG_" + std::string(tag), SOURCE_FOLDER "/etc/notify.filter");
+        EXPECT_EQ(notice["class"].asString(), "App");
+        EXPECT_NE(notice["body"].asString().find(value), std::string::npos) << tag;
+        EXPECT_EQ(notice["body"].asString().find("Host"), std::string::npos) << tag;
+    }
+}
+
+TEST_F(Notices, KeepTheIntervalOfTheirTagAndHost) {
+    const std::string filter = folder_.write("filter", "[T]\ninterval=\"60\"\n[M]\nchannels=\"mail\"\n");
+    folder_.write("M.txt", "Subject\n");
+    struct Step {
+        time_t now;
+        std::string host;
+        int suppressed;  // of the notice that arrives; -1 when none does
+    };
+    const std::string hostile = "\n../\x1b" + std::string(300, 'x');
+    const std::vector<Step> steps{{1000, "a", 0}, {1059, "a", -1},    {1059, "b", 0},
+                                  {1059, "", 0},  {1001, hostile, 0}, {1002, hostile, -1},
+                                  {1060, "a", 1}, {1061, "a", -1},    {500, "a", 1} /* the clock was set back */,
+                                  {559, "a", -1}, {560, "a", 1}};
+    for (const Step& step : steps) {
+        SCOPED_TRACE(step.now);
+        SetClock(step.now);
+        const std::map<std::string, std::string> noHost;
+        const auto values = step.host.empty() ? noHost : decltype(noHost){{"%HOST%", step.host}};
+        if (step.suppressed < 0) {
+            ASSERT_EQ(send(values, "T", filter), 0);
+        } else {
+            const Json::Value notice = sent(values, "T", filter);
+            EXPECT_EQ(notice["time"].asInt64(), step.now);
+            EXPECT_EQ(notice["suppressed"].asInt(), step.suppressed);
+        }
+        ASSERT_EQ(send({}, "M", filter), 0) << "a channel that is not set up";
+    }
+}
+
+TEST_F(Notices, TheLedgerStaysSmallAndReadable) {
+    const std::string filter = folder_.write("filter", "[T]\nchannels=\"desktop\"\ninterval=\"60\"\n");
+    std::filesystem::create_directories(kSpool);
+    std::ofstream(kSpool + "/ledger") << std::string(100000, '\xFF') << "cut";
+    for (int host = 0; host < 400; ++host) {
+        ASSERT_EQ(send({{"%HOST%", std::to_string(host)}}, "T", filter), 0);
+    }
+    EXPECT_EQ(std::filesystem::file_size(kSpool + "/ledger"), 512U * 256U);
+}
+
+TEST_F(Notices, PastTheBoundOfTheQueueAreCounted) {
+    ASSERT_EQ(send({}), 0);
+    arrived(1);
+    std::vector<Descriptor> slots;
+    ASSERT_TRUE(Eventually([&] { return (slots = takeSlots()).size() == 3; }));
+    std::ofstream(kSpool + "/queue/00000000000000000000") << "not a notice";
+    for (int i = 0; i < 210; ++i) {
+        ASSERT_EQ(send({{"%SYSLOG_CONTENT%", std::to_string(i)}}), 0);
+    }
+    slots.clear();
+    ASSERT_EQ(send({}), 0) << "held back too, but it starts a worker";
+    EXPECT_EQ(arrived(200).back()["body"].asString(), "198\n");
+    ASSERT_EQ(send({}), 0);
+    EXPECT_EQ(arrived(201).back()["suppressed"].asInt(), 12);
+}
+
+TEST_F(Notices, TheDesktopSpoolIsTurnedOver) {
+    ASSERT_EQ(send({}), 0);
+    arrived(1);
+    std::ofstream(kSpool + "/desktop.jsonl") << std::string(1U << 20U, '\n');
+    ASSERT_EQ(send({}), 0);
+    EXPECT_TRUE(Eventually([] { return std::filesystem::exists(kSpool + "/desktop.jsonl.1"); }));
+    arrived(1);
+    EXPECT_EQ(std::filesystem::status(kSpool + "/desktop.jsonl").permissions(), std::filesystem::perms{0600});
+    EXPECT_EQ(std::filesystem::status(kSpool).permissions(), std::filesystem::perms{0700});
+}
+
+TEST_F(Notices, SettingsAreReadWithTheirDefaults) {
+    struct Case {
+        const char* text;
+        int security, port, verify, sms;
+    };
+    for (const Case& c : {Case{"", 1, 587, 1, 0}, Case{"smtp_security=\"none\"\nsms_enabled=\"yes\"\n", 0, 25, 1, 1},
+                          Case{"smtp_security=tls\nsmtp_tls_verify=no\nsms_enabled=1\n", 2, 465, 0, 0},
+                          Case{"smtp_security=\"word\"\nsmtp_port=\"70000\"\n", 1, 587, 1, 0}}) {
+        SCOPED_TRACE(c.text);
+        settings(c.text);
+        QUORMAIL mail;
+        ASSERT_EQ(QUORMailGet(&mail), 0);
+        EXPECT_EQ(std::tie(mail.security, mail.port, mail.verify), std::tie(c.security, c.port, c.verify));
+        const std::unique_ptr<QUORSMSCONF, Releaser<QUORSmsConfFree>> sms(QUORSmsConfGet());
+        EXPECT_EQ(sms->enabled, c.sms);
+    }
+    std::filesystem::remove(paths::kSystemSettings);
+    QUORMAIL mail;
+    EXPECT_LT(QUORMailGet(&mail), 0);
+    EXPECT_EQ(QUORSmsConfGet(), nullptr);
+    EXPECT_LT(QUORNotifyTest([](const char*, int, const char*, void*) {}, nullptr), 0);
+}
+
+}  // namespace
+}  // namespace quor::test
