@@ -36,6 +36,9 @@ void DBHandler::DBErrorHandle(std::string sql) {
             priority = LOG_INFO;
         }
         break;
+    case SQLITE_CORRUPT:
+        (void)DBErrorHandle_SQLITE_CORRUPT(connection_, dbPath_);  // it reports its own failures
+        break;
     case SQLITE_BUSY:
     case SQLITE_EMPTY:
     case SQLITE_NOTADB:

@@ -101,3 +101,36 @@ TEST_F(Failure, OfAConstraintIsAnError) {
     ASSERT_EQ(lines.size(), 1U);
     EXPECT_EQ(lines[0].priority, LOG_ERR);
 }
+
+TEST_F(Failure, OfACorruptDatabaseMovesItAsideAfterTheNotice) {
+    corrupt();
+    folder_.write("log.db.corrupt", "older");
+    bool stillThere = false;
+    FakeNotices().onSend = [&] { stillThere = std::filesystem::exists(path_) && FakeServices().reloaded.empty(); };
+
+    const auto lines = linesOf("SELECT sum(length(msg)) FROM logs WHERE msg LIKE 'x%'");
+    EXPECT_TRUE(stillThere) << "the notice goes out first";
+    ASSERT_EQ(FakeNotices().sent.size(), 1U);
+    EXPECT_EQ(FakeNotices().sent[0].tag, "QUORSYSLOG_DB_CORRUPT");
+    EXPECT_EQ(FakeNotices().sent[0].values["%DBPATH%"], path_);
+    EXPECT_EQ(FakeServices().reloaded, Strings({"service syslog-ng"}));
+    EXPECT_FALSE(std::filesystem::exists(path_));
+    EXPECT_GT(std::filesystem::file_size(path_ + ".corrupt"), 80000U);
+    ASSERT_FALSE(lines.empty());
+    EXPECT_EQ(lines.back().priority, LOG_ERR);
+    EXPECT_NE(lines.back().text.find("error code is : 11, "), std::string::npos) << lines.back().text;
+}
+
+TEST_F(Failure, ToMoveTheFileStillSendsTheNotice) {
+    EXPECT_EQ(DBErrorHandle_SQLITE_CORRUPT(nullptr, folder_.path("none.db")), -1);
+    EXPECT_EQ(FakeNotices().sent.size(), 1U);
+    EXPECT_TRUE(FakeServices().reloaded.empty());
+}
+
+TEST_F(Failure, ToReloadIsReported) {
+    FakeServices().fail = true;
+    FakeNotices().fail = true;
+    EXPECT_EQ(DBErrorHandle_SQLITE_CORRUPT(nullptr, folder_.write("log.db", "x")), -1);
+    EXPECT_TRUE(std::filesystem::exists(path_ + ".corrupt"));
+    EXPECT_EQ(TakeSystemLog().back().text, "dbhandler:88 Fail to send HUP signal to syslog-ng");
+}

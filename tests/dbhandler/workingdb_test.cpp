@@ -52,7 +52,7 @@ TEST_F(WorkingDb, IsRemovedAboveItsLimitInWholeKibibytes) {
         int limitKB;
         bool kept;
     };
-    for (const Case& c : {Case{3 * 1024 + 1023, 3, true}, Case{4 * 1024, 3, false}, Case{0, 0, true},
+    for (const Case& c : {Case{3 * 1024ULL + 1023, 3, true}, Case{4 * 1024ULL, 3, false}, Case{0, 0, true},
                           Case{0, -1, false}, Case{5ULL << 40, 2147483647, false}}) {
         SCOPED_TRACE(testing::Message() << c.bytes << " bytes, limit " << c.limitKB);
         FakeServices() = {};

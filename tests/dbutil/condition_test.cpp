@@ -26,7 +26,7 @@ TEST(Condition, EscapesTheValueForItsOperator) {
     for (const Case& c : {
              Case{SYSLOG_ATTRI_HOST, 0, "ab", "(host = 'ab')"},
              Case{SYSLOG_ATTRI_HOST, 1, "O'Neil", "(host != 'O''Neil')"},
-             Case{SYSLOG_ATTRI_HOST, 0, "a\\%_*?[]", "(host = 'a\\%_*?[]')"},
+             Case{SYSLOG_ATTRI_HOST, 0, R"(a\%_*?[])", R"((host = 'a\%_*?[]'))"},
              Case{SYSLOG_ATTRI_MSG, 6, "a*b", "(msg LIKE 'a%b' escape '\\')"},
              Case{SYSLOG_ATTRI_MSG, 7, "50%_*?\\'", "(msg NOT LIKE '50\\%\\_%_\\\\''' escape '\\')"},
              Case{SYSLOG_ATTRI_MSG, 8, "[x]", "(msg GLOB '[[]x[]]')"},
