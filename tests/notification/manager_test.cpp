@@ -34,7 +34,7 @@ class Manager : public testing::Test {
 };
 
 TEST_F(Manager, ReportsAMissingRuleFile) {
-    ASSERT_FALSE(std::filesystem::exists(quor::paths::kNotifyRules));
+    std::filesystem::remove(quor::paths::kNotifyRules);
     const NotificationManager another;
     EXPECT_EQ(TakeSystemLogTexts(), (Lines{"Fail to do QLIBCFileEnumSection", "Fail to load configuration"}));
 }
