@@ -1,0 +1,59 @@
+// quorlog: the command line over the log library.
+#include <fcntl.h>
+#include <unistd.h>
+
+#include <CLI/CLI.hpp>
+#include <cstdio>
+#include <iostream>
+
+#include "commands.h"
+#include "failure.h"
+#include "text.h"
+
+namespace {
+
+using quor::cli::kFailed;
+
+int fail(const std::string& text) {
+    std::cerr << "quorlog: " << text << '\n';
+    return kFailed;
+}
+
+// Help is an error to the parser, too.
+int parseFailed(const CLI::App& app, const CLI::ParseError& error) {
+    if (error.get_exit_code() == 0) {
+        app.exit(error);
+        return std::cout.flush() ? quor::cli::kDone : kFailed;
+    }
+    return fail(quor::cli::Visible(error.what()) + "; see quorlog --help-all");
+}
+
+int run(int argc, char** argv) {
+    CLI::App app;
+    app.name("quorlog");
+    int status = quor::cli::kDone;
+    try {
+        quor::cli::AddCommands(app, status);
+        app.parse(argc, argv);
+        return status;
+    } catch (const CLI::ParseError& error) {
+        return parseFailed(app, error);
+    } catch (const quor::cli::Failure& failure) {
+        return fail(failure.what());
+    }
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+    if (fcntl(STDOUT_FILENO, F_GETFD) < 0) {
+        (void)fputs("quorlog: standard output is closed; open it, or send it to /dev/null\n", stderr);
+        return kFailed;
+    }
+    try {
+        return run(argc, argv);
+    } catch (...) {
+        (void)fputs("quorlog: out of memory; ask for fewer rows with --limit\n", stderr);  // nothing else ends here
+        return kFailed;
+    }
+}

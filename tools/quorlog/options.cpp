@@ -1,0 +1,92 @@
+#include "options.h"
+
+#include <algorithm>
+#include <charconv>
+#include <cstdlib>
+#include <map>
+
+#include "common/paths.h"
+#include "records.h"
+#include "text.h"
+
+namespace quor::cli {
+namespace {
+
+const std::map<std::string, Format> kFormats = {
+    {"table", Format::Table}, {"json", Format::Json}, {"csv", Format::Csv}, {"ndjson", Format::Ndjson}};
+
+bool wantsColor() {
+    const char* noColor = getenv("NO_COLOR");
+    const char* terminal = getenv("TERM");
+    return (noColor == nullptr || *noColor == '\0') && terminal != nullptr && std::string(terminal) != "dumb";
+}
+
+// An option that may be given several times; its values are joined like a list.
+void addList(CLI::App& command, const std::string& name, std::string& value, const std::string& help) {
+    command.add_option(name, value, help)->type_name("NAMES")->join(',')->group("Filters");
+}
+
+CLI::Option* addFilter(CLI::App& command, const std::string& name, std::string& value, const std::string& type,
+                       const std::string& help) {
+    return command.add_option(name, value, help)->type_name(type)->group("Filters");
+}
+
+}  // namespace
+
+Style OutputOptions::style() const {
+    Style style;
+    style.format = kFormats.at(format);
+    style.safeCsv = safeCsv;
+    style.terminal = isatty(STDOUT_FILENO) == 1;
+    style.color = style.terminal && wantsColor();
+    return style;
+}
+
+void AddDatabaseOption(CLI::App& command, std::string& db) {
+    command.add_option("--db", db, "Database file")->type_name("PATH")->capture_default_str();
+}
+
+void AddTableOption(CLI::App& command, std::string& table) {
+    command.add_option("--table", table, "Table to read")
+        ->type_name("NAME")
+        ->capture_default_str()
+        ->check(CLI::IsMember(std::vector<std::string>(kLogTables.begin(), kLogTables.end())));
+}
+
+void AddFilterOptions(CLI::App& command, FilterOptions& filters) {
+    addList(command, "--host", filters.host, "Sending hosts");
+    addList(command, "--level", filters.level, "Levels: err, crit; err+ is err and worse");
+    addList(command, "--facility", filters.facility, "Facilities: kern, auth");
+    addList(command, "--program", filters.program, "Programs");
+    CLI::Option* keyword = addFilter(command, "--keyword", filters.keyword, "TEXT", "Messages that contain the text");
+    addFilter(command, "--glob", filters.glob, "PATTERN", "Whole messages; * any text, ? any character")
+        ->excludes(keyword);
+    addFilter(command, "--from", filters.from, "DATE", "First day: YYYY-MM-DD, today, yesterday, 7d");
+    addFilter(command, "--to", filters.to, "DATE", "Last day");
+}
+
+void AddOutputOptions(CLI::App& command, OutputOptions& output) {
+    command.add_option("--format", output.format, "Form of the output: table, json, csv, ndjson")
+        ->type_name("NAME")
+        ->capture_default_str()
+        ->check(CLI::IsMember({"table", "json", "csv", "ndjson"}));
+    command.add_flag("--safe-csv", output.safeCsv, "csv: put ' before cells that a spreadsheet takes for a formula");
+}
+
+void AddYesOption(CLI::App& command, bool& yes) {
+    command.add_flag("--yes", yes, "Do not ask");
+}
+
+CLI::Option* AddNumberOption(CLI::App& command, const std::string& name, uint64_t& value, const std::string& help) {
+    const auto parse = [&value, name](const std::vector<std::string>& given) {
+        const std::string& text = given.back();
+        const auto result = std::from_chars(text.data(), text.data() + text.size(), value);
+        if (result.ec != std::errc() || result.ptr != text.data() + text.size()) {
+            throw Failure(name + ": not a number: '" + Visible(text) + "'; give digits only");
+        }
+        return true;
+    };
+    return command.add_option(name, parse, help)->type_name("NUMBER");
+}
+
+}  // namespace quor::cli

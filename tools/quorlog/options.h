@@ -1,0 +1,48 @@
+// Options that several commands share.
+#ifndef QUORLOG_OPTIONS_H
+#define QUORLOG_OPTIONS_H
+
+#include <unistd.h>
+
+#include <CLI/CLI.hpp>
+#include <cstdint>
+#include <memory>
+#include <string>
+
+#include "failure.h"
+#include "filters.h"
+#include "output.h"
+
+namespace quor::cli {
+
+struct OutputOptions {
+    std::string format = "table";
+    bool safeCsv = false;
+
+    // Colour and visible text depend on what standard output is.
+    Style style() const;
+};
+
+void AddDatabaseOption(CLI::App& command, std::string& db);
+void AddTableOption(CLI::App& command, std::string& table);
+void AddFilterOptions(CLI::App& command, FilterOptions& filters);
+void AddOutputOptions(CLI::App& command, OutputOptions& output);
+void AddYesOption(CLI::App& command, bool& yes);
+
+// Accepts decimal digits that fit 64 bits.
+CLI::Option* AddNumberOption(CLI::App& command, const std::string& name, uint64_t& value, const std::string& help);
+
+// A subcommand whose exit status is what `run` returns for its options.
+template <typename Options>
+CLI::App& AddCommand(CLI::App& parent, const std::string& name, const std::string& help, int& status,
+                     void (*setup)(CLI::App&, Options&), int (*run)(const Options&)) {
+    CLI::App& command = *parent.add_subcommand(name, help);
+    const auto options = std::make_shared<Options>();
+    setup(command, *options);
+    command.callback([options, run, &status] { status = run(*options); });
+    return command;
+}
+
+}  // namespace quor::cli
+
+#endif

@@ -1,0 +1,159 @@
+#include "output.h"
+
+#include <unistd.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <cstring>
+
+#include "failure.h"
+#include "text.h"
+
+namespace quor::cli {
+namespace {
+
+// An object of one row.
+void appendObject(std::string& out, const Columns& columns, const Cells& cells) {
+    char separator = '{';
+    for (size_t i = 0; i < columns.size(); ++i) {
+        out += separator;
+        separator = ',';
+        out += '"';
+        out += columns[i].name;
+        out += "\":";
+        if (columns[i].kind == Kind::Number) {
+            out += cells[i];
+        } else {
+            AppendJsonString(out, cells[i]);
+        }
+    }
+    out += '}';
+}
+
+class NdjsonSink : public RowSink {
+  public:
+    NdjsonSink(Columns columns, Output& out) : RowSink(std::move(columns), out) {}
+
+    void row(const Cells& cells) override {
+        appendObject(out_.buffer(), columns_, cells);
+        out_.buffer() += '\n';
+        out_.drain();
+    }
+};
+
+class JsonSink : public RowSink {
+  public:
+    JsonSink(Columns columns, Output& out) : RowSink(std::move(columns), out) {}
+
+    void row(const Cells& cells) override {
+        out_.buffer() += empty_ ? "[" : ",\n";
+        empty_ = false;
+        appendObject(out_.buffer(), columns_, cells);
+        out_.drain();
+    }
+
+    void finish() override {
+        out_.buffer() += empty_ ? "[]\n" : "]\n";
+        flush();
+    }
+
+  private:
+    bool empty_ = true;
+};
+
+class CsvSink : public RowSink {
+  public:
+    CsvSink(const Style& style, Columns columns, Output& out) : RowSink(std::move(columns), out), style_(style) {
+        Cells names;
+        for (const Column& column : columns_) {
+            names.emplace_back(column.name);
+        }
+        CsvSink::row(names);
+    }
+
+    void row(const Cells& cells) override {
+        for (size_t i = 0; i < cells.size(); ++i) {
+            out_.buffer() += i == 0 ? "" : ",";
+            append(cells[i], columns_[i].kind);
+        }
+        out_.buffer() += "\r\n";
+        out_.drain();
+    }
+
+  private:
+    void append(std::string_view cell, Kind kind) {
+        visible_.clear();
+        if (style_.terminal) {
+            AppendVisible(visible_, cell);
+            cell = visible_;
+        }
+        AppendCsvCell(out_.buffer(), cell, style_.safeCsv && kind != Kind::Number);
+    }
+
+    Style style_;
+    std::string visible_;
+};
+
+void writeBelowEachOther(const std::vector<Value>& values, Output& out) {
+    size_t width = 0;
+    for (const Value& value : values) {
+        width = std::max(width, strlen(value.name));
+    }
+    for (const Value& value : values) {
+        std::string& line = out.buffer().append(value.name);
+        line.append(width - strlen(value.name) + 2, ' ');
+        AppendVisible(line, value.text);
+        line += '\n';
+    }
+    out.flush();
+}
+
+}  // namespace
+
+void Output::flush() {
+    std::string_view rest = buffer_;
+    while (!rest.empty()) {
+        const ssize_t written = write(fd_, rest.data(), rest.size());
+        if (written < 0 && errno == EINTR) {
+            continue;
+        }
+        if (written < 0) {
+            const std::string cause = strerror(errno);
+            buffer_.clear();
+            throw Failure("cannot write the output: " + cause + "; see that its reader runs and its disk has room");
+        }
+        rest.remove_prefix(static_cast<size_t>(written));
+    }
+    buffer_.clear();
+}
+
+std::unique_ptr<RowSink> MakeSink(const Style& style, Columns columns, Output& out) {
+    switch (style.format) {
+    case Format::Json:
+        return std::make_unique<JsonSink>(std::move(columns), out);
+    case Format::Ndjson:
+        return std::make_unique<NdjsonSink>(std::move(columns), out);
+    case Format::Csv:
+        return std::make_unique<CsvSink>(style, std::move(columns), out);
+    default:
+        return MakeTable(style.color, std::move(columns), out);
+    }
+}
+
+void WriteRecord(const Style& style, const std::vector<Value>& values, Output& out) {
+    Columns columns;
+    Cells cells;
+    for (const Value& value : values) {
+        columns.push_back({value.name, value.kind});
+        cells.emplace_back(value.text);
+    }
+    if (style.format == Format::Table) {
+        writeBelowEachOther(values, out);
+        return;
+    }
+    const auto sink = MakeSink(style, std::move(columns), out);
+    sink->row(cells);
+    sink->finish();
+}
+
+}  // namespace quor::cli

@@ -1,0 +1,93 @@
+// Rows to standard output, in the form that was asked for.
+#ifndef QUORLOG_OUTPUT_H
+#define QUORLOG_OUTPUT_H
+
+#include <memory>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace quor::cli {
+
+// Buffered writing to a file descriptor. A failed write throws Failure.
+class Output {
+  public:
+    explicit Output(int fd) : fd_(fd) {}
+    Output(const Output&) = delete;
+    Output& operator=(const Output&) = delete;
+
+    // What is appended here is written by the next drain() or flush().
+    std::string& buffer() { return buffer_; }
+    // Writes when a good deal has gathered.
+    void drain() {
+        if (buffer_.size() >= kFull) {
+            flush();
+        }
+    }
+    void flush();
+
+  private:
+    static constexpr size_t kFull = size_t{64} * 1024;
+
+    std::string buffer_;
+    int fd_;
+};
+
+enum class Format { Table, Json, Csv, Ndjson };
+
+struct Style {
+    Format format = Format::Table;
+    bool safeCsv = false;   // defuse what a spreadsheet takes for a formula
+    bool terminal = false;  // a terminal reads: nothing raw may reach it
+    bool color = false;
+};
+
+enum class Kind {
+    Text,
+    Number,  // cells are valid JSON numbers
+    Level,   // a severity's name
+};
+
+struct Column {
+    const char* name;
+    Kind kind = Kind::Text;
+};
+
+using Columns = std::vector<Column>;
+using Cells = std::vector<std::string_view>;
+
+// Takes one row after another; every row has as many cells as there are columns.
+class RowSink {
+  public:
+    RowSink(const RowSink&) = delete;
+    RowSink& operator=(const RowSink&) = delete;
+    virtual ~RowSink() = default;
+
+    virtual void row(const Cells& cells) = 0;
+    // Lets the reader see the rows so far.
+    virtual void flush() { out_.flush(); }
+    // Ends the output; no row follows.
+    virtual void finish() { flush(); }
+
+  protected:
+    RowSink(Columns columns, Output& out) : columns_(std::move(columns)), out_(out) {}
+
+    const Columns columns_;
+    Output& out_;
+};
+
+std::unique_ptr<RowSink> MakeSink(const Style& style, Columns columns, Output& out);
+// The aligned table, as MakeSink() makes it. A table of one column has no heading.
+std::unique_ptr<RowSink> MakeTable(bool color, Columns columns, Output& out);
+
+// One thing with named values: a table shows them below each other, the other forms as one row.
+struct Value {
+    const char* name;
+    std::string text;
+    Kind kind = Kind::Text;
+};
+void WriteRecord(const Style& style, const std::vector<Value>& values, Output& out);
+
+}  // namespace quor::cli
+
+#endif

@@ -1,0 +1,105 @@
+// Decoding of UTF-8, and what a terminal does with a character. The tables keep alignment right for the scripts and
+// symbols that occur in logs, without asking the locale.
+#include <algorithm>
+#include <cstdint>
+
+#include "text.h"
+
+namespace quor::cli {
+namespace {
+
+struct Range {
+    char32_t first;
+    char32_t last;
+};
+
+constexpr Range kZeroWidth[] = {
+    {0x0300, 0x036F}, {0x0483, 0x0489},   {0x0591, 0x05BD}, {0x05BF, 0x05BF}, {0x05C1, 0x05C2}, {0x05C4, 0x05C5},
+    {0x05C7, 0x05C7}, {0x0610, 0x061A},   {0x064B, 0x065F}, {0x0670, 0x0670}, {0x06D6, 0x06DC}, {0x06DF, 0x06E4},
+    {0x06E7, 0x06E8}, {0x06EA, 0x06ED},   {0x0900, 0x0902}, {0x093A, 0x093A}, {0x093C, 0x093C}, {0x0941, 0x0948},
+    {0x094D, 0x094D}, {0x0E31, 0x0E31},   {0x0E34, 0x0E3A}, {0x0E47, 0x0E4E}, {0x1160, 0x11FF}, {0x1AB0, 0x1AFF},
+    {0x1DC0, 0x1DFF}, {0x200C, 0x200D},   {0x20D0, 0x20FF}, {0x302A, 0x302D}, {0x3099, 0x309A}, {0xFE00, 0xFE0F},
+    {0xFE20, 0xFE2F}, {0xE0100, 0xE01EF},
+};
+
+constexpr Range kWide[] = {
+    {0x1100, 0x115F},   {0x231A, 0x231B},   {0x2329, 0x232A},   {0x23E9, 0x23EC},   {0x23F0, 0x23F0},
+    {0x23F3, 0x23F3},   {0x25FD, 0x25FE},   {0x2614, 0x2615},   {0x2648, 0x2653},   {0x267F, 0x267F},
+    {0x2693, 0x2693},   {0x26A1, 0x26A1},   {0x26AA, 0x26AB},   {0x26BD, 0x26BE},   {0x26C4, 0x26C5},
+    {0x26CE, 0x26CE},   {0x26D4, 0x26D4},   {0x26EA, 0x26EA},   {0x26F2, 0x26F3},   {0x26F5, 0x26F5},
+    {0x26FA, 0x26FA},   {0x26FD, 0x26FD},   {0x2705, 0x2705},   {0x270A, 0x270B},   {0x2728, 0x2728},
+    {0x274C, 0x274C},   {0x274E, 0x274E},   {0x2753, 0x2755},   {0x2757, 0x2757},   {0x2795, 0x2797},
+    {0x27B0, 0x27B0},   {0x27BF, 0x27BF},   {0x2B1B, 0x2B1C},   {0x2B50, 0x2B50},   {0x2B55, 0x2B55},
+    {0x2E80, 0x303E},   {0x3041, 0x4DBF},   {0x4E00, 0xA4CF},   {0xA960, 0xA97F},   {0xAC00, 0xD7A3},
+    {0xF900, 0xFAFF},   {0xFE10, 0xFE19},   {0xFE30, 0xFE6F},   {0xFF00, 0xFF60},   {0xFFE0, 0xFFE6},
+    {0x16FE0, 0x18AFF}, {0x1B000, 0x1B2FF}, {0x1F004, 0x1F004}, {0x1F0CF, 0x1F0CF}, {0x1F18E, 0x1F18E},
+    {0x1F191, 0x1F19A}, {0x1F200, 0x1F320}, {0x1F32D, 0x1F64F}, {0x1F680, 0x1F6FF}, {0x1F7E0, 0x1F7EB},
+    {0x1F90C, 0x1F9FF}, {0x1FA70, 0x1FAFF}, {0x20000, 0x3FFFD},
+};
+
+constexpr Range kHidden[] = {
+    {0x0000, 0x001F}, {0x007F, 0x009F}, {0x00AD, 0x00AD}, {0x061C, 0x061C}, {0x115F, 0x1160},
+    {0x180B, 0x180F}, {0x200B, 0x200B}, {0x200E, 0x200F}, {0x2028, 0x202E}, {0x2060, 0x206F},
+    {0x3164, 0x3164}, {0xFEFF, 0xFEFF}, {0xFFA0, 0xFFA0}, {0xFFF9, 0xFFFB}, {0xE0000, 0xE007F},
+};
+
+template <size_t N>
+bool isIn(const Range (&ranges)[N], char32_t code) {
+    const Range* next = std::upper_bound(std::begin(ranges), std::end(ranges), code,
+                                         [](char32_t value, const Range& range) { return value < range.first; });
+    return next != std::begin(ranges) && code <= std::prev(next)->last;
+}
+
+// How the lead byte of a sequence of two to four bytes begins it, and the smallest value that needs that length.
+struct Lead {
+    uint8_t mask;
+    uint8_t bits;
+    char32_t smallest;
+};
+
+constexpr Lead kLeads[] = {{0xE0, 0xC0, 0x80}, {0xF0, 0xE0, 0x800}, {0xF8, 0xF0, 0x10000}};
+
+bool isContinuation(uint8_t byte) {
+    return (byte & 0xC0) == 0x80;
+}
+
+bool isScalar(char32_t code) {
+    return code <= 0x10FFFF && (code < 0xD800 || code > 0xDFFF);
+}
+
+}  // namespace
+
+Symbol NextSymbol(std::string_view text, size_t at) {
+    const auto byteAt = [&](size_t i) { return static_cast<uint8_t>(text[i]); };
+    const uint8_t first = byteAt(at);
+    const Symbol single{first, 1, first < 0x80};
+    size_t length = 2;
+    for (const Lead& lead : kLeads) {
+        if ((first & lead.mask) != lead.bits) {
+            ++length;
+            continue;
+        }
+        char32_t code = first & static_cast<uint8_t>(~lead.mask);
+        for (size_t i = 1; i < length; ++i) {
+            if (at + i >= text.size() || !isContinuation(byteAt(at + i))) {
+                return single;
+            }
+            code = (code << 6) | (byteAt(at + i) & 0x3F);
+        }
+        return code >= lead.smallest && isScalar(code) ? Symbol{code, length, true} : single;
+    }
+    return single;
+}
+
+size_t SymbolWidth(char32_t code) {
+    if (code < 0x300 || !(isIn(kZeroWidth, code) || isIn(kWide, code))) {
+        return 1;
+    }
+    return isIn(kZeroWidth, code) ? 0 : 2;
+}
+
+bool IsHidden(char32_t code) {
+    return isIn(kHidden, code);
+}
+
+}  // namespace quor::cli

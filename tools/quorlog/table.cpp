@@ -1,0 +1,125 @@
+// The aligned table. Rows wait until the widths of the first ones are known; later rows keep these widths, so that a
+// table of any length streams.
+#include <algorithm>
+#include <array>
+
+#include "dbutil.h"
+#include "output.h"
+#include "text.h"
+
+namespace quor::cli {
+namespace {
+
+constexpr size_t kSample = 200;   // rows that decide the widths
+constexpr size_t kMaxWidth = 40;  // a longer cell stands out instead of widening every row
+constexpr char kGap[] = "  ";
+constexpr char kReset[] = "\033[0m";
+
+constexpr std::array<const char*, 8> kLevelColors = {
+    "\033[1;31m", "\033[1;31m", "\033[1;31m",  // emerg, alert, crit
+    "\033[31m",   "\033[33m",   "\033[36m",    // err, warning, notice
+    "",           "\033[2m",                   // info, debug
+};
+
+const char* colorOf(std::string_view level) {
+    const auto* found = std::find(std::begin(g_MappingSyslogPrior), std::end(g_MappingSyslogPrior), level);
+    const auto index = static_cast<size_t>(found - std::begin(g_MappingSyslogPrior));
+    return index < kLevelColors.size() ? kLevelColors[index] : "";
+}
+
+struct Cell {
+    std::string text;
+    size_t width = 0;
+    const char* color = "";
+};
+using Line = std::vector<Cell>;
+
+class TableSink : public RowSink {
+  public:
+    TableSink(bool color, Columns columns, Output& out)
+        : RowSink(std::move(columns), out), color_(color), widths_(columns_.size(), 0) {
+        if (columns_.size() < 2) {
+            return;
+        }
+        Line heading;
+        for (const Column& column : columns_) {
+            Cell cell;
+            cell.width = AppendVisible(cell.text, column.name);
+            std::transform(cell.text.begin(), cell.text.end(), cell.text.begin(), upper);
+            heading.push_back(cell);
+        }
+        waiting_.push_back(heading);
+    }
+
+    void row(const Cells& cells) override {
+        Line line(columns_.size());
+        for (size_t i = 0; i < line.size(); ++i) {
+            line[i].width = AppendVisible(line[i].text, cells[i]);
+            if (color_ && columns_[i].kind == Kind::Level) {
+                line[i].color = colorOf(cells[i]);
+            }
+        }
+        waiting_.push_back(std::move(line));
+        if (waiting_.size() > pending_) {
+            print();
+        }
+    }
+
+    void flush() override {
+        if (anyRow()) {
+            print();
+        }
+        out_.flush();
+    }
+
+  private:
+    static char upper(char c) { return c >= 'a' && c <= 'z' ? static_cast<char>(c - 'a' + 'A') : c; }
+
+    // A heading alone is not worth a line.
+    bool anyRow() const { return printed_ ? !waiting_.empty() : waiting_.size() > (columns_.size() < 2 ? 0 : 1); }
+
+    void print() {
+        for (const Line& line : waiting_) {
+            for (size_t i = 0; i < line.size(); ++i) {
+                widths_[i] = std::max(widths_[i], std::min(line[i].width, kMaxWidth));
+            }
+        }
+        for (const Line& line : waiting_) {
+            append(line);
+            out_.drain();
+        }
+        waiting_.clear();
+        printed_ = true;
+        pending_ = 0;
+    }
+
+    void append(const Line& line) {
+        std::string& out = out_.buffer();
+        for (size_t i = 0; i < line.size(); ++i) {
+            const Cell& cell = line[i];
+            const size_t padding = widths_[i] - std::min(cell.width, widths_[i]);
+            const bool right = columns_[i].kind == Kind::Number;
+            out += i == 0 ? "" : kGap;
+            out.append(right ? padding : 0, ' ');
+            out += cell.color;
+            out += cell.text;
+            out += *cell.color != '\0' ? kReset : "";
+            out.append(right || i + 1 == line.size() ? 0 : padding, ' ');
+        }
+        out += '\n';
+    }
+
+    bool color_;
+    bool printed_ = false;
+    size_t pending_ = kSample;  // lines that may wait
+    std::vector<size_t> widths_;
+    std::vector<Line> waiting_;
+};
+
+}  // namespace
+
+std::unique_ptr<RowSink> MakeTable(bool color, Columns columns, Output& out) {
+    return std::make_unique<TableSink>(color, std::move(columns), out);
+}
+
+}  // namespace quor::cli
