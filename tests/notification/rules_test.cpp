@@ -3,6 +3,7 @@
 #include <filesystem>
 #include <fstream>
 
+#include "common/numbers.h"
 #include "common/paths.h"
 #include "notification.h"
 #include "support/notices.h"
@@ -127,8 +128,8 @@ TEST(IsNotificationSet, AsksEveryChannelUntilOneCannotBeRead) {
     for (const auto& row : cases) {
         std::ofstream(file) << row.settings << "\"\n";
         service = {};
-        snprintf(service.mail.server, sizeof service.mail.server, "mail");
-        snprintf(service.mail.recipient, sizeof service.mail.recipient, "%s", row.recipient ? row.recipient : "");
+        std::string("mail").copy(service.mail.server, sizeof service.mail.server - 1);
+        std::string(quor::OrEmpty(row.recipient)).copy(service.mail.recipient, sizeof service.mail.recipient - 1);
         service.mailUnreadable = row.recipient == nullptr;
         service.sms.enabled = row.sms;
         service.smsUnreadable = row.sms < 0;
