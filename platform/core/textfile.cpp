@@ -8,26 +8,12 @@
 #include <cstdio>
 #include <filesystem>
 
+#include "common/guards.h"
+
 namespace quor {
 namespace {
 
 namespace fs = std::filesystem;
-
-class Descriptor {
-  public:
-    explicit Descriptor(int number) : number_(number) {}
-    Descriptor(const Descriptor&) = delete;
-    Descriptor& operator=(const Descriptor&) = delete;
-    ~Descriptor() {
-        if (number_ >= 0) {
-            close(number_);
-        }
-    }
-    int get() const { return number_; }
-
-  private:
-    int number_;
-};
 
 // A file beside the one it is to replace; gone again unless it replaced it.
 class Draft {
@@ -36,7 +22,7 @@ class Draft {
     Draft(const Draft&) = delete;
     Draft& operator=(const Draft&) = delete;
     ~Draft() {
-        if (file_.get() >= 0 && !moved_) {
+        if (file_ && !moved_) {
             unlink(path_.c_str());
         }
     }
@@ -50,7 +36,7 @@ class Draft {
             }
             done += written > 0 ? static_cast<size_t>(written) : 0;
         }
-        return file_.get() >= 0;
+        return static_cast<bool>(file_);
     }
 
     bool takeOwnerAndMode(const std::string& original) const {
@@ -112,7 +98,7 @@ bool readAll(int file, size_t size, std::string& text) {
 
 ReadOutcome ReadTextFile(const std::string& path, size_t limit, std::string& text) {
     const Descriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
-    if (file.get() < 0) {
+    if (!file) {
         return errno == ENOENT ? ReadOutcome::Missing : ReadOutcome::Failed;
     }
     struct stat found {};
