@@ -2,6 +2,7 @@
 
 #include <filesystem>
 #include <fstream>
+#include <tuple>
 
 #include "common/numbers.h"
 #include "common/paths.h"
@@ -34,12 +35,10 @@ TEST(NotifyConf, ReadsBackWhatItWrote) {
         ASSERT_EQ(SyslogNotifyConfSet(file, "not used", wanted), 0);
         _SYSLOG_NOTIFY_RULES_tag found;
         ASSERT_EQ(SyslogNotifyConfGet(file, wanted.name, found), 0);
-        EXPECT_EQ(found.name, wanted.name);
-        EXPECT_EQ(found.notify_type, 2);
-        EXPECT_EQ(found.notify_pri, SYSLOG_PRIORITY_WARNING);
-        EXPECT_EQ(found.notify_eps, wanted.notify_eps);
-        EXPECT_EQ(found.notify_pat, wanted.notify_pat);
-        EXPECT_EQ(found.notify_enable, wanted.notify_enable);
+        EXPECT_EQ(std::tie(found.name, found.notify_type, found.notify_pri, found.notify_eps, found.notify_pat,
+                           found.notify_enable),
+                  std::tie(wanted.name, wanted.notify_type, wanted.notify_pri, wanted.notify_eps, wanted.notify_pat,
+                           wanted.notify_enable));
     }
 }
 
@@ -66,37 +65,25 @@ TEST(NotifyConf, ReportsWhatItCannotWrite) {
     EXPECT_EQ(quor::test::ReadFile(file), "[r]\n");
 }
 
-TEST(NotifyConf, BadSectionsAreFailedReads) {
+TEST(NotifyConf, TakesOddValuesButNoMissingKey) {
     const quor::test::TempFolder folder;
-    const Lines keys = {"notify_type=0\n", "notify_eps=1\n", "notify_pri=3\n", "notify_pat=\n", "notify_enable=1\n"};
+    const Lines keys = {"notify_type=x\n", "notify_eps=-5\n", "notify_pri=99999999999\n", "notify_pat=\n",
+                        "notify_enable=\" 1\"\n"};
     for (size_t missing = 0; missing <= keys.size(); ++missing) {
         std::string text = "[r]\n";
         for (size_t key = 0; key < keys.size(); ++key) {
             text += key == missing ? "" : keys[key];
         }
-        const std::string file = folder.write("notify.conf", text);
         const bool complete = missing == keys.size();
-        _SYSLOG_NOTIFY_RULES_tag found = rule("before", 9, "before", false);
-        EXPECT_EQ(SyslogNotifyConfGet(file, "r", found), complete ? 0 : -1) << text;
+        _SYSLOG_NOTIFY_RULES_tag found = rule("before", 9, "before", true);
+        EXPECT_EQ(SyslogNotifyConfGet(folder.write("notify.conf", text), "r", found), complete ? 0 : -1) << text;
         EXPECT_EQ(found.name, complete ? "r" : "before");
+        EXPECT_EQ(found.notify_type, complete ? 0 : 2);
+        EXPECT_EQ(static_cast<int32_t>(found.notify_pri), complete ? INT32_MAX : 4);
+        EXPECT_EQ(found.notify_eps, complete ? -5 : 9);
+        EXPECT_EQ(found.notify_enable, !complete);
         EXPECT_EQ(quor::test::TakeSystemLogTexts(),
                   complete ? Lines{} : Lines{"utils:85 Fail to do QLIBCFileGetSection"});
-    }
-}
-
-TEST(NotifyConf, TakesOddValuesAsTheyAre) {
-    const quor::test::TempFolder folder;
-    for (const char* enable : {"true", " 1", "0", "", "11"}) {
-        const std::string file = folder.write(
-            "notify.conf", std::string("[r]\nnotify_type=\"x\"\nnotify_pri=\"99999999999\"\nnotify_eps=\"-5\"\n"
-                                       "notify_pat=\"\"\nnotify_enable=\"") +
-                               enable + "\"\n");
-        _SYSLOG_NOTIFY_RULES_tag found = rule("", 0, "", true);
-        ASSERT_EQ(SyslogNotifyConfGet(file, "r", found), 0);
-        EXPECT_FALSE(found.notify_enable) << enable;
-        EXPECT_EQ(found.notify_type, 0);
-        EXPECT_EQ(static_cast<int32_t>(found.notify_pri), INT32_MAX);
-        EXPECT_EQ(found.notify_eps, -5);
     }
 }
 
