@@ -1,5 +1,6 @@
 #include <gtest/gtest.h>
 
+#include "common/paths.h"
 #include "notification.h"
 #include "support/system_log.h"
 #include "support/temp_folder.h"
@@ -21,14 +22,20 @@ class Checks : public testing::Test {
         return manager_.ConfigLoad(folder_.write("notify.conf", rules));
     }
 
+    // The package's own rule file is not there.
+    static NotificationManager withoutRules() {
+        std::filesystem::remove(quor::paths::kNotifyRules);
+        quor::test::TakeSystemLog();
+        return {};
+    }
+
     const quor::test::TempFolder folder_;
-    NotificationManager manager_;
+    NotificationManager manager_ = withoutRules();
 };
 
 TEST_F(Checks, LoadingStopsAtABadSection) {
     EXPECT_EQ(quor::test::TakeSystemLogTexts(),
-              (Lines{"Fail to do QLIBCFileEnumSection", "Fail to load configuration"}))
-        << "the package's own rule file is not there";
+              (Lines{"Fail to do QLIBCFileEnumSection", "Fail to load configuration"}));
     EXPECT_EQ(load(section("a", 1, 0, 100, "", 1) + "[bad]\nnotify_type=1\n" + section("b", 1, 0, 10, "", 1)), 0);
     EXPECT_EQ(quor::test::TakeSystemLogTexts(),
               (Lines{"utils:85 Fail to do QLIBCFileGetSection", "Fail to get notification setting bad"}));
