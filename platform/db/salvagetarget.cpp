@@ -1,0 +1,162 @@
+#include "salvagetarget.h"
+
+#include <algorithm>
+#include <cstring>
+#include <fstream>
+#include <iterator>
+
+namespace quor::salvage {
+namespace {
+
+std::string textOf(sqlite3_stmt* statement, int column) {
+    const unsigned char* text = sqlite3_column_text(statement, column);
+    return text != nullptr ? reinterpret_cast<const char*>(text) : "";
+}
+
+std::string quoted(const std::string& name) {
+    std::string text = "\"";
+    for (const char c : name) {
+        text.append(c == '"' ? 2 : 1, c);
+    }
+    return text + '"';
+}
+
+// Definitions come from a file that may be hostile: they may define, and nothing else.
+int allowDefinitions(void* /*context*/, int action, const char*, const char*, const char*, const char*) {
+    return action == SQLITE_SELECT || action == SQLITE_ATTACH || action == SQLITE_CREATE_VTABLE ? SQLITE_DENY
+                                                                                                : SQLITE_OK;
+}
+
+bool define(sqlite3* db, const std::string& sql, const char* kind) {
+    if (sqlite3_strnicmp(sql.c_str(), kind, static_cast<int>(strlen(kind))) != 0) {
+        return false;
+    }
+    sqlite3_set_authorizer(db, allowDefinitions, nullptr);
+    const Statement statement = PrepareOnly(db, sql.c_str());
+    const bool done = statement != nullptr && sqlite3_step(statement.get()) == SQLITE_DONE;
+    sqlite3_set_authorizer(db, nullptr, nullptr);
+    return done;
+}
+
+Schema readSchema(sqlite3* db) {
+    Schema schema;
+    const Statement query = PrepareOnly(db, "SELECT type, name, sql FROM sqlite_master WHERE sql IS NOT NULL");
+    while (query != nullptr && sqlite3_step(query.get()) == SQLITE_ROW) {
+        schema.push_back({textOf(query.get(), 0), textOf(query.get(), 1), 0, textOf(query.get(), 2)});
+    }
+    return schema;
+}
+
+int bindText(sqlite3_stmt* statement, int index, const Value& value, uint32_t encoding) {
+    constexpr unsigned char kEncodings[] = {SQLITE_UTF8, SQLITE_UTF8, SQLITE_UTF16LE, SQLITE_UTF16BE};
+    return sqlite3_bind_text64(statement, index, reinterpret_cast<const char*>(value.bytes), value.size, SQLITE_STATIC,
+                               kEncodings[encoding]);
+}
+
+int bind(sqlite3_stmt* statement, int index, const Value& value, uint32_t encoding) {
+    switch (value.kind) {
+    case Value::Kind::kInteger:
+        return sqlite3_bind_int64(statement, index, value.integer);
+    case Value::Kind::kReal:
+        return sqlite3_bind_double(statement, index, value.real);
+    case Value::Kind::kText:
+        return bindText(statement, index, value, encoding);
+    case Value::Kind::kBlob:
+        return sqlite3_bind_blob64(statement, index, value.bytes, value.size, SQLITE_STATIC);
+    default:
+        return sqlite3_bind_null(statement, index);
+    }
+}
+
+}  // namespace
+
+TargetTable::TargetTable(sqlite3* db, const Definition& definition) : name_(definition.name), root_(definition.root) {
+    readColumns(db);
+}
+
+// A virtual generated column stands in no record; a stored one does, but is not written.
+void TargetTable::readColumns(sqlite3* db) {
+    const Statement query = PrepareOnly(db, "SELECT name, type, hidden, pk = 1 AND type = 'INTEGER' COLLATE NOCASE AND "
+                                            "(SELECT max(pk) FROM pragma_table_xinfo(?1)) = 1 "
+                                            "FROM pragma_table_xinfo(?1) WHERE hidden <> 2");
+    sqlite3_bind_text(query.get(), 1, name_.c_str(), -1, SQLITE_STATIC);
+    std::string names = "rowid";
+    std::string places = "?1";
+    while (sqlite3_step(query.get()) == SQLITE_ROW) {
+        const std::string type = textOf(query.get(), 1);
+        const bool given = sqlite3_column_int(query.get(), 2) == 0;
+        const bool alias = sqlite3_column_int(query.get(), 3) != 0;
+        const bool integer = sqlite3_strlike("%INT%", type.c_str(), 0) == 0;
+        columns_.push_back({alias, given && !alias, integer, sqlite3_stricmp(type.c_str(), "TEXT") == 0});
+        if (columns_.back().written) {
+            names += ", " + quoted(textOf(query.get(), 0));
+            places += ", ?" + std::to_string(columns_.size() + 1);
+        }
+    }
+    insert_ = PrepareOnly(
+        db, ("INSERT OR IGNORE INTO " + quoted(name_) + " (" + names + ") VALUES (" + places + ")").c_str());
+}
+
+bool TargetTable::fits(const Row& row) const {
+    const auto fitting = [](const Column& column, const Value& value) {
+        return value.kind == Value::Kind::kNull ||
+               (!column.idAlias && (!column.integer || value.kind == Value::Kind::kInteger) &&
+                (!column.text || value.kind == Value::Kind::kText));
+    };
+    return insert_ != nullptr &&
+           std::equal(columns_.begin(), columns_.end(), row.values.begin(), row.values.end(), fitting);
+}
+
+int TargetTable::insert(const Row& row, uint32_t encoding, bool& added) {
+    added = false;
+    if (insert_ == nullptr) {
+        return SQLITE_DONE;
+    }
+    sqlite3_clear_bindings(insert_.get());
+    sqlite3_bind_int64(insert_.get(), 1, row.id);
+    for (size_t i = 0; i < std::min(columns_.size(), row.values.size()); ++i) {
+        if (columns_[i].written) {
+            bind(insert_.get(), static_cast<int>(i) + 2, row.values[i], encoding);
+        }
+    }
+    const int status = sqlite3_step(insert_.get());
+    sqlite3_reset(insert_.get());
+    added = status == SQLITE_DONE && sqlite3_changes(sqlite3_db_handle(insert_.get())) > 0;
+    rows_ += added ? 1 : 0;
+    return status;
+}
+
+Schema SchemaOfText(const std::string& sql) {
+    sqlite3* raw = nullptr;
+    const int status = sqlite3_open(":memory:", &raw);
+    const Database db(raw);
+    if (status != SQLITE_OK || sqlite3_exec(raw, sql.c_str(), nullptr, nullptr, nullptr) != SQLITE_OK) {
+        return {};
+    }
+    return readSchema(raw);
+}
+
+Schema SchemaOfFile(const char* path) {
+    std::ifstream file(path, std::ios::binary);
+    return SchemaOfText({std::istreambuf_iterator<char>(file), {}});
+}
+
+std::vector<TargetTable> CreateTables(sqlite3* db, const Schema& schema) {
+    std::vector<TargetTable> tables;
+    for (const Definition& definition : schema) {
+        if (definition.type == "table" && define(db, definition.sql, "CREATE TABLE")) {
+            tables.emplace_back(db, definition);
+        }
+    }
+    return tables;
+}
+
+void CreateIndexes(sqlite3* db, const Schema& schema) {
+    for (const Definition& definition : schema) {
+        if (definition.type == "index" && !define(db, definition.sql, "CREATE INDEX")) {
+            (void)define(db, definition.sql, "CREATE UNIQUE INDEX");  // fails when the rows are not unique
+        }
+    }
+}
+
+}  // namespace quor::salvage

@@ -1,0 +1,188 @@
+#include <gtest/gtest.h>
+
+#include <map>
+#include <random>
+
+#include "quor/quorsalvage.h"
+#include "support/sqlite_file.h"
+#include "support/temp_folder.h"
+
+namespace quor::test {
+namespace {
+
+constexpr char kLogs[] =
+    "CREATE TABLE logs(id INTEGER PRIMARY KEY AUTOINCREMENT, msg TEXT, host TEXT, utcsec INTEGER,"
+    " llevel TEXT GENERATED ALWAYS AS (host) VIRTUAL, prog TEXT); CREATE INDEX logs_host ON logs(host);";
+
+enum class Damage { kNone, kGarbage, kZeros, kHeader, kFirstPage, kHalf, kInterior };
+
+struct Case {
+    const char* name;
+    Damage damage;
+    uint32_t pageSize;
+};
+
+class Salvaging : public testing::TestWithParam<Case> {
+  protected:
+    // Logs of all lengths up to several pages, a deleted range, and a second table.
+    void fill() {
+        SqliteFile db(path_);
+        db.run("PRAGMA page_size=" + std::to_string(GetParam().pageSize) + "; PRAGMA secure_delete=OFF;" + kLogs +
+               "WITH RECURSIVE n(i) AS (SELECT 1 UNION ALL SELECT i + 1 FROM n WHERE i < 12000) "
+               "INSERT INTO logs(id, msg, host, utcsec, prog) "
+               "SELECT i, hex(zeroblob(CASE WHEN i % 1000 THEN i % 60 ELSE 20000 END)) || i, 'host' || (i % 50), i * "
+               "(1 + i % 3 * 3000000000), CASE WHEN i % 9 THEN 'prog' END FROM n;"
+               "CREATE TABLE histogram(id INTEGER PRIMARY KEY, device TEXT UNIQUE, count INTEGER);"
+               "INSERT INTO histogram VALUES(NULL, 'a', 7), (NULL, 'b', -3);"
+               "DELETE FROM logs WHERE id BETWEEN 5000 AND 6999;");
+        for (const std::string& page : db.query("SELECT pageno FROM dbstat WHERE name = 'logs' AND pagetype = "
+                                                "'internal' ORDER BY path")) {
+            interior_.push_back(std::stoul(page));
+        }
+        const std::vector<std::string> leaves =
+            db.query("SELECT pageno, ncell FROM dbstat WHERE name = 'logs' AND pagetype = 'leaf'");
+        for (size_t i = 0; i < leaves.size(); i += 2) {
+            leaves_[std::stoul(leaves[i])] = std::stoull(leaves[i + 1]);
+        }
+    }
+
+    void overwrite(std::string& file, size_t page, bool garbage) {
+        for (size_t i = 0; i < GetParam().pageSize; ++i) {
+            file[(page - 1) * GetParam().pageSize + i] = garbage ? static_cast<char>(random_()) : '\0';
+        }
+        leaves_.erase(page);
+    }
+
+    void damage() {
+        std::string file = ReadFile(path_);
+        const Damage kind = GetParam().damage;
+        if (kind == Damage::kGarbage || kind == Damage::kZeros) {
+            for (int i = 0; i < 10; ++i) {
+                overwrite(file, 2 + random_() % (file.size() / GetParam().pageSize - 1), kind == Damage::kGarbage);
+            }
+        } else if (kind == Damage::kHeader) {
+            file.replace(0, 100, 100, '\0');
+        } else if (kind == Damage::kFirstPage) {
+            overwrite(file, 1, true);
+        } else if (kind == Damage::kInterior) {
+            overwrite(file, interior_.at(0), false);
+        } else if (kind == Damage::kHalf) {
+            file.resize(file.size() / 2 + 99);
+            leaves_.erase(leaves_.upper_bound(file.size() / GetParam().pageSize), leaves_.end());
+        }
+        folder_.write("damaged.db", file);
+    }
+
+    TempFolder folder_;
+    std::string path_ = folder_.path("whole.db");
+    std::string damaged_ = folder_.path("damaged.db");
+    std::string saved_ = folder_.path("saved.db");
+    std::map<size_t, uint64_t> leaves_;  // page and its rows
+    std::vector<size_t> interior_;
+    std::mt19937 random_{GetParam().pageSize};
+};
+
+TEST_P(Salvaging, KeepsTheRowsOfEveryUndamagedPageAndNoOther) {
+    fill();
+    damage();
+    const std::string before = ReadFile(damaged_);
+    const std::string schema = folder_.write("schema.sql", std::string("PRAGMA page_size=4096;") + kLogs);
+    const std::string other = folder_.write("other.sql", "CREATE TABLE log(id INTEGER PRIMARY KEY, event TEXT);");
+    const char* const schemas[] = {other.c_str(), schema.c_str(), nullptr};
+
+    QUORSALVAGE report;
+    ASSERT_EQ(QUORDBSalvage(damaged_.c_str(), saved_.c_str(), schemas, nullptr, nullptr, &report), 0) << report.error;
+
+    uint64_t expected = 0;
+    for (const auto& [page, rows] : leaves_) {
+        expected += rows;
+    }
+    SqliteFile db(saved_);
+    db.run("ATTACH '" + path_ + "' AS whole");
+    const uint64_t saved = std::stoull(db.query("SELECT count(*) FROM logs").at(0));
+    EXPECT_GE(saved, expected * 99 / 100);
+    EXPECT_GE(report.tables[0].rows, saved);
+    EXPECT_EQ(report.badPages == 0, GetParam().damage == Damage::kNone || GetParam().damage == Damage::kHeader);
+    EXPECT_EQ(!db.query("SELECT id FROM logs EXCEPT SELECT id FROM whole.logs").empty(),
+              GetParam().damage == Damage::kFirstPage)
+        << "deleted rows return only when the definitions and the list of free pages are lost";
+    EXPECT_EQ(db.query("SELECT count(*) FROM (SELECT * FROM logs WHERE id NOT BETWEEN 5000 AND 6999 EXCEPT "
+                       "SELECT * FROM whole.logs)"),
+              std::vector<std::string>{"0"});
+    EXPECT_EQ(db.query("PRAGMA integrity_check"), std::vector<std::string>{"ok"});
+    EXPECT_EQ(db.query("PRAGMA journal_mode"), std::vector<std::string>{"wal"});
+    EXPECT_EQ(ReadFile(damaged_), before);
+}
+
+INSTANTIATE_TEST_SUITE_P(Damages, Salvaging,
+                         testing::Values(Case{"nothing", Damage::kNone, 4096}, Case{"garbage", Damage::kGarbage, 4096},
+                                         Case{"zeros", Damage::kZeros, 16384}, Case{"header", Damage::kHeader, 4096},
+                                         Case{"firstPage", Damage::kFirstPage, 4096},
+                                         Case{"firstLargePage", Damage::kFirstPage, 16384},
+                                         Case{"firstSmallPage", Damage::kFirstPage, 1024},
+                                         Case{"half", Damage::kHalf, 4096}, Case{"halfLarge", Damage::kHalf, 65536},
+                                         Case{"interior", Damage::kInterior, 4096}),
+                         [](const auto& each) { return std::string(each.param.name); });
+
+// The rows of a writer that was killed stand in the log; those after its broken frame were never promised.
+TEST(Salvage, AppliesTheWriteAheadLog) {
+    const TempFolder folder;
+    const std::string path = folder.path("live.db");
+    SqliteFile db(path);
+    db.run(std::string("PRAGMA journal_mode=WAL; PRAGMA wal_autocheckpoint=0;") + kLogs);
+    const auto insert = [&db](int count) {
+        db.run("WITH RECURSIVE n(i) AS (SELECT 1 UNION ALL SELECT i + 1 FROM n WHERE i < " + std::to_string(count) +
+               ") INSERT INTO logs(msg) SELECT 'message ' || i FROM n");
+    };
+    insert(500);
+    db.run("PRAGMA wal_checkpoint(TRUNCATE)");
+    insert(300);
+    std::string log = ReadFile(path + "-wal");
+    const size_t promised = log.size();
+    insert(200);
+    log = ReadFile(path + "-wal");
+    const auto saved = [&](const std::string& name) {
+        const std::string copy = folder.write(name, ReadFile(path));
+        folder.write(name + "-wal", log);
+        QUORSALVAGE report;
+        EXPECT_EQ(QUORDBSalvage(copy.c_str(), (copy + ".new").c_str(), nullptr, nullptr, nullptr, &report), 0);
+        return report.tables[0].rows;
+    };
+    EXPECT_EQ(saved("whole"), 1000U);
+    log[promised + 99] ^= 1;
+    EXPECT_EQ(saved("brokenFrame"), 800U);
+    log[9] ^= 1;
+    EXPECT_EQ(saved("brokenLog"), 500U);
+}
+
+TEST(Salvage, RefusesAndLeavesNothing) {
+    const TempFolder folder;
+    const std::string path = folder.path("logs.db");
+    SqliteFile(path).run(std::string(kLogs) + "INSERT INTO logs(msg) VALUES('x')");
+    const std::string text = folder.write("text", std::string(9999, 'x'));
+    const std::string fresh = folder.path("fresh.db");
+    const auto giveUp = [](unsigned long long, unsigned long long, void*) { return 1; };
+    const struct {
+        const char* damaged;
+        const char* fresh;
+        QUORSALVAGEPROGRESS progress;
+        const char* reason;
+    } cases[] = {
+        {path.c_str(), path.c_str(), nullptr, "new file"},
+        {path.c_str(), folder.path().c_str(), nullptr, "new file"},
+        {path.c_str(), "/nonexistent/fresh.db", nullptr, "new file"},
+        {path.c_str(), fresh.c_str(), giveUp, "given up"},
+        {text.c_str(), fresh.c_str(), nullptr, "cannot be read"},
+        {folder.path().c_str(), fresh.c_str(), nullptr, "cannot be read"},
+        {nullptr, fresh.c_str(), nullptr, "two files"},
+    };
+    for (const auto& each : cases) {
+        QUORSALVAGE report;
+        EXPECT_EQ(QUORDBSalvage(each.damaged, each.fresh, nullptr, each.progress, nullptr, &report), -1);
+        EXPECT_NE(std::string(report.error).find(each.reason), std::string::npos) << report.error;
+        EXPECT_FALSE(std::filesystem::exists(fresh) || std::filesystem::exists(fresh + ".partial"));
+    }
+}
+
+}  // namespace
+}  // namespace quor::test
