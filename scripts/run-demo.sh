@@ -14,6 +14,8 @@ db=$root/var/log/quorlog/syslog.db
 rules=$root/etc/quorsyslog/notify.conf
 mails=$root/mails.txt
 quorlog=$build/tools/quorlog/quorlog
+receiver=$build/tools/quorlogd/quorlogd
+[ -x "$receiver" ] || receiver="cat > /dev/null"
 children=()
 
 say() { printf '\n\033[1m%s\033[0m\n' "$*"; }
@@ -50,7 +52,9 @@ fresh_root() {
     mkdir -p "$root/var/log/quorlog" "$root/etc/quorsyslog" "$root/etc/syslog-ng" "$root/run"
     cp etc/notify.filter "$root/etc/quorsyslog/notify.filter"
     cp scripts/demo/notify.conf "$rules"
-    sed "s/@PORT@/$smtp_port/" scripts/demo/quorinfo.conf > "$root/etc/quorinfo.conf"
+    sed -e '/^smtp_mail_enabled=/s/"no"/"yes"/' -e '/^smtp_server=/s/".*"/"127.0.0.1"/' \
+        -e "/^smtp_port=/s/\".*\"/\"$smtp_port\"/" -e '/^smtp_security=/s/".*"/"none"/' \
+        etc/quorinfo.conf.example > "$root/etc/quorinfo.conf"
 }
 
 start_mail_server() {
@@ -66,7 +70,7 @@ start_syslog_ng() {
         -e "/^@define quor_port /s|\".*\"|\"$port\"|" \
         -e "/^@define quor_port_framed /s|\".*\"|\"$framed_port\"|" \
         -e "/^@define quor_database /s|\".*\"|\"$db\"|" \
-        -e "/^@define quor_receiver /s|\".*\"|\"$build/tools/quorlogd/quorlogd\"|" \
+        -e "/^@define quor_receiver /s|\".*\"|\"$receiver\"|" \
         etc/syslog-ng/quorsyslog.conf > "$conf/quorsyslog.conf"
     printf '@version: 3.38\n@include "%s"\n' "$conf/quorsyslog.conf" > "$conf/syslog-ng.conf"
     /usr/sbin/syslog-ng -F --no-caps -f "$conf/syslog-ng.conf" --persist-file "$root/run/syslog-ng.persist" \
@@ -76,13 +80,13 @@ start_syslog_ng() {
     await "the start of syslog-ng on port $port" listening "$port"
 }
 
-all_stored() { [ "$("$quorlog" count --db "$db" --from 1970-01-01 --format csv | tail -n 1)" -ge "${#sent[@]}" ]; }
+all_stored() { [ "$("$quorlog" count --format csv | tail -n 1 | tr -d "\r")" -ge "${#sent[@]}" ]; }
 
 # Every message carries its number; each must come back by it.
 check_found() {
     local missing=0
     for token in "${sent[@]}"; do
-        "$quorlog" count --db "$db" --keyword "$token" > /dev/null || {
+        "$quorlog" count --keyword "$token" > /dev/null || {
             echo "not found: $token" >&2
             missing=$((missing + 1))
         }
@@ -90,3 +94,29 @@ check_found() {
     [ "$missing" -eq 0 ] || fail "$missing of ${#sent[@]} messages were not found"
     say "All ${#sent[@]} messages sent were found again."
 }
+
+by_hand() {
+    say "The chain is up. In another terminal:"
+    cat << TEXT
+  $quorlog search --follow
+  $quorlog search --host switch-1 --level err+ --from today
+  logger -n 127.0.0.1 -P $port -d --rfc5424 -p auth.err -t sshd "Failed password for me"
+  $quorlog --help-all
+Mail arrives in $mails. Ctrl-C ends everything; the data stays in $root.
+TEXT
+    wait -n
+}
+
+fresh_root
+start_mail_server
+start_syslog_ng
+say "Sending messages to 127.0.0.1:$port (UDP and TCP, RFC 3164 and RFC 5424) ..."
+send_messages
+await "the arrival of ${#sent[@]} messages" all_stored
+show search --limit 14
+show count
+show count --level err+
+show search --limit 5 --offset 40
+show search --host intruder --format ndjson
+check_found
+[ -n "${ONCE:-}" ] || by_hand
