@@ -128,6 +128,20 @@ TEST_F(Commands, SearchShowsHostileTextHarmlessly) {
               std::string::npos);
 }
 
+TEST_F(Commands, SalvageReportsWhatItSaved) {
+    std::string damaged = ReadFile(db_);
+    damaged.replace(0, 100, 100, '\0');
+    folder_.write("damaged.db", damaged);
+    const Outcome outcome = run("db salvage damaged.db saved.db --format ndjson --db x");
+    EXPECT_EQ(outcome.status, 2) << "it takes no --db";
+    const std::string salvage = "cd '" + folder_.path() + "' && " QUORLOG " db salvage damaged.db saved.db";
+    EXPECT_EQ(WEXITSTATUS(system((salvage + " --format ndjson >out 2>err").c_str())), 0) << ReadFile("err");
+    EXPECT_NE(ReadFile(folder_.path("out")).find(R"("rows":7,)"), std::string::npos) << ReadFile(folder_.path("out"));
+    EXPECT_EQ(quor::test::SqliteFile(folder_.path("saved.db")).query("SELECT group_concat(id) FROM logs").at(0),
+              "1,2,3,5,6");
+    EXPECT_EQ(WEXITSTATUS(system((salvage + " >out 2>err").c_str())), 2) << "the new file exists";
+}
+
 TEST_F(Commands, NothingFoundNamesTheFilterThatExcludedEverything) {
     const std::pair<const char*, const char*> cases[] = {
         {"search --host web9,x --level err", "no row has --host web9,x"},

@@ -12,6 +12,7 @@ void AddSearch(CLI::App& app, int& status);
 void AddCount(CLI::App& app, int& status);
 void AddDelete(CLI::App& app, int& status);
 void AddDb(CLI::App& app, int& status);
+void AddSalvage(CLI::App& db, int& status);
 
 // All of them.
 void AddCommands(CLI::App& app, int& status);

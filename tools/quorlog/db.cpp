@@ -122,6 +122,7 @@ void AddDb(CLI::App& app, int& status) {
     AddCommand<DbOptions>(db, "create", "Create an empty log database", status, setup, runCreate);
     AddCommand<DbOptions>(db, "info", "Size, rows and dates of a log database", status, setupInfo, runInfo);
     AddCommand<DbOptions>(db, "checkpoint", "Move the write-ahead log into the database", status, setup, runCheckpoint);
+    AddSalvage(db, status);
 }
 
 }  // namespace quor::cli

@@ -26,7 +26,7 @@ typedef struct QUORSALVAGE_tag {
     int schemaRead;                 /* 1: the tables are those of the damaged file; 0: those of a schema */
     int tableCount;
     QUORSALVAGETABLE tables[16]; /* the first tables of the new database and their rows */
-    char error[256];             /* why it failed, and what to do */
+    char error[1024];            /* why it failed, and what to do */
 } QUORSALVAGE;
 
 /* Called from time to time with the pages looked at so far; nonzero gives up. */
