@@ -19,6 +19,7 @@ class SqliteFile {
         const int status = sqlite3_open(path.c_str(), &handle);
         db_.reset(handle);
         check(status);
+        sqlite3_busy_timeout(handle, 5000);  // programs under test write at the same time
     }
 
     // Any number of statements.

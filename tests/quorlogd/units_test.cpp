@@ -1,0 +1,97 @@
+#include <gtest/gtest.h>
+
+#include "common.h"
+#include "quorlogd/bounds.h"
+#include "quorlogd/linesplitter.h"
+#include "quorlogd/noticetext.h"
+
+namespace {
+
+using Texts = std::vector<std::string>;
+
+Texts split(quor::LineSplitter& splitter, const std::string& text, size_t chunk) {
+    Texts lines;
+    const auto keep = [&lines](const std::string& line) { lines.push_back(line); };
+    for (size_t pos = 0; pos < text.size(); pos += chunk) {
+        splitter.feed(std::string_view(text).substr(pos, chunk), keep);
+    }
+    splitter.finish(keep);
+    return lines;
+}
+
+}  // namespace
+
+TEST(LineSplitter, GivesTheSameLinesForAnyChunking) {
+    const std::string longest(10, 'x');
+    const std::string text = "one\n\n\ntwo" + std::string(1, '\0') + "2\n" + longest + "\n" + longest + "y" +
+                             std::string(5000, 'z') + "\nlast";
+    const Texts expected{"one",
+                         {"two\0"
+                          "2",
+                          5},
+                         longest,
+                         longest,
+                         "last"};
+    for (const size_t chunk : {size_t{1}, size_t{2}, size_t{7}, size_t{11}, size_t{64}, text.size()}) {
+        quor::LineSplitter splitter(longest.size());
+        EXPECT_EQ(split(splitter, text, chunk), expected) << chunk;
+        EXPECT_EQ(splitter.oversized(), 1U) << chunk;
+    }
+}
+
+TEST(NoticeContent, FitsTheNoticeWhateverNeedsEscaping) {
+    for (const std::string& piece : {std::string("a"), std::string("\""), std::string("\u20ac"), std::string("\x80")}) {
+        for (size_t bytes = 1000; bytes < 2100; ++bytes) {
+            std::string message(bytes % piece.size(), '-');
+            while (message.size() < bytes) {
+                message += piece;
+            }
+            const std::string content = quor::NoticeContent(message);
+            std::array<char, 2048> escaped{};
+            std::array<char, 8192> unbounded{};
+            ASSERT_EQ(EncodeJson(content.c_str(), escaped.data(), escaped.size()), 0) << bytes;
+            ASSERT_EQ(EncodeJson(message.c_str(), unbounded.data(), unbounded.size()), 0);
+            if (strlen(unbounded.data()) < escaped.size()) {
+                ASSERT_EQ(content, message);
+                continue;
+            }
+            const std::string kept = content.substr(0, content.size() - 6);
+            ASSERT_EQ(content.substr(kept.size()), " [...]");
+            ASSERT_EQ(message.compare(0, kept.size(), kept), 0);
+            ASSERT_GT(strlen(escaped.data()), 2037U) << "cut too early";
+            ASSERT_TRUE(piece.size() < 3 || (kept.size() - bytes % 3) % 3 == 0) << "cut inside a character";
+        }
+    }
+}
+
+TEST(EventText, IsALiteralAndNoMarkup) {
+    EXPECT_EQ(quor::EventText("it's <b>\x1b[2J\n\xc3\xa9"), "it''s \u2039b> [2J \xc3\xa9");
+}
+
+TEST(NoticeBudget, RefillsOverAMinute) {
+    quor::NoticeBudget::Time now{};
+    quor::NoticeBudget budget(2, now);
+    const auto taken = [&](int seconds) {
+        now += std::chrono::seconds(seconds);
+        int count = 0;
+        while (budget.take(now)) {
+            ++count;
+        }
+        return count;
+    };
+    EXPECT_EQ(taken(0), 2);
+    EXPECT_EQ(taken(29), 0);
+    EXPECT_EQ(taken(2), 1);
+    EXPECT_EQ(taken(3600), 2);
+    EXPECT_FALSE(quor::NoticeBudget(0, now).take(now + std::chrono::hours(1)));
+}
+
+TEST(DeviceNames, AreBounded) {
+    quor::DeviceNames names(2);
+    EXPECT_EQ(names.admit("a"), "a");
+    EXPECT_EQ(names.admit(std::string(256, 'x')), "(other devices)");
+    EXPECT_EQ(names.admit("b"), "b");
+    EXPECT_EQ(names.admit("c"), "(other devices)");
+    EXPECT_EQ(names.admit("a"), "a");
+    EXPECT_EQ(names.count(), 2U);
+}
