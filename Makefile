@@ -1,7 +1,7 @@
 # The commands of the project; see README.md. Each installs what it needs from Debian's packages.
 BUILD := build
 
-.PHONY: run test bench check format tidy asan release install clean
+.PHONY: run test bench check format tidy asan powerpc release install clean
 
 run:            ## start the real receiving chain on loopback and show what it received
 	scripts/install-deps.sh build run
@@ -33,6 +33,12 @@ asan:           ## the suite under AddressSanitizer and UndefinedBehaviorSanitiz
 	scripts/install-deps.sh build run test
 	scripts/build.sh asan
 	ctest --preset asan
+
+powerpc:        ## cross-build for the appliance (32-bit big-endian) and run the suite under emulation
+	scripts/install-deps.sh build run test powerpc
+	scripts/build-powerpc-deps.sh $(BUILD)/powerpc-deps
+	scripts/build.sh powerpc
+	ctest --preset powerpc
 
 release:
 	scripts/install-deps.sh build

@@ -34,6 +34,9 @@ function(quor_install_library target header_folder headers)
     install(DIRECTORY ${headers} DESTINATION ${header_folder} COMPONENT development FILES_MATCHING PATTERN "*.h")
 endfunction()
 
+# What a test writes before the path of one of our programs, in a shell's words: the emulator of a cross build.
+list(JOIN CMAKE_CROSSCOMPILING_EMULATOR " " QUOR_EMULATOR)
+
 # quor_add_test(NAME SOURCES... [LIBS libraries...] [ROOT]): one GoogleTest executable. ROOT marks tests that use the
 # fixed paths below QUOR_ROOT, so that they do not run at the same time.
 function(quor_add_test name)

@@ -1,6 +1,6 @@
 #!/bin/sh
 # Installs the Debian packages of the named sets that are missing, through sudo when not root.
-# Usage: install-deps.sh SET...   sets: build run test bench check
+# Usage: install-deps.sh SET...   sets: build run test bench powerpc check
 set -eu
 
 packages_of() {
@@ -10,8 +10,9 @@ packages_of() {
     run) echo syslog-ng-core syslog-ng-mod-sql libdbd-sqlite3 bsdutils procps python3 python3-aiosmtpd ;;
     test) echo libgtest-dev openssl ;;
     bench) echo libbenchmark-dev ;;
+    powerpc) echo g++-powerpc-linux-gnu qemu-user dpkg-dev make tcl ;;
     check) echo clang-14 clang-format-14 clang-tidy-14 git ;;
-    *) echo "install-deps.sh: unknown set '$1'; use build, run, test, bench or check" >&2; return 1 ;;
+    *) echo "install-deps.sh: unknown set '$1'; use build, run, test, bench, powerpc or check" >&2; return 1 ;;
     esac
 }
 

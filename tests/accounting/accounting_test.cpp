@@ -42,11 +42,11 @@ class Accounting : public testing::Test {
     }
     void TearDown() override { quor::test::ResetClock(); }
 
-    static void at(time_t now) { quor::test::SetClock(now); }
+    static void at(int64_t now) { quor::test::SetClock(now); }
 
     // Closes one sample of one log for each device, at `now` + 1. Whole only when the last one was closed at `now`, or
     // with a single log: the second log of another second closes a sample itself.
-    static void sample(AccountingManager& accounting, time_t now, const Texts& devices) {
+    static void sample(AccountingManager& accounting, int64_t now, const Texts& devices) {
         at(now);
         for (const std::string& device : devices) {
             accounting.LogInc(device);
@@ -71,10 +71,10 @@ struct Model {
     Histogram histogram;
     std::map<std::string, int> open;
     unsigned long long eps = 0;
-    time_t stamp = 0;
+    int64_t stamp = 0;
     Texts rows;
 
-    void log(time_t now, const std::string& device) {
+    void log(int64_t now, const std::string& device) {
         if (now != stamp && eps != 0) {
             stamp = now;
             for (const auto& [name, count] : open) {
@@ -105,9 +105,9 @@ TEST_F(Accounting, CountsAsAWalkOfTheHistogramWould) {
     AccountingManager accounting;
     Model model;
     model.histogram = {{"D7", 2}, {"d7", 40}};
-    time_t now = 1000;
+    int64_t now = 1000;
     for (unsigned long long i = 1; i <= 3000; ++i) {
-        now += random() % 10 == 0 ? static_cast<time_t>(random() % 3) - 1 : 0;  // the clock may go back
+        now += random() % 10 == 0 ? static_cast<int64_t>(random() % 3) - 1 : 0;  // the clock may go back
         at(now);
         std::string device = (random() % 4 == 0 ? "D" : "d") + std::to_string(random() % 12);
         device += random() % 6 == 0 ? std::string(1, '\0') : "";
@@ -144,10 +144,10 @@ TEST_F(Accounting, TheFirstLogOfAnIdleSpellClosesNothing) {
 TEST_F(Accounting, AFlushIsDueMoreThanFiveSecondsAfterTheLastQuestion) {
     AccountingManager accounting;
     const struct {
-        time_t now;
+        int64_t now;
         bool due;
-    } questions[] = {{100, true}, {103, false},       {108, false},         {114, true},
-                     {50, false}, {0x7ffffffd, true}, {0x80000001L, false}, {0x80000007L, true}};
+    } questions[] = {{100, true}, {103, false},       {108, false},        {114, true},
+                     {50, false}, {0x7ffffffd, true}, {0x80000001, false}, {0x80000007, true}};
     for (const auto& question : questions) {
         at(question.now);
         EXPECT_EQ(accounting.isNeed2Flush(), question.due) << question.now;

@@ -17,6 +17,9 @@ int shell(const std::string& command) {
 TEST(Exec, TellsHowTheProgramEnded) {
     EXPECT_EQ(shell("exit 3"), 3);
     EXPECT_EQ(shell("kill -KILL $$"), 128 + SIGKILL);
+}
+
+TEST(Exec, FailsWhenNothingCouldBeRun) {
     EXPECT_LT(QLIBCExec("/no/such/program", "-c", nullptr), 0);
     EXPECT_LT(QLIBCExec("/etc/passwd", nullptr), 0) << "not executable";
 }

@@ -1,5 +1,6 @@
 #include "support/clock.h"
 
+#include <ctime>
 #include <optional>
 
 namespace {
@@ -19,8 +20,8 @@ time_t realTime() {
 
 namespace quor::test {
 
-void SetClock(time_t now) {
-    fixedTime() = now;
+void SetClock(int64_t now) {
+    fixedTime() = static_cast<time_t>(now);
 }
 
 void ResetClock() {

@@ -2,11 +2,12 @@
 #ifndef TESTS_SUPPORT_CLOCK_H
 #define TESTS_SUPPORT_CLOCK_H
 
-#include <ctime>
+#include <cstdint>
 
 namespace quor::test {
 
-void SetClock(time_t now);
+// Cut to the width of time_t, which is 32 bits on the appliance.
+void SetClock(int64_t now);
 void ResetClock();
 
 }  // namespace quor::test
