@@ -22,17 +22,15 @@ class EventLog : public testing::Test {
         const fs::path schema = paths::kEventSchema;
         fs::create_directories(schema.parent_path());
         fs::copy_file(SCHEMA_FOLDER "/quorsyslog.sql", schema, fs::copy_options::overwrite_existing);
-        removeOwn();
+        fs::remove_all(own_.substr(0, own_.rfind('/')));
         TakeSystemLog();
     }
-    ~EventLog() override {
-        ResetClock();
-        removeOwn();
-    }
+    ~EventLog() override { ResetClock(); }
 
-    // Every field of every event, the identifier apart.
+    // "level time user event" of each.
     static Strings stored(const std::string& path) {
-        return SqliteFile(path).query("SELECT level, time, user, event FROM log ORDER BY id");
+        return SqliteFile(path).query(
+            "SELECT level || ' ' || time || ' ' || user || ' ' || event FROM log ORDER BY id");
     }
 
     static std::string lastMessage() {
@@ -40,12 +38,10 @@ class EventLog : public testing::Test {
         return lines.empty() ? "" : lines.back();
     }
 
+    const std::string own_ = paths::kEventDb;
     const TempFolder folder_;
     const std::string path_ = folder_.path("new folder/events.db");
     Logger logger_;
-
-  private:
-    static void removeOwn() { std::filesystem::remove_all(std::filesystem::path(paths::kEventDb).parent_path()); }
 };
 
 }  // namespace quor::test
