@@ -3,12 +3,11 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <array>
 #include <cerrno>
 #include <csignal>
 #include <cstdarg>
-#include <vector>
 
-#include "platform/guarded.h"
 #include "quor/quorcore.h"
 
 #ifdef __GLIBC_PREREQ
@@ -73,10 +72,10 @@ int waitFor(pid_t child) {
     return ended == child ? exitStatus(status) : 0;  // a caller that ignores SIGCHLD never learns the status
 }
 
-int run(const char* program, std::vector<char*>& arguments) {
+int run(const char* program, char* const* arguments) {
     const CleanStart start;
     pid_t child = -1;
-    const int error = posix_spawn(&child, program, start.actions(), start.attributes(), arguments.data(), environ);
+    const int error = posix_spawn(&child, program, start.actions(), start.attributes(), arguments, environ);
     return error == 0 ? waitFor(child) : -1;
 }
 
@@ -86,15 +85,13 @@ int QLIBCExec(const char* program, ...) {
     if (program == nullptr) {
         return -1;
     }
+    std::array<char*, 64> arguments{const_cast<char*>(program)};
+    size_t count = 0;
     va_list list;
     va_start(list, program);
-    const int status = quor::Guarded(-1, [&] {
-        std::vector<char*> arguments{const_cast<char*>(program)};
-        do {
-            arguments.push_back(va_arg(list, char*));
-        } while (arguments.back() != nullptr);
-        return run(program, arguments);
-    });
+    while (arguments[count] != nullptr && ++count < arguments.size()) {
+        arguments[count] = va_arg(list, char*);
+    }
     va_end(list);
-    return status;
+    return count < arguments.size() ? run(program, arguments.data()) : -1;
 }

@@ -73,14 +73,14 @@ TEST_F(Senders, ReportAFailedSendAndRefuseNull) {
 TEST_F(Senders, GuardAndBoundLogContent) {
     const struct {
         std::string text;
-        int manager;
         size_t sent;
+        int manager;
         int mail;
     } cases[] = {
         {"x Failed to send email. y", 0, 0, 0}, {"Failed to send email." + std::string(4096, 'x'), 0, 0, -1},
-        {"failed to send email.", 0, 1, 0},     {std::string(2047, 'x'), 0, 1, 0},
-        {std::string(2048, 'x'), -1, 0, -1},    {std::string(1023, '"') + "x", 0, 1, 0},
-        {std::string(1024, '\\'), -1, 0, -1},
+        {"failed to send email.", 1, 0, 0},     {std::string(2047, 'x'), 1, 0, 0},
+        {std::string(2048, 'x'), 0, -1, -1},    {std::string(1023, '"') + "x", 1, 0, 0},
+        {std::string(1024, '\\'), 0, -1, -1},
     };
     for (const auto& row : cases) {
         FakeNotices() = {};

@@ -55,9 +55,10 @@ int QLIBCFileGetKeyValue(const char* file, const char* key, char* out, int outSi
 /* 1 when the path exists, else 0. */
 int QLIBCFileExist(const char* path);
 
-/* Runs a program with the given arguments (char*, ended by null), no shell between, and waits for it. It reads from and
- * prints to /dev/null and gets no open file but standard error. The program's exit status, 128 plus the signal that
- * ended it, or negative when it could not be run. A process that ignores SIGCHLD learns no status and gets 0. */
+/* Runs a program with the given arguments (char*, at most 62, ended by null), no shell between, and waits for it. It
+ * reads from and prints to /dev/null and gets no open file but standard error. The program's exit status, 128 plus the
+ * signal that ended it, or negative when it could not be run. A process that ignores SIGCHLD learns no status and gets
+ * 0. */
 int QLIBCExec(const char* program, ...);
 
 /* A newly allocated formatted text, never null; release it with QLIBCStrPut(), which accepts null. */
