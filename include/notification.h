@@ -24,7 +24,9 @@ struct _SYSLOG_NOTIFY_RULES_tag {
 
 // Reads one section of the rule file. -1 (with a line in the system log) when it is absent or lacks a key.
 int SyslogNotifyConfGet(const std::string& file, const std::string& section, _SYSLOG_NOTIFY_RULES_tag& rule);
-// Writes `rule` as the section `rule.name`; the argument `section` is not used.
+// Writes `rule` as the section `rule.name`; the argument `section` is not used. Negative numbers are written as the
+// unsigned ones of the same 64 bits, which read back as the largest signed one. -1 (with a line in the system log), and
+// the file as it was, when a text holds a newline or a zero byte.
 int SyslogNotifyConfSet(const std::string& file, const std::string& section, _SYSLOG_NOTIFY_RULES_tag& rule);
 // True when mail, SMS or a push service is configured on this system. Unreadable settings count as not configured.
 bool IsNotificationSet();
