@@ -4,21 +4,16 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
-#include <functional>
 #include <thread>
 
+#include "program.h"
 #include "support/sqlite_file.h"
-#include "support/temp_folder.h"
 
+using quor::test::Outcome;
+using quor::test::Program;
 using quor::test::ReadFile;
 
 namespace {
-
-struct Outcome {
-    int status;
-    std::string out;
-    std::string err;
-};
 
 // A log database with five rows; id 4 is missing.
 class Commands : public testing::Test {
@@ -47,17 +42,13 @@ class Commands : public testing::Test {
     std::string line(const std::string& arguments) const {
         const size_t verb = arguments.find("db ") == 0 ? arguments.find(' ', 3) : arguments.find(' ');
         const std::string db = " --db '" + db_ + "'";
-        return "exec " QUORLOG " " + arguments.substr(0, verb) +
-               (arguments.find("--db") == std::string::npos ? db : "") +
+        return arguments.substr(0, verb) + (arguments.find("--db") == std::string::npos ? db : "") +
                (verb == std::string::npos ? "" : arguments.substr(verb));
     }
 
-    // `arguments` as a shell reads them.
+    // On that database when the arguments name none.
     Outcome run(const std::string& arguments, const std::string& input = "") const {
-        folder_.write("in", input);
-        const std::string redirected = "cd " + folder_.path() + " && { " + line(arguments) + "; } <in >out 2>err";
-        const int status = system(redirected.c_str());
-        return {WEXITSTATUS(status), ReadFile(folder_.path("out")), ReadFile(folder_.path("err"))};
+        return program_.run(line(arguments), input);
     }
 
     // The ids that a search prints, in order.
@@ -70,7 +61,8 @@ class Commands : public testing::Test {
         return outcome.status == 2 ? outcome.err : found;
     }
 
-    quor::test::TempFolder folder_;
+    Program program_;
+    const quor::test::TempFolder& folder_ = program_.folder();
     std::string db_ = folder_.path("the log.db");
 };
 
@@ -167,6 +159,7 @@ TEST_F(Commands, WrongUsageAndFailuresAreOneLineThatHelps) {
     folder_.write("text.db", std::string(5000, 'x'));
     quor::test::SqliteFile(folder_.path("bare.db")).run("CREATE TABLE logs(id INTEGER PRIMARY KEY, host, prio, msg)");
     const std::pair<const char*, const char*> cases[] = {
+        {"nosuch", "no such command 'nosuch'; see quorlog --help-all"},
         {"search --colour", "see quorlog --help-all"},
         {"search --limit 0x1", "--limit"},
         {"search --limit 99999999999999999999", "--limit"},
@@ -225,7 +218,8 @@ TEST_F(Commands, FollowPrintsNewRowsUntilItIsInterrupted) {
     if (child == 0) {
         const int file = open(out.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC, 0600);
         dup2(file, STDOUT_FILENO);
-        const std::string command = line("search --follow --limit 1 --format json --host new,nas");
+        const std::string command =
+            "exec " QUORLOG " " + line("search --follow --limit 1 --format json --host new,nas");
         execl("/bin/sh", "sh", "-c", command.c_str(), nullptr);
         _exit(127);
     }

@@ -12,7 +12,13 @@ void AddCommands(CLI::App& app, int& status) {
     AddSearch(app, status);
     AddCount(app, status);
     AddDelete(app, status);
+    AddValues(app, status);
+    AddStats(app, status);
+    AddEvents(app, status);
+    AddRules(app, status);
+    AddNotify(app, status);
     AddDb(app, status);
+    AddParse(app, status);
 }
 
 }  // namespace quor::cli

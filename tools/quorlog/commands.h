@@ -11,7 +11,16 @@ namespace quor::cli {
 void AddSearch(CLI::App& app, int& status);
 void AddCount(CLI::App& app, int& status);
 void AddDelete(CLI::App& app, int& status);
+void AddValues(CLI::App& app, int& status);
+void AddStats(CLI::App& app, int& status);
+void AddEvents(CLI::App& app, int& status);
+void AddRules(CLI::App& app, int& status);
+void AddNotify(CLI::App& app, int& status);
 void AddDb(CLI::App& app, int& status);
+void AddParse(CLI::App& app, int& status);
+
+// Below db.
+void AddCare(CLI::App& db, int& status);
 void AddSalvage(CLI::App& db, int& status);
 
 // All of them.

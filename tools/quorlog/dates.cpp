@@ -1,7 +1,7 @@
 #include "dates.h"
 
 #include <algorithm>
-#include <cctype>
+#include <string_view>
 
 #include "common/numbers.h"
 #include "failure.h"
@@ -75,6 +75,32 @@ std::string ParseDate(const std::string& text, const std::string& option, time_t
         throw Failure(option + ": no such date '" + Visible(text) + "'; give YYYY-MM-DD, today, yesterday or 7d");
     }
     return daysAgo(days, now);
+}
+
+time_t DayBegin(const std::string& date, int daysLater) {
+    tm day = {};
+    day.tm_year = ToInt32(date.c_str()) - 1900;
+    day.tm_mon = ToInt32(&date[5]) - 1;
+    day.tm_mday = ToInt32(&date[8]) + daysLater;
+    day.tm_isdst = -1;
+    return mktime(&day);
+}
+
+uint64_t ParseSpan(const std::string& text, const std::string& option) {
+    constexpr std::string_view kUnits = "smhd";
+    constexpr uint64_t kSeconds[] = {1, 60, 3600, 86400};
+    const size_t unit = text.empty() ? std::string_view::npos : kUnits.find(text.back());
+    if (unit == std::string_view::npos || text.size() > 7 || !isDigits(text.substr(0, text.size() - 1))) {
+        throw Failure(option + ": no such time span '" + Visible(text) + "'; give 90s, 10m, 6h or 2d");
+    }
+    return ToUint64(text.c_str()) * kSeconds[unit];
+}
+
+std::string LocalTime(int64_t seconds) {
+    const auto clock = static_cast<time_t>(seconds);
+    const tm* local = localtime(&clock);
+    char text[64];
+    return local == nullptr ? "" : std::string(text, strftime(text, sizeof text, "%Y-%m-%dT%H:%M:%S", local));
 }
 
 }  // namespace quor::cli

@@ -60,12 +60,6 @@ uint64_t sizeOf(const std::string& path) {
     return stat(path.c_str(), &status) == 0 ? static_cast<uint64_t>(status.st_size) : 0;
 }
 
-void say(const std::string& line) {
-    Output out(STDOUT_FILENO);
-    out.buffer() = line + '\n';
-    out.flush();
-}
-
 int runCreate(const DbOptions& options) {
     const std::string db = AbsolutePath(options.db);
     checkForShell(db);
@@ -79,7 +73,7 @@ int runCreate(const DbOptions& options) {
     if (Handle(db)->DBcheckTableExist("logs") != 1) {
         throw Failure("could not create the tables of " + Visible(db) + "; see the system log");
     }
-    say("created " + Visible(db));
+    WriteLine("created " + Visible(db));
     return kDone;
 }
 
@@ -110,7 +104,7 @@ int runCheckpoint(const DbOptions& options) {
     if (Handle(db)->DBWalCheckpoint(false) != 0) {
         throw Failure("cannot move the write-ahead log into " + Visible(db) + "; try again when no program reads it");
     }
-    say("moved the write-ahead log into " + Visible(db));
+    WriteLine("moved the write-ahead log into " + Visible(db));
     return kDone;
 }
 
@@ -123,6 +117,7 @@ void AddDb(CLI::App& app, int& status) {
     AddCommand<DbOptions>(db, "info", "Size, rows and dates of a log database", status, setupInfo, runInfo);
     AddCommand<DbOptions>(db, "checkpoint", "Move the write-ahead log into the database", status, setup, runCheckpoint);
     AddSalvage(db, status);
+    AddCare(db, status);
 }
 
 }  // namespace quor::cli

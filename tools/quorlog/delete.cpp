@@ -56,9 +56,7 @@ int run(const DeleteOptions& options) {
     if (SyslogDBDelete(selection.db, selection.filter.conditions) < 0) {
         throw Failure("cannot delete from " + Visible(selection.db) + "; see that you may write it, and try again");
     }
-    Output out(STDOUT_FILENO);
-    out.buffer() = "deleted " + count + " rows\n";
-    out.flush();
+    WriteLine("deleted " + count + " rows");
     return kDone;
 }
 

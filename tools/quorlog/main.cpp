@@ -25,7 +25,9 @@ int parseFailed(const CLI::App& app, const CLI::ParseError& error) {
         app.exit(error);
         return std::cout.flush() ? quor::cli::kDone : kFailed;
     }
-    return fail(quor::cli::Visible(error.what()) + "; see quorlog --help-all");
+    const bool unknown = app.get_subcommands().empty() && app.remaining_size() != 0;
+    const std::string cause = unknown ? "no such command '" + app.remaining().front() + "'" : error.what();
+    return fail(quor::cli::Visible(cause) + "; see quorlog --help-all");
 }
 
 int run(int argc, char** argv) {

@@ -22,7 +22,7 @@ void appendObject(std::string& out, const Columns& columns, const Cells& cells) 
         out += columns[i].name;
         out += "\":";
         if (columns[i].kind == Kind::Number) {
-            out += cells[i];
+            out += cells[i].empty() ? "null" : cells[i];
         } else {
             AppendJsonString(out, cells[i]);
         }
@@ -154,6 +154,12 @@ void WriteRecord(const Style& style, const std::vector<Value>& values, Output& o
     const auto sink = MakeSink(style, std::move(columns), out);
     sink->row(cells);
     sink->finish();
+}
+
+void WriteLine(const std::string& line) {
+    Output out(STDOUT_FILENO);
+    out.buffer() = line + '\n';
+    out.flush();
 }
 
 }  // namespace quor::cli

@@ -44,7 +44,7 @@ struct Style {
 
 enum class Kind {
     Text,
-    Number,  // cells are valid JSON numbers
+    Number,  // cells are valid JSON numbers, or empty
     Level,   // a severity's name
 };
 
@@ -87,6 +87,9 @@ struct Value {
     Kind kind = Kind::Text;
 };
 void WriteRecord(const Style& style, const std::vector<Value>& values, Output& out);
+
+// One line for a person.
+void WriteLine(const std::string& line);
 
 }  // namespace quor::cli
 

@@ -180,11 +180,10 @@ int runCount(const CountOptions& options) {
     }
     const uint64_t count = options.estimate ? EstimateCount(selection) : Count(selection);
     const Style style = options.search.output.style();
-    Output out(STDOUT_FILENO);
     if (style.format == Format::Table) {
-        out.buffer() = std::to_string(count) + '\n';
-        out.flush();
+        WriteLine(std::to_string(count));
     } else {
+        Output out(STDOUT_FILENO);
         WriteRecord(style, {{"count", std::to_string(count), Kind::Number}}, out);
     }
     return count == 0 ? reportNothing(selection, options.search) : kDone;

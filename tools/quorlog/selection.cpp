@@ -2,7 +2,7 @@
 
 #include <algorithm>
 
-#include "common/guards.h"
+#include "ask.h"
 #include "failure.h"
 #include "text.h"
 
@@ -108,20 +108,6 @@ uint64_t selectInPieces(const Selection& selection, const RecordHandler& handler
     return window.taken();
 }
 
-std::string adviceFor(const std::string& cause) {
-    const auto says = [&](const char* words) { return cause.find(words) != std::string::npos; };
-    if (says("no such table") || says("no such column")) {
-        return "choose another --table or --db";
-    }
-    if (says("malformed") || says("not a database")) {
-        return "run quorlog db check on it";
-    }
-    if (says("locked") || says("busy")) {
-        return "try again, another program holds it";
-    }
-    return "see the system log";
-}
-
 }  // namespace
 
 uint64_t Select(const Selection& selection, const RecordHandler& handler) {
@@ -179,18 +165,10 @@ bool AnyRow(const std::string& db, const std::string& table, const Conditions& c
 }
 
 void FailQuery(const std::string& db, const std::string& table, Conditions conditions) {
-    const std::string name = Visible(db);
-    const Connection connection(QUORDBConnect(nullptr, nullptr, nullptr, db.c_str()));
-    if (connection == nullptr) {
-        throw QueryFailure("cannot open " + name + "; see that it is a database that you may read");
-    }
     std::string where;
     SqlCondListToStr(conditions, where);
-    const std::string sql = "SELECT 1 FROM " + table + (where.empty() ? "" : " WHERE " + where) + " LIMIT 1";
-    Result result;
-    const bool failed = QUORDBExecute(connection.get(), sql.c_str(), Adopt(result)) < 0;
-    const std::string cause = failed ? Visible(QUORDBErrorGet(connection.get())) : "the query failed";
-    throw QueryFailure(name + ": " + cause + "; " + adviceFor(cause));
+    (void)Ask(db, "SELECT 1 FROM " + table + (where.empty() ? "" : " WHERE " + where) + " LIMIT 1", "1");
+    throw QueryFailure(Visible(db) + ": the query failed; see the system log");
 }
 
 }  // namespace quor::cli

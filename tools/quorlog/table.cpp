@@ -104,8 +104,9 @@ class TableSink : public RowSink {
             out += cell.color;
             out += cell.text;
             out += *cell.color != '\0' ? kReset : "";
-            out.append(right || i + 1 == line.size() ? 0 : padding, ' ');
+            out.append(right ? 0 : padding, ' ');
         }
+        out.resize(out.find_last_not_of(' ') + 1);
         out += '\n';
     }
 

@@ -1,0 +1,191 @@
+// The commands that report, and those that keep rules and databases in order.
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <filesystem>
+
+#include "common/paths.h"
+#include "program.h"
+#include "support/sqlite_file.h"
+
+namespace paths = quor::paths;
+using quor::test::Outcome;
+using quor::test::ReadFile;
+using quor::test::SqliteFile;
+
+namespace {
+
+class Reports : public testing::Test {
+  protected:
+    struct Case {
+        const char* arguments;
+        int status;
+        const char* out;
+        const char* err;  // a part of it
+    };
+
+    void expect(std::initializer_list<Case> cases) const {
+        for (const Case& test : cases) {
+            const Outcome outcome = program_.run(test.arguments);
+            EXPECT_EQ(outcome.status, test.status) << test.arguments << outcome.err;
+            EXPECT_EQ(outcome.out, test.out) << test.arguments;
+            EXPECT_NE(outcome.err.find(test.err), std::string::npos) << test.arguments << outcome.err;
+        }
+    }
+
+    SqliteFile database(const std::string& name) const { return SqliteFile(program_.folder().path(name)); }
+
+    quor::test::Program program_;
+};
+
+TEST_F(Reports, StatisticsCountAndRate) {
+    setenv("TZ", "UTC", 1);
+    database("acc.db").run("CREATE TABLE histogram(id INTEGER PRIMARY KEY, device TEXT UNIQUE, count INTEGER);"
+                           "CREATE TABLE eps(id INTEGER PRIMARY KEY, stamp INTEGER, device TEXT, eps INTEGER);"
+                           "INSERT INTO histogram VALUES(1, 'O''Neil', 7), (2, 'a', 5), (3, 'b', 9), (4, 'c', 9);"
+                           "INSERT INTO eps VALUES(1, 1767225600, 'a', 6), (2, 1767225604, 'a', 1), "
+                           "(3, 1767225604, 'b', 2), (4, 1767312000, 'a', 1)");
+    database("empty.db").run("CREATE TABLE histogram(id, device, count)");
+    expect({
+        {"stats total --db acc.db", 0, "count  30\n", ""},
+        {"stats device --db acc.db \"O'Neil\" --format ndjson", 0, "{\"device\":\"O'Neil\",\"count\":7}\n", ""},
+        {"stats device --db acc.db \"x' OR 'a\"", 1, "device  x' OR 'a\ncount   0\n", "no log was counted"},
+        {"stats top --limit 3 --db acc.db", 0, "COUNT  DEVICE\n    9  b\n    9  c\n    7  O'Neil\n", ""},
+        {"stats eps --from 2026-01-01 --to 2026-01-01 --format ndjson --db acc.db", 0,
+         "{\"stamp\":1767225600,\"logs\":6,\"seconds\":null,\"per_second\":null}\n"
+         "{\"stamp\":1767225604,\"logs\":3,\"seconds\":4,\"per_second\":0.75}\n",
+         ""},
+        {"stats eps --db acc.db --last 5s", 1, "", "no sample from"},
+        {"stats eps --db acc.db --last 5w", 2, "", "give 90s, 10m, 6h or 2d"},
+        {"stats top --db empty.db", 1, "", "no log was counted"},
+        {"stats eps --db empty.db", 2, "", "no such table: eps"},
+        {"stats total --db none.db", 2, "", "start quorlogd"},
+    });
+    unsetenv("TZ");
+}
+
+TEST_F(Reports, ValuesAndNamesOfALogDatabase) {
+    database("log.db").run("CREATE TABLE logs(id INTEGER PRIMARY KEY, host, prog, tag, fac);"
+                           "INSERT INTO logs(host) VALUES('b'), ('a' || char(10)), ('b')");
+    database("old.db").run("CREATE TABLE db_info(id); CREATE TABLE hosts(host_id, host_name);"
+                           "INSERT INTO hosts VALUES(3, 'x'), (7, 'y')");
+    expect({
+        {"values host --db log.db", 0, "a\\n\nb\n", ""},
+        {"values host --db log.db --limit 1 --offset 1 --format csv", 0, "host\r\nb\r\n", ""},
+        {"values id --db log.db --format ndjson --limit 1", 0, "{\"id\":\"1\"}\n", ""},
+        {"values luser --db log.db", 2, "", "has no column 'luser'"},
+        {"values 'host FROM logs;--' --db log.db", 2, "", "has no column"},
+        {"values ip --db log.db", 2, "", "no such column: ip"},
+        {"names host --db log.db --format csv", 0, "key,name\r\n0,b\r\n1,\"a\n\"\r\n", ""},
+        {"names host --db old.db --format csv", 0, "key,name\r\n3,x\r\n7,y\r\n", ""},
+        {"names host --db none.db", 2, "", "no database"},
+    });
+}
+
+TEST_F(Reports, EventsAreListedExportedAndCleared) {
+    setenv("TZ", "UTC", 1);
+    database("log.db").run(
+        "CREATE TABLE log(id INTEGER PRIMARY KEY, level INTEGER, time INTEGER, user, event);"
+        "INSERT INTO log VALUES(1, 0, 1767225600, 'SYSTEM', '<b>'), (2, 1, 1767225601, 'x&y', 'full')");
+    database("it's.db").run("CREATE TABLE log(id INTEGER PRIMARY KEY, level INTEGER, time INTEGER, user, event)");
+    expect({
+        {"events list --limit 1 --db log.db", 0,
+         "ID  TIME                 LEVEL    USER  EVENT\n 2  2026-01-01T00:00:01  Warning  x&y   full\n", ""},
+        {"events list --offset 1 --format ndjson --db log.db", 0,
+         "{\"id\":1,\"time\":1767225600,\"level\":\"Information\",\"user\":\"SYSTEM\",\"event\":\"<b>\"}\n", ""},
+        {"events html none/page --db log.db", 2, "", "none/page: No such file"},
+        {"events clear --db log.db", 2, "", "give --yes"},
+        {"events clear --yes --db \"it's.db\"", 2, "", "apostrophe"},
+        {"events list --db none.db", 2, "", "no database"},
+        {"events html page --db \"it's.db\"", 1, "", "no event"},
+    });
+    unsetenv("TZ");
+    EXPECT_EQ(program_.run("events html page --db log.db").status, 0);
+    EXPECT_NE(ReadFile(program_.folder().path("page")).find("<b>"), std::string::npos);
+    EXPECT_EQ(program_.run("events html page --safe --db log.db").status, 0);
+    const std::string page = ReadFile(program_.folder().path("page"));
+    EXPECT_EQ(page.find("<b>"), std::string::npos);
+    EXPECT_NE(page.find("<td>&lt;b&gt;</td>"), std::string::npos);
+    EXPECT_NE(page.find("<td>x&amp;y</td>"), std::string::npos);
+    EXPECT_EQ(program_.run("events clear --db log.db", "y\n").status, 0);
+    EXPECT_FALSE(std::filesystem::exists(program_.folder().path("log.db")));
+}
+
+class Rules : public Reports {
+  protected:
+    Rules() { reset(); }
+    ~Rules() override { reset(); }
+
+    static void reset() {
+        std::filesystem::create_directories(std::filesystem::path(paths::kNotifyRules).parent_path());
+        std::filesystem::remove(paths::kNotifyRules);
+    }
+};
+
+TEST_F(Rules, AreSetListedAndTested) {
+    expect({
+        {"rules list", 1, "", "no rule is set"},
+        {"rules set worst --level crit", 0, "set rule worst: severity crit\n", ""},
+        {"rules set many --eps 50", 0, "set rule many: eps 50\n", ""},
+        {"rules set word --keyword 'a \"b\" 100%'", 0, "set rule word: keyword a \"b\" 100%\n", ""},
+        {"rules set many --disable", 0, "set rule many: eps 50, disabled\n", ""},
+        {"rules set other", 2, "", "give --level, --eps or --keyword"},
+        {"rules set 'x]' --eps 1", 2, "", "cannot be used"},
+        {"rules set x --keyword 'a\nb=\"c\"'", 2, "", "line break"},
+        {"rules set x --level fatal", 2, "", "--level"},
+        {"rules list --format csv", 0,
+         "name,type,threshold,enabled\r\nworst,severity,crit,yes\r\nmany,eps,50,no\r\n"
+         "word,keyword,\"a \"\"b\"\" 100%\",yes\r\n",
+         ""},
+        {"rules test --level alert --eps 99 --format csv", 0,
+         "type,given,notifies,keyword\r\nseverity,alert,yes,\r\neps,99,no,\r\n", ""},
+        {"rules test --message 'so a \"b\" 100% x' --format csv --safe-csv", 0,
+         "type,given,notifies,keyword\r\nkeyword,\"so a \"\"b\"\" 100% x\",yes,\"a \"\"b\"\" 100%\"\r\n", ""},
+        {"rules test --level info", 1, "TYPE      GIVEN  NOTIFIES  KEYWORD\nseverity  info   no\n", ""},
+    });
+    std::ofstream(paths::kNotifyRules, std::ios::app) << "[half]\nnotify_type=\"1\"\n";
+    const Outcome listed = program_.run("rules list --format ndjson");
+    EXPECT_EQ(listed.status, 2);
+    EXPECT_EQ(std::count(listed.out.begin(), listed.out.end(), '\n'), 3);
+    EXPECT_NE(listed.err.find("'half'"), std::string::npos) << listed.err;
+}
+
+TEST_F(Reports, DatabasesAreCheckedSwitchedAndLimited) {
+    database("a b.db").run("CREATE TABLE logs(id INTEGER PRIMARY KEY, msg);"
+                           "WITH RECURSIVE n(i) AS (SELECT 1 UNION ALL SELECT i + 1 FROM n WHERE i < 3000) "
+                           "INSERT INTO logs(msg) SELECT 'some message of some length' FROM n");
+    const auto status = [&](const std::string& arguments) { return program_.run(arguments + " --db log.db").status; };
+    std::filesystem::copy(program_.folder().path("a b.db"), program_.folder().path("log.db"));
+    EXPECT_EQ(status("db check"), 0);
+    EXPECT_EQ(status("db wal"), 0);
+    EXPECT_EQ(database("log.db").query("PRAGMA journal_mode"), std::vector<std::string>{"wal"});
+    EXPECT_EQ(program_.run("db wal --db 'a b.db'").status, 2);
+    EXPECT_EQ(status("db limit 100000"), 0);
+    EXPECT_EQ(status("db limit 10"), 2);
+    EXPECT_TRUE(std::filesystem::exists(program_.folder().path("log.db")));
+    EXPECT_EQ(status("db limit 10 --yes"), 0);
+    EXPECT_FALSE(std::filesystem::exists(program_.folder().path("log.db")));
+    std::string damaged = ReadFile(program_.folder().path("a b.db"));
+    std::fill(damaged.begin() + 8192, damaged.begin() + 12288, 'x');
+    program_.folder().write("bad.db", damaged);
+    const Outcome checked = program_.run("db check --db bad.db");
+    EXPECT_EQ(checked.status, 2);
+    EXPECT_NE(checked.err.find("quorlog db salvage"), std::string::npos) << checked.err;
+}
+
+TEST_F(Reports, EntriesAreParsedAndBadLinesNamed) {
+    const Outcome outcome =
+        program_.run("parse --format ndjson", "kern err 2026-01-01 10:00:00 7 8 +00:00 h 1.1.1.1 p t  a  b\n"
+                                              "too short\n"
+                                              "kern odd 2026-01-01 10:00:00 x 8 +00:00 h 1.1.1.1 p t \n");
+    const std::string common = "\"tzoffset\":\"+00:00\",\"host\":\"h\",\"ip\":\"1.1.1.1\",\"fac\":\"kern\",\"prio\":";
+    EXPECT_EQ(outcome.out, "{\"id\":0,\"ldate\":\"2026-01-01\",\"ltime\":\"10:00:00\",\"utcsec\":7," + common +
+                               "\"err\",\"tag\":\"t\",\"prog\":\"p\",\"msg\":\" a  b\"}\n"
+                               "{\"id\":0,\"ldate\":\"2026-01-01\",\"ltime\":\"10:00:00\",\"utcsec\":0," +
+                               common + "\"debug\",\"tag\":\"t\",\"prog\":\"p\",\"msg\":\"\"}\n");
+    EXPECT_EQ(outcome.status, 2);
+    EXPECT_EQ(outcome.err, "quorlog: line 2: fewer than twelve fields\n"
+                           "quorlog: 1 of 3 lines were no entries; see the template that writes them\n");
+}
+
+}  // namespace

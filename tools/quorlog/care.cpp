@@ -1,0 +1,118 @@
+// db check, wal, limit: looking after the working database.
+#include <algorithm>
+#include <filesystem>
+#include <iostream>
+
+#include "ask.h"
+#include "commands.h"
+#include "common/paths.h"
+#include "database.h"
+#include "dbhandler.h"
+#include "options.h"
+#include "text.h"
+
+namespace quor::cli {
+namespace {
+
+struct CareOptions {
+    std::string db = paths::kWorkingDb;
+    uint64_t kilobytes = 0;
+    bool full = false;
+    bool yes = false;
+};
+
+void setupCheck(CLI::App& command, CareOptions& options) {
+    AddDatabaseOption(command, options.db);
+    command.add_flag("--full", options.full, "Compare indexes with their tables, too: much slower");
+}
+
+void setupWal(CLI::App& command, CareOptions& options) {
+    AddDatabaseOption(command, options.db);
+}
+
+void setupLimit(CLI::App& command, CareOptions& options) {
+    AddNumberOption(command, "kilobytes", options.kilobytes, "The size that is allowed")->required();
+    AddDatabaseOption(command, options.db);
+    AddYesOption(command, options.yes);
+}
+
+[[noreturn]] void failDamaged(const std::string& db) {
+    throw Failure(Visible(db) + " is damaged; stop syslog-ng, move the file away with its -wal and -shm, start "
+                                "syslog-ng, and save its rows with quorlog db salvage");
+}
+
+std::vector<std::string> findings(const std::string& db, bool full) {
+    const char* check = full ? "integrity_check" : "quick_check";
+    try {
+        return Ask(db, std::string("PRAGMA ") + check, check);
+    } catch (const QueryFailure& failure) {
+        if (std::string(failure.what()).find("db check") == std::string::npos) {
+            throw;
+        }
+        failDamaged(db);
+    }
+}
+
+int runCheck(const CareOptions& options) {
+    const std::string db = RequireLogDatabase(options.db);
+    const std::vector<std::string> found = findings(db, options.full);
+    if (found == std::vector<std::string>{"ok"}) {
+        WriteLine(Visible(db) + " is sound");
+        return kDone;
+    }
+    for (const std::string& finding : found) {
+        WriteLine(Visible(finding));
+    }
+    failDamaged(db);
+}
+
+// The library hands this path to a shell without quotes.
+void checkForShell(const std::string& path) {
+    const bool plain = std::all_of(path.begin(), path.end(), [](char c) {
+        return (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9') ||
+               std::string_view("/._+-").find(c) != std::string_view::npos;
+    });
+    if (!plain) {
+        throw Failure("the path " + Visible(path) + " cannot be used; give one of letters, digits and /._+- only");
+    }
+}
+
+int runWal(const CareOptions& options) {
+    const std::string db = RequireLogDatabase(options.db);
+    checkForShell(db);
+    const bool ran = SyslogngWorkingDbSetJouWal(db) == 0;
+    if (!ran || Ask(db, "PRAGMA journal_mode", "journal_mode") != std::vector<std::string>{"wal"}) {
+        throw Failure("cannot switch " + Visible(db) + " to write-ahead journaling; try again when no program uses it");
+    }
+    WriteLine(Visible(db) + " journals ahead");
+    return kDone;
+}
+
+int runLimit(const CareOptions& options) {
+    const std::string db = RequireLogDatabase(options.db);
+    const uint64_t kilobytes = std::filesystem::file_size(db) / 1024;
+    const std::string size = Visible(db) + " has " + std::to_string(kilobytes) + " KiB";
+    if (options.kilobytes > INT32_MAX || kilobytes <= options.kilobytes) {
+        WriteLine(size + ", which is allowed");
+        return kDone;
+    }
+    if (!options.yes && !Confirm(size + ". Remove it with all its rows, and have syslog-ng begin a new one?")) {
+        std::cerr << "quorlog: nothing removed\n";
+        return kNothing;
+    }
+    if (SyslogngWorkingDbCheck(db, static_cast<int>(options.kilobytes)) < 0) {
+        throw Failure("cannot remove " + Visible(db) + "; see the system log");
+    }
+    WriteLine("removed " + Visible(db));
+    return kDone;
+}
+
+}  // namespace
+
+void AddCare(CLI::App& db, int& status) {
+    AddCommand<CareOptions>(db, "check", "Look for damage in a database", status, setupCheck, runCheck);
+    AddCommand<CareOptions>(db, "wal", "Switch a database to write-ahead journaling", status, setupWal, runWal);
+    AddCommand<CareOptions>(db, "limit", "Remove a database that has grown too large", status, setupLimit, runLimit);
+}
+
+}  // namespace quor::cli
