@@ -196,7 +196,8 @@ TEST_F(QuorlogdProcess, LeavesSoundDatabasesWhenKilled) {
 TEST_F(QuorlogdProcess, RaisesAFullVolumeOnce) {
     Quorlogd daemon({"--volume", "/", "--volume-full", "0.000001", "--check-interval", "1"});
     EXPECT_TRUE(Quorlogd::eventually([] { return std::filesystem::exists(paths::kEventDb) && events().size() >= 2; }));
-    std::this_thread::sleep_for(std::chrono::milliseconds(1200));  // another check
+    daemon.send("not an entry\n");
+    EXPECT_TRUE(daemon.says("1 lines were not log entries")) << "no other check";
     daemon.closeInput();
     EXPECT_EQ(daemon.waitForExit(), 0);
     EXPECT_EQ(events().size(), 3U);
