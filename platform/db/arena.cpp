@@ -1,5 +1,6 @@
 #include "arena.h"
 
+#include <sys/mman.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -19,6 +20,19 @@ uint64_t memoryBudget() {
     const auto pages = static_cast<uint64_t>(sysconf(_SC_PHYS_PAGES));
     const auto pageSize = static_cast<uint64_t>(sysconf(_SC_PAGESIZE));
     return std::min(kMemoryBudget, pages * pageSize / kShareOfMemory);
+}
+
+// Large chunks ask for large pages: filling memory page by page costs as much as copying the texts.
+char* allocate(size_t size) {
+    constexpr size_t kLargePage = 2U << 20U;
+    void* memory = size % kLargePage == 0 ? aligned_alloc(kLargePage, size) : malloc(size);
+    if (memory == nullptr) {
+        throw std::bad_alloc();
+    }
+    if (size % kLargePage == 0) {
+        madvise(memory, size, MADV_HUGEPAGE);
+    }
+    return static_cast<char*>(memory);
 }
 
 char* resize(char* memory, size_t size) {
@@ -59,7 +73,7 @@ void Arena::addChunk(size_t kept, size_t size) {
         chunks_.empty() ? kFirstChunk : std::min<size_t>(kLargestChunk, chunks_.back().size * size_t{2});
     const size_t taken = std::max(size, next);
     chunks_.reserve(chunks_.size() + 1);
-    char* data = resize(nullptr, taken);
+    char* data = allocate(taken);
     if (kept > 0) {
         memcpy(data, end_, kept);
     }

@@ -10,7 +10,7 @@
 namespace {
 
 // How long a lock of another process is waited for: longer than any batch of the log writer takes.
-constexpr int kBusyMilliseconds = 4000;
+constexpr int kBusyMilliseconds = 3000;
 
 // SQLite takes some relative names for a URI or a database in memory.
 std::string plainName(const char* path) {

@@ -35,30 +35,50 @@ void store(char* to, size_t number) {
 template <typename Offset>
 constexpr size_t kOffsets = sizeof(Offset) == sizeof(uint16_t) ? sizeof(uint16_t) : sizeof(uint16_t) + sizeof(uint32_t);
 
-Field readInteger(sqlite3_value* value, char (&digits)[kDecimalDigits]) {
+[[gnu::always_inline]] inline Field readInteger(sqlite3_value* value, char (&digits)[kDecimalDigits]) {
     const char* end = std::to_chars(digits, digits + sizeof digits, sqlite3_value_int64(value)).ptr;
     return {digits, static_cast<size_t>(end - digits)};
 }
 
-Field readBytes(sqlite3_value* value, const void* bytes) {
+Field readBlob(sqlite3_value* value) {
+    const void* bytes = sqlite3_value_blob(value);
     const auto size = static_cast<size_t>(sqlite3_value_bytes(value));
-    if (bytes == nullptr && (size != 0 || sqlite3_value_type(value) != SQLITE_BLOB)) {
+    if (bytes == nullptr && size != 0) {
         throw std::bad_alloc();
     }
     return {bytes != nullptr ? static_cast<const char*>(bytes) : "", size};
 }
 
-Field readField(sqlite3_value* value, char (&digits)[kDecimalDigits]) {
+[[gnu::always_inline]] inline Field readText(sqlite3_value* value) {
+    const unsigned char* text = sqlite3_value_text(value);
+    if (text == nullptr) {
+        throw std::bad_alloc();
+    }
+    return {reinterpret_cast<const char*>(text), static_cast<size_t>(sqlite3_value_bytes(value))};
+}
+
+[[gnu::always_inline]] inline Field readField(sqlite3_value* value, char (&digits)[kDecimalDigits]) {
     switch (sqlite3_value_type(value)) {
     case SQLITE_NULL:
         return {nullptr, 0};
     case SQLITE_INTEGER:
         return readInteger(value, digits);
     case SQLITE_BLOB:
-        return readBytes(value, sqlite3_value_blob(value));
+        return readBlob(value);
     default:
-        return readBytes(value, sqlite3_value_text(value));
+        return readText(value);
     }
+}
+
+// Names are short: calling strcmp costs more than comparing.
+inline bool same(const std::string& name, const char* text) {
+    const char* own = name.c_str();
+    const size_t size = name.size();
+    size_t i = 0;
+    while (i <= size && own[i] == text[i]) {
+        ++i;
+    }
+    return i > size;
 }
 
 size_t recordSize(const char* record) {
@@ -77,41 +97,38 @@ const char* fieldOf(const char* record, size_t column) {
 
 void DBResult_tag::setColumns(sqlite3_stmt* statement) {
     const auto count = static_cast<size_t>(sqlite3_column_count(statement));
-    names_.reserve(count);
+    columns_.reserve(count);
     for (size_t i = 0; i < count; ++i) {
         const char* name = sqlite3_column_name(statement, static_cast<int>(i));
-        names_.emplace_back(name != nullptr ? name : "");
-        successors_.push_back(static_cast<uint16_t>((i + 1) % count));
+        columns_.push_back({name != nullptr ? name : "", (i + 1) % count});
     }
-    lastColumn_ = count - 1;
 }
 
 // Writes the row as the arena's next record. The size is 0 when the row needs wider offsets.
 template <typename Offset>
 bool DBResult_tag::write(sqlite3_stmt* statement, size_t& size) {
     char digits[kDecimalDigits];
+    const auto count = static_cast<int>(columns_.size());
     size = 0;
-    size_t used = kOffsets<Offset> + names_.size() * sizeof(Offset);
+    size_t used = kOffsets<Offset> + columns_.size() * sizeof(Offset);
     if (!arena_.reserve(0, used)) {
         return false;
     }
-    for (size_t i = 0; i < names_.size(); ++i) {
-        const Field field = readField(sqlite3_column_value(statement, static_cast<int>(i)), digits);
-        char* offset = arena_.record() + kOffsets<Offset> + i * sizeof(Offset);
-        if (field.text == nullptr) {
-            store<Offset>(offset, 0);
-            continue;
-        }
-        const size_t end = used + field.size + 1;
+    for (int i = 0; i < count; ++i) {
+        const Field field = readField(sqlite3_column_value(statement, i), digits);
+        const size_t end = field.text != nullptr ? used + field.size + 1 : used;
         if (end > std::numeric_limits<Offset>::max()) {
             return sizeof(Offset) == sizeof(uint16_t);
         }
-        store<Offset>(offset, used);
         if (!arena_.reserve(used, end)) {
             return false;
         }
-        memcpy(arena_.record() + used, field.text, field.size);
-        arena_.record()[end - 1] = '\0';
+        char* record = arena_.record();
+        store<Offset>(record + kOffsets<Offset> + static_cast<size_t>(i) * sizeof(Offset), end > used ? used : 0);
+        if (end > used) {
+            memcpy(record + used, field.text, field.size);
+            record[end - 1] = '\0';
+        }
         used = end;
     }
     size = used;
@@ -152,40 +169,45 @@ bool DBResult_tag::next(uint32_t& row) {
     return true;
 }
 
-const char* DBResult_tag::field(uint32_t row, const char* column) {
-    const int number = row < rows_ ? columnNumber(column) : -1;
-    return number >= 0 ? fieldOf(record(row), static_cast<size_t>(number)) : nullptr;
+const char* DBResult_tag::field(uint32_t row, const char* name) {
+    if (row != current_ && !seek(row)) {
+        return nullptr;
+    }
+    // Callers ask for the same columns in the same order for every row.
+    if (!same(columns_[expected_].name, name) && !find(name)) {
+        return nullptr;
+    }
+    const size_t found = expected_;
+    last_ = found;
+    expected_ = columns_[found].successor;
+    return fieldOf(record_, found);
 }
 
-// Callers ask for the same columns in the same order for every row.
-int DBResult_tag::columnNumber(const char* name) {
-    const size_t guess = successors_[lastColumn_];
-    size_t found = guess;
-    if (names_[guess] != name) {
-        found = 0;
-        while (found < names_.size() && names_[found] != name) {
-            ++found;
+// Expects the column of that name, now and after the last one.
+bool DBResult_tag::find(const char* name) {
+    for (size_t i = 0; i < columns_.size(); ++i) {
+        if (same(columns_[i].name, name)) {
+            expected_ = columns_[last_].successor = i;
+            return true;
         }
-        if (found == names_.size()) {
-            return -1;
-        }
-        successors_[lastColumn_] = static_cast<uint16_t>(found);
     }
-    lastColumn_ = found;
-    return static_cast<int>(found);
+    return false;
 }
 
 // A walk goes on from the row before; any other row is found from the mark before it.
-const char* DBResult_tag::record(uint32_t row) {
+bool DBResult_tag::seek(uint32_t row) {
+    if (row >= rows_) {
+        return false;
+    }
     if (row < current_ || row - current_ >= kStride) {
         moveTo(marks_[row / kStride]);
-        current_ = row / kStride * kStride;
+        current_ = row - row % kStride;
     }
-    while (current_ < row) {
+    for (; current_ < row; ++current_) {
         moveTo(arena_.after(position_, recordSize(arena_.at(position_))));
-        ++current_;
     }
-    return arena_.at(position_);
+    record_ = arena_.at(position_);
+    return true;
 }
 
 void DBResult_tag::moveTo(Position position) {

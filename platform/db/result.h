@@ -22,26 +22,32 @@ struct DBResult_tag {
     // ---- reading
     uint32_t rows() const { return rows_; }
     bool next(uint32_t& row);
-    const char* field(uint32_t row, const char* column);
+    const char* field(uint32_t row, const char* name);
 
   private:
     using Position = quor::Arena::Position;
 
+    struct Column {
+        std::string name;
+        size_t successor;  // the column that was asked for after this one
+    };
+
     template <typename Offset>
     bool write(sqlite3_stmt* statement, size_t& size);
-    int columnNumber(const char* name);
-    const char* record(uint32_t row);
+    bool find(const char* name);
+    bool seek(uint32_t row);
     void moveTo(Position position);
 
-    std::vector<std::string> names_;
-    std::vector<uint16_t> successors_;  // the column that was asked for after this one
-    size_t lastColumn_ = 0;
+    std::vector<Column> columns_;
+    size_t last_ = 0;
+    size_t expected_ = 0;
     quor::Arena arena_;
     std::vector<Position> marks_;  // of every 64th row
     uint32_t rows_ = 0;
     uint32_t next_ = 0;
-    uint32_t current_ = 0;  // the row that was asked for last, and where it stands
+    uint64_t current_ = UINT64_MAX;  // the row that was asked for last, and where it stands
     Position position_;
+    const char* record_ = nullptr;
 };
 
 #endif

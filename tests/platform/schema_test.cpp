@@ -1,0 +1,51 @@
+// The log schema against SQLite's planner: a search that stops using an index takes a hundred times longer.
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <string>
+#include <vector>
+
+#include "support/sqlite_file.h"
+#include "support/temp_folder.h"
+
+namespace {
+
+class LogSchema : public ::testing::Test {
+  protected:
+    LogSchema() { db_.run(quor::test::ReadFile(QUOR_SOURCE "/schema/syslog.sql")); }
+
+    quor::test::TempFolder folder_;
+    quor::test::SqliteFile db_{folder_.path("logs.db")};
+};
+
+TEST_F(LogSchema, SearchesGoTheWayThatWasMeasured) {
+    quor::test::SqliteFile reader(folder_.path("logs.db"));
+    const struct {
+        const char* sql;
+        const char* plan;
+    } cases[] = {
+        {"SELECT * FROM logs WHERE (host = 'a') ORDER BY id desc LIMIT 50",
+         "SEARCH logs USING INDEX logs_host_idx (host=?)"},
+        {"SELECT * FROM logs WHERE (prog = 'a') AND (msg GLOB '*b*') ORDER BY id desc LIMIT 50",
+         "SEARCH logs USING INDEX logs_prog_idx (prog=?)"},
+        {"SELECT * FROM logs WHERE ((host = 'a') OR (host = 'b')) ORDER BY id desc LIMIT 50", "SCAN logs"},
+        {"SELECT * FROM logs WHERE (ldate >= '2024-01-01') ORDER BY id desc LIMIT 50", "SCAN logs"},
+        {"SELECT COUNT(*) FROM logs WHERE (host = 'a')", "SEARCH logs USING COVERING INDEX logs_host_idx (host=?)"},
+        {"SELECT prog FROM logs GROUP BY prog ORDER BY prog asc", "SCAN logs USING COVERING INDEX logs_prog_idx"},
+    };
+    for (const auto& c : cases) {
+        EXPECT_EQ(reader.query(std::string("EXPLAIN QUERY PLAN ") + c.sql).at(3), c.plan) << c.sql;
+    }
+    const auto code = reader.query("EXPLAIN SELECT DISTINCT host FROM logs");  // skips from one host to the next
+    EXPECT_NE(std::find(code.begin(), code.end(), "SeekGT"), code.end());
+}
+
+TEST_F(LogSchema, LevelsAndNamesAreFound) {
+    db_.run("INSERT INTO logs (host, prio, prog) VALUES ('b', 'err', 'su'), ('a', 'info', 'su'), ('b', 'err', NULL)");
+    EXPECT_EQ(db_.query("SELECT id FROM logs WHERE llevel = 'err'"), (std::vector<std::string>{"1", "3"}));
+    EXPECT_EQ(db_.query("SELECT host_name FROM hosts ORDER BY 1"), (std::vector<std::string>{"a", "b"}));
+    EXPECT_EQ(db_.query("SELECT count(DISTINCT prog_id) FROM progs"), std::vector<std::string>{"2"});
+    EXPECT_EQ(db_.query("SELECT * FROM db_info"), (std::vector<std::string>{"1", "0", "0", "0", ""}));
+}
+
+}  // namespace
