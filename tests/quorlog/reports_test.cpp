@@ -178,7 +178,7 @@ TEST_F(Reports, EntriesAreParsedAndBadLinesNamed) {
         program_.run("parse --format ndjson", "kern err 2026-01-01 10:00:00 7 8 +00:00 h 1.1.1.1 p t  a  b\n"
                                               "too short\n"
                                               "kern odd 2026-01-01 10:00:00 x 8 +00:00 h 1.1.1.1 p t \n");
-    const std::string common = "\"tzoffset\":\"+00:00\",\"host\":\"h\",\"ip\":\"1.1.1.1\",\"fac\":\"kern\",\"prio\":";
+    const std::string common = R"("tzoffset":"+00:00","host":"h","ip":"1.1.1.1","fac":"kern","prio":)";
     EXPECT_EQ(outcome.out, "{\"id\":0,\"ldate\":\"2026-01-01\",\"ltime\":\"10:00:00\",\"utcsec\":7," + common +
                                "\"err\",\"tag\":\"t\",\"prog\":\"p\",\"msg\":\" a  b\"}\n"
                                "{\"id\":0,\"ldate\":\"2026-01-01\",\"ltime\":\"10:00:00\",\"utcsec\":0," +

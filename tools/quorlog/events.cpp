@@ -48,7 +48,7 @@ void setupClear(CLI::App& command, EventsOptions& options) {
 
 // The library would create a missing database.
 std::string requireEvents(const std::string& path) {
-    const std::string db = RequireDatabase(path, "start quorlogd, which writes it, or give another --db");
+    std::string db = RequireDatabase(path, "start quorlogd, which writes it, or give another --db");
     RequireTable(db, "log");
     return db;
 }

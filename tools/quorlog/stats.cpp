@@ -53,7 +53,7 @@ void setupEps(CLI::App& command, StatsOptions& options) {
 
 // The readers of the library give 0 and nothing for a database that they cannot read.
 std::string requireStatistics(const std::string& path, const char* table) {
-    const std::string db = RequireDatabase(path, "start quorlogd, which writes it, or give another --db");
+    std::string db = RequireDatabase(path, "start quorlogd, which writes it, or give another --db");
     RequireTable(db, table);
     return db;
 }
