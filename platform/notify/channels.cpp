@@ -23,11 +23,11 @@ bool mailConfigured(const Settings& settings) {
 }
 
 // The quick ones first: a slow mail server holds up nothing but mail.
-constexpr Channel kChannels[kChannelCount] = {
+constexpr std::array<Channel, kChannelCount> kChannels{{
     {"desktop", desktopConfigured, DeliverToDesktop, kFailure},
     {"webhook", webhookConfigured, DeliverToWebhooks, kFailure},
     {"mail", mailConfigured, DeliverByMail, "Failed to send email."},
-};
+}};
 
 constexpr uint32_t bitOf(size_t channel) {
     return 1U << channel;
@@ -35,7 +35,7 @@ constexpr uint32_t bitOf(size_t channel) {
 
 }  // namespace
 
-const Channel (&Channels())[kChannelCount] {
+const std::array<Channel, kChannelCount>& Channels() {
     return kChannels;
 }
 

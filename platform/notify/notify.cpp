@@ -8,7 +8,7 @@
 namespace quor::notify {
 namespace {
 
-constexpr int kPatienceMs = 30;  // others hold the spool for a fraction of that
+constexpr int kPatienceMs = 500;  // others hold the spool for far less than one, unless the system stops them
 
 enum class Outcome { failed, nothingToDo, deliver };
 

@@ -1,8 +1,10 @@
 // The notification service from the inside. The caller's process renders a notice, asks the filter, and queues it in
-// the spool; a detached worker takes it from there and delivers it. Only the spool is shared between the processes.
+// the spool; a detached worker takes it from there and delivers it. Only the spool is shared between the processes, so
+// all of them run as the same user.
 #ifndef PLATFORM_NOTIFY_NOTIFY_H
 #define PLATFORM_NOTIFY_NOTIFY_H
 
+#include <array>
 #include <cstdint>
 #include <optional>
 #include <string>
@@ -120,7 +122,7 @@ struct Channel {
 };
 
 constexpr size_t kChannelCount = 3;
-const Channel (&Channels())[kChannelCount];
+const std::array<Channel, kChannelCount>& Channels();
 
 uint32_t ConfiguredChannels(const Settings& settings);
 // The bits of a comma list of names; unknown names are ignored.

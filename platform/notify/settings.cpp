@@ -1,11 +1,11 @@
-#include <unistd.h>
-
 #include <algorithm>
 #include <array>
 #include <cstring>
 
 #include "common/numbers.h"
 #include "common/paths.h"
+#include "platform/core/sections.h"
+#include "platform/core/textfile.h"
 #include "platform/guarded.h"
 #include "platform/notify/notify.h"
 
@@ -15,32 +15,49 @@ namespace {
 enum Security { kNone, kStartTls, kTls, kSecurities };
 constexpr std::array<const char*, kSecurities> kSecurityNames{"none", "starttls", "tls"};
 constexpr std::array<int, kSecurities> kDefaultPorts{25, 587, 465};
+constexpr size_t kMostBytes = size_t{1} << 20U;
 constexpr int32_t kDefaultTimeout = 30;
 constexpr int32_t kLongestTimeout = 300;
 
-// A key that is absent leaves `out` as it is.
-template <size_t Size>
-void read(const char* key, char (&out)[Size]) {
-    char value[Size]{};
-    if (QLIBCFileGetKeyValue(paths::kSystemSettings, key, value, static_cast<int>(Size), 0) >= 0) {
-        memcpy(out, value, Size);
+// The settings file, read once for all keys.
+class Keys {
+  public:
+    // Nothing when the file cannot be read.
+    static std::optional<Keys> load() {
+        Keys keys;
+        const bool read = ReadTextFile(paths::kSystemSettings, kMostBytes, *keys.text_) == ReadOutcome::Done;
+        keys.lines_ = ParseSectionLines(*keys.text_);
+        return read ? std::optional(std::move(keys)) : std::nullopt;
     }
-}
 
-std::string readText(const char* key) {
-    char value[2048]{};
-    read(key, value);
-    return value;
-}
+    // The first line with the key counts; empty when there is none.
+    std::string text(std::string_view key) const {
+        for (const SectionLine& line : lines_) {
+            if (line.kind == SectionLine::Kind::Entry && line.name == key) {
+                return std::string(line.value);
+            }
+        }
+        return "";
+    }
 
-bool readYes(const char* key, bool absent) {
-    const std::string value = readText(key);
-    return value.empty() ? absent : value == "yes";
-}
+    bool yes(std::string_view key, bool absent = false) const {
+        const std::string value = text(key);
+        return value.empty() ? absent : value == "yes";
+    }
 
-bool readable() {
-    return access(paths::kSystemSettings, R_OK) == 0;
-}
+    // A text too long for its place is as good as none: half an address leads to somebody else.
+    template <size_t Size>
+    void copy(std::string_view key, char (&out)[Size]) const {
+        const std::string value = text(key);
+        if (value.size() < Size) {
+            memcpy(out, value.c_str(), value.size() + 1);
+        }
+    }
+
+  private:
+    std::unique_ptr<std::string> text_ = std::make_unique<std::string>();  // the lines point into it
+    SectionLines lines_;
+};
 
 // An unknown word must not send a password in the clear.
 int securityNamed(const std::string& name) {
@@ -48,30 +65,30 @@ int securityNamed(const std::string& name) {
     return found == kSecurityNames.end() ? kStartTls : static_cast<int>(found - kSecurityNames.begin());
 }
 
-QUORMAIL readMail() {
+QUORMAIL readMail(const Keys& keys) {
     QUORMAIL mail{};
-    read("smtp_server", mail.server);
-    read("smtp_recipient", mail.recipient);
-    read("smtp_sender", mail.sender);
-    read("smtp_user", mail.user);
-    read("smtp_password", mail.password);
-    read("smtp_ca_file", mail.caFile);
-    mail.verify = readYes("smtp_tls_verify", true) ? 1 : 0;
-    mail.security = securityNamed(readText("smtp_security"));
-    const int32_t port = ToInt32(readText("smtp_port").c_str());
+    keys.copy("smtp_server", mail.server);
+    keys.copy("smtp_recipient", mail.recipient);
+    keys.copy("smtp_sender", mail.sender);
+    keys.copy("smtp_user", mail.user);
+    keys.copy("smtp_password", mail.password);
+    keys.copy("smtp_ca_file", mail.caFile);
+    mail.verify = keys.yes("smtp_tls_verify", true) ? 1 : 0;
+    mail.security = securityNamed(keys.text("smtp_security"));
+    const int32_t port = ToInt32(keys.text("smtp_port").c_str());
     mail.port = port > 0 && port <= 65535 ? port : kDefaultPorts[static_cast<size_t>(mail.security)];
     return mail;
 }
 
-Settings readSettings() {
+Settings readSettings(const Keys& keys) {
     Settings settings;
-    settings.mail = readMail();
-    settings.mailEnabled = readYes("smtp_mail_enabled", false);
-    settings.desktopEnabled = readYes("desktop_notify_enabled", false);
-    settings.webhookUrls = Words(readText("webhook_url"), " \t");
-    settings.webhookCaFile = readText("webhook_ca_file");
-    settings.webhookVerify = readYes("webhook_tls_verify", true);
-    const int32_t timeout = ToInt32(readText("notify_timeout").c_str());
+    settings.mail = readMail(keys);
+    settings.mailEnabled = keys.yes("smtp_mail_enabled");
+    settings.desktopEnabled = keys.yes("desktop_notify_enabled");
+    settings.webhookUrls = Words(keys.text("webhook_url"), " \t");
+    settings.webhookCaFile = keys.text("webhook_ca_file");
+    settings.webhookVerify = keys.yes("webhook_tls_verify", true);
+    const int32_t timeout = ToInt32(keys.text("notify_timeout").c_str());
     settings.timeout = timeout > 0 ? std::min(timeout, kLongestTimeout) : kDefaultTimeout;
     return settings;
 }
@@ -79,29 +96,30 @@ Settings readSettings() {
 }  // namespace
 
 std::optional<Settings> LoadSettings() {
-    return readable() ? std::optional(readSettings()) : std::nullopt;
+    const std::optional<Keys> keys = Keys::load();
+    return keys ? std::optional(readSettings(*keys)) : std::nullopt;
 }
 
 }  // namespace quor::notify
 
 int QUORMailGet(QUORMAIL* mail) {
-    using namespace quor;
-    if (mail == nullptr || !notify::readable()) {
-        return -1;
-    }
-    return Guarded(-1, [&] {
-        *mail = notify::readMail();
+    using quor::notify::Keys;
+    return quor::Guarded(-1, [&] {
+        const std::optional<Keys> keys = mail != nullptr ? Keys::load() : std::nullopt;
+        if (!keys) {
+            return -1;
+        }
+        *mail = quor::notify::readMail(*keys);
         return 0;
     });
 }
 
 QUORSMSCONF* QUORSmsConfGet() {
-    using namespace quor;
-    if (!notify::readable()) {
-        return nullptr;
-    }
-    return Guarded(static_cast<QUORSMSCONF*>(nullptr),
-                   [] { return new QUORSMSCONF{notify::readYes("sms_enabled", false) ? 1 : 0}; });
+    using quor::notify::Keys;
+    return quor::Guarded(static_cast<QUORSMSCONF*>(nullptr), [] {
+        const std::optional<Keys> keys = Keys::load();
+        return keys ? new QUORSMSCONF{keys->yes("sms_enabled") ? 1 : 0} : nullptr;
+    });
 }
 
 void QUORSmsConfFree(QUORSMSCONF* conf) {

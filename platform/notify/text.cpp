@@ -1,5 +1,3 @@
-#include <array>
-
 #include "platform/notify/notify.h"
 
 namespace quor::notify {

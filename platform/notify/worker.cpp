@@ -95,6 +95,7 @@ void deliverQueue() {
     closeInherited(slot);
     resetSignals();
     (void)umask(077);
+    openlog("quornotify", LOG_PID, 0);  // in the caller's facility
     (void)prctl(PR_SET_NAME, "quornotify");
     if (chdir("/") == 0) {
         deliverQueue();

@@ -120,7 +120,12 @@ class Notify : public ::testing::Test {
         Eventually([&] { return linesOf(ReadFile(path)).size() >= count; });
         return linesOf(ReadFile(path));
     }
-    std::vector<std::string> systemLog(size_t count) { return awaitLines(folder_.path("syslog"), count); }
+    // At least `count` lines, the missing ones empty.
+    std::vector<std::string> systemLog(size_t count) {
+        std::vector<std::string> lines = awaitLines(folder_.path("syslog"), count);
+        lines.resize(std::max(lines.size(), count));
+        return lines;
+    }
 
     TempFolder folder_;
     std::string texts_ = folder_.path();
