@@ -15,7 +15,6 @@ rules=$root/etc/quorsyslog/notify.conf
 mails=$root/mails.txt
 quorlog=$build/tools/quorlog/quorlog
 receiver=$build/tools/quorlogd/quorlogd
-[ -x "$receiver" ] || receiver="cat > /dev/null"
 children=()
 
 say() { printf '\n\033[1m%s\033[0m\n' "$*"; }
@@ -34,6 +33,7 @@ stop() {
     children=()
 }
 trap stop EXIT
+trap "exit 0" INT TERM
 
 # Polls a condition for at most 20 seconds.
 await() {
@@ -95,6 +95,30 @@ check_found() {
     say "All ${#sent[@]} messages sent were found again."
 }
 
+# The receiver closes its sample when the second has passed and writes when asked to; then everything must agree.
+field() { "$quorlog" "$@" --format csv | tail -n +2 | tr -d '\r'; }
+samples_sum() { field stats eps --last 1d | awk -F, '{ sum += $2 } END { print sum + 0 }'; }
+accounted() {
+    pkill -USR2 -P "$(cat "$root/run/syslog-ng.pid")" -f quorlogd
+    [ "$(field stats total)" = "${#sent[@]}" ]
+}
+check_totals() {
+    local rows total samples
+    await "the accounting of ${#sent[@]} messages" accounted
+    rows=$(field count) total=$(field stats total) samples=$(samples_sum)
+    say "${#sent[@]} messages sent, $rows rows stored, $total counted by device, $samples in the samples of the rate."
+    [ "$rows" = "$total" ] && [ "$total" = "$samples" ] || fail "the numbers do not agree"
+}
+
+mails_arrived() { [ "$(grep -c '^Subject:' "$mails")" -ge 2 ]; }
+
+# A mail as it arrived, its body decoded for reading.
+show_mails() {
+    await "the arrival of the mails" mails_arrived
+    say "The mails, as the recipient's server got them:"
+    /usr/bin/python3 scripts/demo/show_mails.py "$mails"
+}
+
 by_hand() {
     say "The chain is up. In another terminal:"
     cat << TEXT
@@ -104,7 +128,7 @@ by_hand() {
   $quorlog --help-all
 Mail arrives in $mails. Ctrl-C ends everything; the data stays in $root.
 TEXT
-    wait -n
+    wait -n || true
 }
 
 fresh_root
@@ -113,10 +137,16 @@ start_syslog_ng
 say "Sending messages to 127.0.0.1:$port (UDP and TCP, RFC 3164 and RFC 5424) ..."
 send_messages
 await "the arrival of ${#sent[@]} messages" all_stored
-show search --limit 14
+show search --limit 8
+show search --host intruder
+show search --level err+ --limit 5 --offset 2 --format ndjson
 show count
 show count --level err+
-show search --limit 5 --offset 40
-show search --host intruder --format ndjson
 check_found
+check_totals
+show stats top --limit 5
+show stats eps
+show names host
+show events list
+show_mails
 [ -n "${ONCE:-}" ] || by_hand
