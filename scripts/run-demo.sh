@@ -99,7 +99,7 @@ check_found() {
 field() { "$quorlog" "$@" --format csv | tail -n +2 | tr -d '\r'; }
 samples_sum() { field stats eps --last 1d | awk -F, '{ sum += $2 } END { print sum + 0 }'; }
 accounted() {
-    pkill -USR2 -P "$(cat "$root/run/syslog-ng.pid")" -f quorlogd
+    pkill -USR2 -P "$(cat "$root/run/syslog-ng.pid")" quorlogd
     [ "$(field stats total)" = "${#sent[@]}" ]
 }
 check_totals() {
