@@ -1,0 +1,30 @@
+function(run)
+    execute_process(COMMAND ${ARGN} RESULT_VARIABLE status)
+    if(status)
+        list(JOIN ARGN " " command)
+        message(FATAL_ERROR "failed (${status}): ${command}")
+    endif()
+endfunction()
+
+file(REMOVE_RECURSE ${WORK})
+set(prefix ${WORK}/prefix)
+set(ENV{DESTDIR} "")
+if(FLAGS)
+    set(FLAGS "-fsanitize=${FLAGS}")
+endif()
+run(${CMAKE_COMMAND} --install ${BUILD} --prefix ${prefix})
+
+run(${CMAKE_COMMAND} -S ${USER} -B ${WORK}/cmake -G Ninja -DCMAKE_PREFIX_PATH=${prefix}
+    -DCMAKE_CXX_COMPILER=${CXX} -DCMAKE_CXX_FLAGS=${FLAGS})
+run(${CMAKE_COMMAND} --build ${WORK}/cmake)
+run(${WORK}/cmake/user ${WORK}/cmake.db ${prefix}/quor/syslog/schema/syslog.sql)
+
+file(GLOB_RECURSE pc ${prefix}/quorsyslog.pc)
+cmake_path(GET pc PARENT_PATH pc_folder)
+set(ENV{PKG_CONFIG_PATH} ${pc_folder})
+execute_process(COMMAND pkg-config --define-variable=prefix=${prefix} --cflags --libs quorsyslog
+                OUTPUT_VARIABLE options OUTPUT_STRIP_TRAILING_WHITESPACE COMMAND_ERROR_IS_FATAL ANY)
+separate_arguments(options UNIX_COMMAND "${options} ${FLAGS}")
+cmake_path(GET pc_folder PARENT_PATH libraries)
+run(${CXX} -std=c++17 ${USER}/main.cpp -o ${WORK}/user ${options} -Wl,-rpath,${libraries})
+run(${WORK}/user ${WORK}/pkgconfig.db ${prefix}/quor/syslog/schema/syslog.sql)
