@@ -153,9 +153,12 @@ Arena::Position Arena::after(Position position, size_t size) const {
     return position;
 }
 
-void Arena::leave(uint32_t chunk) const {
-    if (inFile(chunk)) {
-        file_.drop(chunks_[chunk].data, chunks_[chunk].used);
+void Arena::goOn(uint32_t from, uint32_t to) const {
+    if (inFile(from)) {
+        file_.drop(chunks_[from].data, chunks_[from].used);
+    }
+    if (inFile(to)) {
+        file_.fetch(chunks_[to].data, chunks_[to].used);
     }
 }
 

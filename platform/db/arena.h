@@ -35,8 +35,8 @@ class Arena {
     const char* at(Position position) const { return chunks_[position.chunk].data + position.offset; }
     // The position behind a record, where the next one stands.
     Position after(Position position, size_t size) const;
-    // Called when a reader goes on from one chunk to another.
-    void leave(uint32_t chunk) const;
+    // A reader goes on from one chunk to another.
+    void goOn(uint32_t from, uint32_t to) const;
 
   private:
     struct Chunk {

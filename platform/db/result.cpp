@@ -212,7 +212,7 @@ bool DBResult_tag::seek(uint32_t row) {
 
 void DBResult_tag::moveTo(Position position) {
     if (position.chunk != position_.chunk) {
-        arena_.leave(position_.chunk);
+        arena_.goOn(position_.chunk, position.chunk);
     }
     position_ = position;
 }

@@ -73,9 +73,21 @@ char* SpillFile::map() {
 }
 
 void SpillFile::drop(const char* data, size_t size) const {
+    advise(data, size, MADV_DONTNEED);
+}
+
+void SpillFile::fetch(const char* data, size_t size) const {
+#ifdef MADV_POPULATE_READ
+    advise(data, size, MADV_POPULATE_READ);  // older kernels refuse it, and the pages come when they are touched
+#else
+    advise(data, size, MADV_WILLNEED);
+#endif
+}
+
+void SpillFile::advise(const char* data, size_t size, int advice) const {
     const auto page = static_cast<size_t>(sysconf(_SC_PAGESIZE));
     const size_t begin = static_cast<size_t>(data - map_) / page * page;
-    madvise(map_ + begin, static_cast<size_t>(data - map_) + size - begin, MADV_DONTNEED);
+    (void)madvise(map_ + begin, static_cast<size_t>(data - map_) + size - begin, advice);
 }
 
 }  // namespace quor

@@ -21,8 +21,12 @@ class SpillFile {
     char* map();
     // Gives the memory of a part back; it is read again when it is touched.
     void drop(const char* data, size_t size) const;
+    // Brings a part in at once, which costs far less than page by page.
+    void fetch(const char* data, size_t size) const;
 
   private:
+    void advise(const char* data, size_t size, int advice) const;
+
     int file_ = -1;
     uint64_t size_ = 0;
     char* map_ = nullptr;

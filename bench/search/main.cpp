@@ -1,0 +1,22 @@
+// Options are Google Benchmark's. QUOR_BENCH_ROWS=10000000 adds the largest table.
+#include <benchmark/benchmark.h>
+
+#include <cstdio>
+#include <cstdlib>
+#include <exception>
+
+#include "search.h"
+#include "tables.h"
+
+int main(int argc, char** argv) try {
+    const char* rows = getenv("QUOR_BENCH_ROWS");
+    quor::bench::PrintMemory();
+    (void)fflush(stdout);
+    quor::bench::AddSearches(rows != nullptr && atoll(rows) >= quor::bench::kHuge);
+    benchmark::Initialize(&argc, argv);
+    benchmark::RunSpecifiedBenchmarks();
+    return 0;
+} catch (const std::exception& problem) {
+    (void)fprintf(stderr, "quor_bench: %s\n", problem.what());
+    return 1;
+}
