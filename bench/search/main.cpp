@@ -12,7 +12,7 @@ int main(int argc, char** argv) try {
     const char* rows = getenv("QUOR_BENCH_ROWS");
     quor::bench::PrintMemory();
     (void)fflush(stdout);
-    quor::bench::AddSearches(rows != nullptr && atoll(rows) >= quor::bench::kHuge);
+    quor::bench::AddSearches(rows != nullptr && strtoll(rows, nullptr, 10) >= quor::bench::kHuge);
     benchmark::Initialize(&argc, argv);
     benchmark::RunSpecifiedBenchmarks();
     return 0;
