@@ -28,6 +28,11 @@ endif()
 function(quor_install_library target header_folder headers)
     set_target_properties(${target} PROPERTIES VERSION ${PROJECT_VERSION} SOVERSION ${PROJECT_VERSION_MAJOR})
     target_include_directories(${target} INTERFACE $<INSTALL_INTERFACE:include>)
+    if(BUILD_SHARED_LIBS)
+        set(map ${PROJECT_SOURCE_DIR}/cmake/${target}.map)
+        target_link_options(${target} PRIVATE LINKER:--version-script=${map})
+        set_property(TARGET ${target} APPEND PROPERTY LINK_DEPENDS ${map})
+    endif()
     install(TARGETS ${target} EXPORT quorsyslog
             RUNTIME COMPONENT tools LIBRARY COMPONENT library NAMELINK_COMPONENT development
             ARCHIVE COMPONENT development)

@@ -180,7 +180,8 @@ bool IsFullLeaf(const uint8_t* page, size_t size) {
             return false;
         }
         const uint64_t local = localSize(payload, static_cast<uint32_t>(size));
-        furthest = std::max(furthest, static_cast<size_t>(at - page) + local + (local < payload ? 4 : 0));
+        furthest =
+            std::max(furthest, static_cast<size_t>(at - page) + static_cast<size_t>(local) + (local < payload ? 4 : 0));
     }
     return furthest == size;
 }
