@@ -1,7 +1,7 @@
 # The commands of the project; see README.md. Each installs what it needs from Debian's packages.
 BUILD := build
 
-.PHONY: run test bench check format tidy asan powerpc release install clean
+.PHONY: run test bench check format tidy asan powerpc package try-package docs release install clean
 
 run:            ## start the real receiving chain on loopback and show what it received
 	scripts/install-deps.sh build run
@@ -39,6 +39,19 @@ powerpc:        ## cross-build for the appliance (32-bit big-endian) and run the
 	scripts/build-powerpc-deps.sh $(BUILD)/powerpc-deps
 	scripts/build.sh powerpc
 	ctest --preset powerpc
+
+package:        ## Debian packages and tarballs for this machine and for the appliance, in build/packages
+	scripts/install-deps.sh build powerpc package
+	scripts/package.sh release
+	scripts/build-powerpc-deps.sh $(BUILD)/powerpc-deps
+	scripts/package.sh release-powerpc
+
+try-package: package  ## install, run, remove and purge the packages in a clean Debian (root)
+	scripts/try-packages.sh $(BUILD)/packages $(BUILD)/package-root
+
+docs:           ## check the manuals; the interface as HTML, in build/docs
+	scripts/install-deps.sh docs
+	scripts/check-docs.sh $(BUILD)/docs
 
 release:
 	scripts/install-deps.sh build

@@ -21,6 +21,24 @@ set(QUOR_TEXTS_FOLDER quor/quorman/webman/modules/Orvane/texts)
 install(DIRECTORY ${PROJECT_SOURCE_DIR}/schema/ DESTINATION ${QUOR_SCHEMA_FOLDER} COMPONENT tools)
 install(DIRECTORY ${PROJECT_SOURCE_DIR}/texts/ DESTINATION ${QUOR_TEXTS_FOLDER} COMPONENT tools)
 
+install(DIRECTORY DESTINATION quor/etc COMPONENT tools)
+
+if(QUOR_BUILD_TOOLS)
+    set(etc ${PROJECT_SOURCE_DIR}/etc)
+    install(FILES ${etc}/notify.filter DESTINATION ${CMAKE_INSTALL_FULL_SYSCONFDIR}/quorsyslog COMPONENT tools)
+    install(FILES ${etc}/syslog-ng/quorsyslog.conf DESTINATION ${CMAKE_INSTALL_FULL_SYSCONFDIR}/quorsyslog
+            RENAME syslog-ng.conf COMPONENT tools)
+    install(FILES ${etc}/quorinfo.conf.example DESTINATION ${CMAKE_INSTALL_DATADIR}/doc/quorsyslog/examples
+            COMPONENT tools)
+    install(FILES ${etc}/systemd/quorlog-checkpoint.service ${etc}/systemd/quorlog-checkpoint.timer
+            DESTINATION lib/systemd/system COMPONENT tools)
+    install(FILES ${etc}/systemd/syslog-ng-quorsyslog.conf DESTINATION lib/systemd/system/syslog-ng.service.d
+            RENAME quorsyslog.conf COMPONENT tools)
+    install(FILES docs/man/notify.conf.5 docs/man/notify.filter.5 docs/man/quorinfo.conf.5
+            DESTINATION ${CMAKE_INSTALL_MANDIR}/man5 COMPONENT tools)
+endif()
+install(FILES docs/man/quorsyslog.3 DESTINATION ${CMAKE_INSTALL_MANDIR}/man3 COMPONENT development)
+
 # A build with QUOR_ROOT finds the same data below that folder.
 if(QUOR_ROOT)
     add_custom_target(root_data ALL

@@ -1,6 +1,6 @@
 #!/bin/sh
 # Installs the Debian packages of the named sets that are missing, through sudo when not root.
-# Usage: install-deps.sh SET...   sets: build run test bench powerpc check
+# Usage: install-deps.sh SET...   sets: build run test bench powerpc package docs check
 set -eu
 
 packages_of() {
@@ -11,8 +11,10 @@ packages_of() {
     test) echo libgtest-dev openssl ;;
     bench) echo libbenchmark-dev ;;
     powerpc) echo g++-powerpc-linux-gnu qemu-user dpkg-dev make tcl ;;
+    package) echo dpkg-dev file debootstrap ;;
+    docs) echo doxygen mandoc ;;
     check) echo clang-14 clang-format-14 clang-tidy-14 git ;;
-    *) echo "install-deps.sh: unknown set '$1'; use build, run, test, bench, powerpc or check" >&2; return 1 ;;
+    *) echo "install-deps.sh: unknown set '$1'; use build, run, test, bench, powerpc, package, docs or check" >&2; return 1 ;;
     esac
 }
 
