@@ -25,8 +25,8 @@ install(DIRECTORY DESTINATION quor/etc COMPONENT tools)
 
 if(QUOR_BUILD_TOOLS)
     set(etc ${PROJECT_SOURCE_DIR}/etc)
-    install(FILES ${etc}/notify.filter DESTINATION ${CMAKE_INSTALL_FULL_SYSCONFDIR}/quorsyslog COMPONENT tools)
-    install(FILES ${etc}/syslog-ng/quorsyslog.conf DESTINATION ${CMAKE_INSTALL_FULL_SYSCONFDIR}/quorsyslog
+    install(FILES ${etc}/notify.filter DESTINATION ${CMAKE_INSTALL_SYSCONFDIR}/quorsyslog COMPONENT tools)
+    install(FILES ${etc}/syslog-ng/quorsyslog.conf DESTINATION ${CMAKE_INSTALL_SYSCONFDIR}/quorsyslog
             RENAME syslog-ng.conf COMPONENT tools)
     install(FILES ${etc}/quorinfo.conf.example DESTINATION ${CMAKE_INSTALL_DATADIR}/doc/quorsyslog/examples
             COMPONENT tools)
