@@ -90,7 +90,7 @@ int QLIBCExec(const char* program, ...) {
     va_list list;
     va_start(list, program);
     while (arguments[count] != nullptr && ++count < arguments.size()) {
-        arguments[count] = va_arg(list, char*);
+        arguments[count] = va_arg(list, char*);  // NOLINT(clang-analyzer-valist.Uninitialized): it is
     }
     va_end(list);
     return count < arguments.size() ? run(program, arguments.data()) : -1;
