@@ -55,7 +55,8 @@ class Descriptor {
     int number_;
 };
 
-// Lends a guard to a call that replaces the handle it points to; the guard owns whatever the call leaves there.
+// Lends a guard to a call that takes a pointer to the handle; the guard owns whatever the call leaves there. A call
+// that only fills the handle in drops what it held: reset() the guard before it.
 template <typename Guard>
 class Adopt {
   public:

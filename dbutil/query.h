@@ -38,13 +38,17 @@ struct Query {
     }
 
     // Negative on failure.
-    int execute(const std::string& sql) { return QUORDBExecute(connection.get(), sql.c_str(), Adopt(result)); }
+    int execute(const std::string& sql) {
+        result.reset();
+        return QUORDBExecute(connection.get(), sql.c_str(), Adopt(result));
+    }
 
     // Through the wrapper's limited select, which takes the low 32 bits, when there is a limit.
     int execute(const std::string& sql, const _SYSLOG_SQL_LIMIT_tag* limit) {
         if (limit == nullptr) {
             return execute(sql);
         }
+        result.reset();
         return QUORDBSelectLimit(connection.get(), sql.c_str(), static_cast<uint32_t>(limit->limit),
                                  static_cast<uint32_t>(limit->offset), Adopt(result));
     }
