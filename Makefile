@@ -1,7 +1,7 @@
 # The commands of the project; see README.md. Each installs what it needs from Debian's packages.
 BUILD := build
 
-.PHONY: run test bench check format tidy asan powerpc package try-package docs release install clean
+.PHONY: run test bench check format tidy asan powerpc package try-package linking docs release install clean
 
 run:            ## start the real receiving chain on loopback and show what it received
 	scripts/install-deps.sh build run
@@ -48,6 +48,10 @@ package:        ## Debian packages and tarballs for this machine and for the app
 
 try-package: package  ## install, run, remove and purge the packages in a clean Debian (root)
 	scripts/try-packages.sh $(BUILD)/packages $(BUILD)/package-root
+
+linking:        ## static libraries, and platform libraries other than the bundled ones
+	scripts/install-deps.sh build
+	scripts/try-linking.sh $(BUILD)/linking
 
 docs:           ## check the manuals; the interface as HTML, in build/docs
 	scripts/install-deps.sh docs

@@ -20,7 +20,7 @@ namespace quor::test {
 class Quorlogd {
   public:
     explicit Quorlogd(std::vector<std::string> options = {}) {
-        options.insert(options.begin(), {QUORLOGD, "--stderr"});
+        options.insert(options.begin(), {"/bin/sh", "-c", "exec " QUORLOGD " \"$@\"", "quorlogd", "--stderr"});
         int ends[2];
         if (pipe2(ends, O_CLOEXEC) != 0) {
             throw std::runtime_error("no pipe for the test");
@@ -34,7 +34,7 @@ class Quorlogd {
             dup2(ends[0], STDIN_FILENO);
             dup2(open("/dev/null", O_WRONLY), STDOUT_FILENO);
             dup2(open(messages.c_str(), O_WRONLY | O_CREAT | O_APPEND, 0600), STDERR_FILENO);
-            execv(QUORLOGD, arguments.data());
+            execv(arguments[0], arguments.data());
             _exit(127);
         }
         close(ends[0]);
