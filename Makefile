@@ -1,5 +1,6 @@
 # The commands of the project; see README.md. Each installs what it needs from Debian's packages.
 BUILD := build
+FUZZ_SECONDS := 60
 
 .PHONY: run test bench check format tidy asan powerpc package try-package linking docs release install clean
 
@@ -56,6 +57,16 @@ linking:        ## static libraries, and platform libraries other than the bundl
 docs:           ## check the manuals; the interface as HTML, in build/docs
 	scripts/install-deps.sh docs
 	scripts/check-docs.sh $(BUILD)/docs
+
+fuzz:           ## every fuzz target on its corpus and on new inputs, for FUZZ_SECONDS each
+	scripts/install-deps.sh build check
+	scripts/build.sh fuzz
+	scripts/fuzz.sh $(BUILD)/fuzz $(FUZZ_SECONDS)
+
+soak:           ## the real syslog-ng beside searchers, a deleter and a checkpointer, for ten minutes
+	scripts/install-deps.sh build run test
+	scripts/build.sh default
+	scripts/soak-database.sh $(BUILD)/default
 
 release:
 	scripts/install-deps.sh build

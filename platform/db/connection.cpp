@@ -12,6 +12,11 @@ namespace {
 // How long a lock of another process is waited for: longer than any batch of the log writer takes.
 constexpr int kBusyMilliseconds = 3000;
 
+// Pages of the write-ahead log from which on a commit of ours moves them into the database. The log writer does that
+// from 1,000 pages on; as long as it runs, nobody else starts it, since SQLite before 3.51.3 can damage a file when two
+// connections restart the log at the same moment.
+constexpr int kCheckpointPages = 10000;
+
 // SQLite takes some relative names for a URI or a database in memory.
 std::string plainName(const char* path) {
     return path[0] == '/' ? path : std::string("./") + path;
@@ -36,6 +41,7 @@ DBConnect_tag* QUORDBConnect(const char* /*host*/, const char* /*user*/, const c
         return nullptr;
     }
     sqlite3_busy_timeout(connection->db, kBusyMilliseconds);
+    sqlite3_wal_autocheckpoint(connection->db, kCheckpointPages);
     return connection.release();
 } catch (const std::bad_alloc&) {
     return nullptr;
