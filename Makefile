@@ -2,7 +2,7 @@
 BUILD := build
 FUZZ_SECONDS := 60
 
-.PHONY: run test bench check format tidy asan powerpc package try-package linking docs release install clean
+.PHONY: run test bench check format tidy asan fuzz soak powerpc package try-package linking docs release install clean
 
 run:            ## start the real receiving chain on loopback and show what it received
 	scripts/install-deps.sh build run
