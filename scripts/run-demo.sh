@@ -100,7 +100,7 @@ field() { "$quorlog" "$@" --format csv | tail -n +2 | tr -d '\r'; }
 samples_sum() { field stats eps --last 1d | awk -F, '{ sum += $2 } END { print sum + 0 }'; }
 accounted() {
     pkill -USR2 -P "$(cat "$root/run/syslog-ng.pid")" quorlogd
-    [ "$(field stats total)" = "${#sent[@]}" ]
+    [ "$(field stats total)" = "${#sent[@]}" ] && [ "$(samples_sum)" = "${#sent[@]}" ]
 }
 check_totals() {
     local rows total samples
