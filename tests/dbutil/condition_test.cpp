@@ -27,7 +27,7 @@ TEST(Condition, EscapesTheValueForItsOperator) {
              Case{SYSLOG_ATTRI_HOST, 0, "ab", "(host = 'ab')"},
              Case{SYSLOG_ATTRI_HOST, 1, "O'Neil", "(host != 'O''Neil')"},
              Case{SYSLOG_ATTRI_HOST, 0, R"(a\%_*?[])", R"((host = 'a\%_*?[]'))"},
-             Case{SYSLOG_ATTRI_MSG, 6, "a*b", "(msg LIKE 'a%b' escape '\\')"},
+             Case{SYSLOG_ATTRI_MSG, 6, "a*b", R"((msg LIKE 'a%b' escape '\'))"},
              Case{SYSLOG_ATTRI_MSG, 7, "50%_*?\\'", "(msg NOT LIKE '50\\%\\_%_\\\\''' escape '\\')"},
              Case{SYSLOG_ATTRI_MSG, 8, "[x]", "(msg GLOB '[[]x[]]')"},
              Case{SYSLOG_ATTRI_MSG, 9, "*e'r?", "(msg NOT GLOB '*e''r?')"},
