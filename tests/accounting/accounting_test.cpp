@@ -1,52 +1,41 @@
 #include "accounting.h"
 
-#include <gtest/gtest.h>
-#include <unistd.h>
-
-#include <filesystem>
 #include <random>
 
-#include "common/paths.h"
 #include "support/clock.h"
 #include "support/notices.h"
-#include "support/sqlite_file.h"
-#include "support/system_log.h"
-#include "support/temp_folder.h"
+#include "support/testing.h"
+
+using namespace quor::test;
 
 namespace {
 
-using quor::test::FakeNotices;
-using quor::test::SqliteFile;
-using quor::test::TakeSystemLogTexts;
-using Texts = std::vector<std::string>;
 using Histogram = std::vector<std::pair<std::string, unsigned long long>>;
 namespace paths = quor::paths;
 
 const std::string kDb = paths::kAccountingDb;
-constexpr off_t kPurgeBytes = off_t{5} * 1024 * 1024;
-
-void writeFile(const std::filesystem::path& path, const std::string& text) {
-    std::filesystem::create_directories(path.parent_path());
-    std::ofstream(path) << text;
-}
-
 class Accounting : public testing::Test {
   protected:
     void SetUp() override {
         std::filesystem::remove_all(std::filesystem::path(kDb).parent_path());
         std::filesystem::create_directories(std::filesystem::path(kDb).parent_path());
         std::filesystem::remove(paths::kEventDb);
-        writeFile(paths::kNotifyRules, "");
+        WriteFile(paths::kNotifyRules, "");
         FakeNotices() = {};
         at(1000);
     }
-    void TearDown() override { quor::test::ResetClock(); }
 
-    static void at(int64_t now) { quor::test::SetClock(now); }
+    // The package's database, and more.
+    static void create(const std::string& sql) {
+        SqliteFile(kDb).run(ReadFile(paths::kAccountingSchema));
+        SqliteFile(kDb).run(sql);
+    }
+
+    static void at(int64_t now) { SetClock(now); }
 
     // Closes one sample of one log for each device, at `now` + 1. Whole only when the last one was closed at `now`, or
     // with a single log: the second log of another second closes a sample itself.
-    static void sample(AccountingManager& accounting, int64_t now, const Texts& devices) {
+    static void sample(AccountingManager& accounting, int64_t now, const Strings& devices) {
         at(now);
         for (const std::string& device : devices) {
             accounting.LogInc(device);
@@ -55,7 +44,7 @@ class Accounting : public testing::Test {
         accounting.CurEpsUpdate();
     }
 
-    static Texts rows() { return SqliteFile(kDb).query("SELECT stamp, device, eps FROM eps ORDER BY id"); }
+    static Strings rows() { return SqliteFile(kDb).query("SELECT stamp, device, eps FROM eps ORDER BY id"); }
 };
 
 Histogram histogramOf(AccountingManager& accounting) {
@@ -72,7 +61,7 @@ struct Model {
     std::map<std::string, int> open;
     unsigned long long eps = 0;
     int64_t stamp = 0;
-    Texts rows;
+    Strings rows;
 
     void log(int64_t now, const std::string& device) {
         if (now != stamp && eps != 0) {
@@ -99,8 +88,7 @@ struct Model {
 }  // namespace
 
 TEST_F(Accounting, CountsAsAWalkOfTheHistogramWould) {
-    SqliteFile(kDb).run(quor::test::ReadFile(paths::kAccountingSchema));
-    SqliteFile(kDb).run("INSERT INTO histogram VALUES (NULL, 'd7', 40), (NULL, 'D7', 2)");
+    create("INSERT INTO histogram VALUES (NULL, 'd7', 40), (NULL, 'D7', 2)");
     std::mt19937 random(3);
     AccountingManager accounting;
     Model model;
@@ -127,7 +115,6 @@ TEST_F(Accounting, CountsAsAWalkOfTheHistogramWould) {
 TEST_F(Accounting, TheFirstLogOfAnIdleSpellClosesNothing) {
     AccountingManager accounting;
     accounting.LogInc("a");
-    EXPECT_EQ(accounting.CurrentEpsGet(), 1U);
     accounting.LogInc("a");  // the stamp is still 0, so this closes a sample of one log
     EXPECT_EQ(accounting.CurrentEpsGet(), 1U);
     at(1001);
@@ -138,7 +125,7 @@ TEST_F(Accounting, TheFirstLogOfAnIdleSpellClosesNothing) {
     accounting.LogInc("b");
     EXPECT_EQ(accounting.CurrentEpsGet(), 1U);
     EXPECT_EQ(accounting.AccoutingFlush2DB(), 0);
-    EXPECT_EQ(rows(), (Texts{"1000", "a", "1", "1001", "a", "1"}));
+    EXPECT_EQ(rows(), (Strings{"1000", "a", "1", "1001", "a", "1"}));
 }
 
 TEST_F(Accounting, AFlushIsDueMoreThanFiveSecondsAfterTheLastQuestion) {
@@ -155,7 +142,7 @@ TEST_F(Accounting, AFlushIsDueMoreThanFiveSecondsAfterTheLastQuestion) {
 }
 
 TEST_F(Accounting, ASampleAtTheThresholdIsNotifiedAndRecorded) {
-    writeFile(paths::kNotifyRules,
+    WriteFile(paths::kNotifyRules,
               "[rate]\nnotify_type=\"1\"\nnotify_pri=\"0\"\nnotify_eps=\"3\"\nnotify_pat=\"\"\nnotify_enable=\"1\"\n");
     AccountingManager accounting;
     sample(accounting, 1000, {"a"});
@@ -170,14 +157,7 @@ TEST_F(Accounting, ASampleAtTheThresholdIsNotifiedAndRecorded) {
     EXPECT_EQ(FakeNotices().sent[0].values["%EPS%"], "3");
     EXPECT_EQ(TakeSystemLogTexts().back(), "Fail to send syslog notification");
     EXPECT_EQ(SqliteFile(paths::kEventDb).query("SELECT event FROM log"),
-              (Texts{"Event detection: EPS is larger than [3].", "Event detection: EPS is larger than [4]."}));
-}
-
-TEST_F(Accounting, NothingIsWrittenWithoutAClosedSample) {
-    AccountingManager accounting;
-    accounting.LogInc("a");
-    EXPECT_EQ(accounting.AccoutingFlush2DB(), 0);
-    EXPECT_FALSE(std::filesystem::exists(kDb));
+              (Strings{"Event detection: EPS is larger than [3].", "Event detection: EPS is larger than [4]."}));
 }
 
 TEST_F(Accounting, DestructionWritesAndTheNextStartReadsBack) {
@@ -193,14 +173,12 @@ TEST_F(Accounting, DestructionWritesAndTheNextStartReadsBack) {
         sample(accounting, 1002, {"b"});
     }
     EXPECT_EQ(SqliteFile(kDb).query("SELECT device, count FROM histogram ORDER BY device"),
-              (Texts{"b", "2", "it's", "2"}));
-    EXPECT_EQ(rows(), (Texts{"1001", "it's", "1", "1002", "b", "1", "1002", "it's", "1", "1003", "b", "1"}));
+              (Strings{"b", "2", "it's", "2"}));
+    EXPECT_EQ(rows(), (Strings{"1001", "it's", "1", "1002", "b", "1", "1002", "it's", "1", "1003", "b", "1"}));
 }
 
 TEST_F(Accounting, AFailedSampleKeepsTheOnesBeforeIt) {
-    SqliteFile(kDb).run(quor::test::ReadFile(paths::kAccountingSchema));
-    SqliteFile(kDb).run(
-        "CREATE TRIGGER t BEFORE INSERT ON eps WHEN NEW.device = 'b' BEGIN SELECT RAISE(ABORT, 'no'); END");
+    create("CREATE TRIGGER t BEFORE INSERT ON eps WHEN NEW.device = 'b' BEGIN SELECT RAISE(ABORT, 'no'); END");
     AccountingManager accounting;
     sample(accounting, 1000, {"a"});
     sample(accounting, 1001, {"b"});
@@ -208,59 +186,60 @@ TEST_F(Accounting, AFailedSampleKeepsTheOnesBeforeIt) {
     EXPECT_EQ(accounting.AccoutingFlush2DB(), -1);
     EXPECT_EQ(TakeSystemLogTexts().back(),
               "Fail to execute SQL command: INSERT INTO eps VALUES(NULL, '1002', 'b', '1');");
-    EXPECT_EQ(rows(), (Texts{"1001", "a", "1"}));
-    EXPECT_EQ(SqliteFile(kDb).query("SELECT device FROM histogram"), Texts{});
+    EXPECT_EQ(rows(), (Strings{"1001", "a", "1"}));
+    EXPECT_EQ(SqliteFile(kDb).query("SELECT device FROM histogram"), Strings{});
     SqliteFile(kDb).run("DROP TRIGGER t");
     EXPECT_EQ(accounting.AccoutingFlush2DB(), 0);
-    EXPECT_EQ(rows(), (Texts{"1001", "a", "1", "1001", "a", "1", "1002", "b", "1"}));
+    EXPECT_EQ(rows(), (Strings{"1001", "a", "1", "1001", "a", "1", "1002", "b", "1"}));
 }
 
 TEST_F(Accounting, AFailedHistogramUndoesTheSamples) {
-    SqliteFile(kDb).run(quor::test::ReadFile(paths::kAccountingSchema));
-    SqliteFile(kDb).run("ALTER TABLE histogram RENAME TO aside");
+    create("ALTER TABLE histogram RENAME TO aside");
     AccountingManager accounting;
     sample(accounting, 1000, {"a"});
     TakeSystemLogTexts();
     EXPECT_EQ(accounting.AccoutingFlush2DB(), -1);
-    const Texts messages = TakeSystemLogTexts();
+    const Strings messages = TakeSystemLogTexts();
     ASSERT_GE(messages.size(), 2U);
-    EXPECT_EQ(Texts(messages.end() - 2, messages.end()),
-              (Texts{"Fail to execute SQL command: INSERT OR REPLACE INTO histogram VALUES(NULL, 'a', 1);",
-                     "Fail to check sanity (DBTranEnd)"}));
-    EXPECT_EQ(rows(), Texts{});
+    EXPECT_EQ(Strings(messages.end() - 2, messages.end()),
+              (Strings{"Fail to execute SQL command: INSERT OR REPLACE INTO histogram VALUES(NULL, 'a', 1);",
+                       "Fail to check sanity (DBTranEnd)"}));
+    EXPECT_EQ(rows(), Strings{});
     SqliteFile(kDb).run("ALTER TABLE aside RENAME TO histogram");
     EXPECT_EQ(accounting.AccoutingFlush2DB(), 0);
-    EXPECT_EQ(rows(), (Texts{"1001", "a", "1"}));
+    EXPECT_EQ(rows(), (Strings{"1001", "a", "1"}));
 }
 
 TEST_F(Accounting, OldSamplesGoOnceTheFileIsLarge) {
     SqliteFile db(kDb);
-    db.run("PRAGMA page_size=4096");
-    db.run(quor::test::ReadFile(paths::kAccountingSchema));
-    db.run("INSERT INTO eps VALUES (NULL, 1000, 'old', 1), (NULL, strftime('%s', 'now') - 3600, 'recent', 1);"
+    create("INSERT INTO eps VALUES (NULL, 1000, 'old', 1), (NULL, strftime('%s', 'now') - 3600, 'recent', 1);"
            "CREATE TABLE filler (data BLOB); INSERT INTO filler VALUES (zeroblob(5200000))");
-    std::filesystem::resize_file(kDb, kPurgeBytes);
+    std::filesystem::resize_file(kDb, 5242880);
     AccountingManager accounting;
     const auto devices = [&db] { return db.query("SELECT DISTINCT device FROM eps ORDER BY device"); };
     sample(accounting, 1000, {"new"});
     ASSERT_EQ(accounting.AccoutingFlush2DB(), 0);
-    EXPECT_EQ(devices(), (Texts{"new", "old", "recent"}));
-    std::filesystem::resize_file(kDb, kPurgeBytes + 1);
+    EXPECT_EQ(devices(), (Strings{"new", "old", "recent"}));
+    std::filesystem::resize_file(kDb, 5242881);
     sample(accounting, 1001, {"new"});
     ASSERT_EQ(accounting.AccoutingFlush2DB(), 0);
-    EXPECT_EQ(devices(), Texts{"recent"});  // the new samples carry stamps of the test's clock
+    EXPECT_EQ(devices(), Strings{"recent"});  // the new samples carry stamps of the test's clock
 }
 
 TEST_F(Accounting, FailsWhereTheDatabaseIsNoFile) {
-    std::filesystem::create_directories(kDb);
     AccountingManager accounting;
-    sample(accounting, 1000, {"a"});
+    accounting.LogInc("a");
+    EXPECT_EQ(accounting.AccoutingFlush2DB(), 0);
+    EXPECT_FALSE(std::filesystem::exists(kDb)) << "nothing to write";
+    std::filesystem::create_directories(kDb);
+    at(1001);
+    accounting.CurEpsUpdate();
     TakeSystemLogTexts();
     EXPECT_EQ(accounting.AccoutingFlush2DB(), -1);
     EXPECT_FALSE(TakeSystemLogTexts().empty());
     std::filesystem::remove(kDb);
     EXPECT_EQ(accounting.AccoutingFlush2DB(), 0);
-    EXPECT_EQ(rows(), (Texts{"1001", "a", "1"}));
+    EXPECT_EQ(rows(), (Strings{"1001", "a", "1"}));
 }
 
 TEST_F(Accounting, TrimForgetsTheOldestSamples) {
@@ -273,6 +252,6 @@ TEST_F(Accounting, TrimForgetsTheOldestSamples) {
     EXPECT_EQ(accounting.EpsListTrim(5), 0U);
     EXPECT_EQ(accounting.EpsListTrim(2), 2U);
     EXPECT_EQ(accounting.AccoutingFlush2DB(), 0);
-    EXPECT_EQ(rows(), (Texts{"1004", "c", "1"}));
-    EXPECT_EQ(SqliteFile(kDb).query("SELECT sum(count) FROM histogram"), Texts{"6"});
+    EXPECT_EQ(rows(), (Strings{"1004", "c", "1"}));
+    EXPECT_EQ(SqliteFile(kDb).query("SELECT sum(count) FROM histogram"), Strings{"6"});
 }

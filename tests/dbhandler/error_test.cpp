@@ -1,32 +1,23 @@
-#include <gtest/gtest.h>
-#include <sqlite3.h>
 #include <syslog.h>
 
 #include "dbhandler.h"
 #include "support/notices.h"
 #include "support/services.h"
-#include "support/sqlite_file.h"
-#include "support/system_log.h"
-#include "support/temp_folder.h"
+#include "support/testing.h"
+
+using namespace quor::test;
 
 namespace {
-
-using quor::test::FakeNotices;
-using quor::test::FakeServices;
-using quor::test::SqliteFile;
-using quor::test::TakeSystemLog;
-using Strings = std::vector<std::string>;
 
 class Failure : public testing::Test {
   protected:
     Failure() {
         FakeNotices() = {};
         FakeServices() = {};
-        TakeSystemLog();
     }
 
     // The lines that a statement leaves in the system log of a database that others may hold open.
-    std::vector<quor::test::SystemLogLine> linesOf(const std::string& sql) {
+    std::vector<SystemLogLine> linesOf(const std::string& sql) {
         DBHandler handle(path_, "");
         EXPECT_EQ(handle.DBCon(), 0);
         TakeSystemLog();
@@ -35,75 +26,51 @@ class Failure : public testing::Test {
         return TakeSystemLog();
     }
 
-    // Fills every page after the first with garbage.
-    void corrupt() const {
-        SqliteFile(path_).run("CREATE TABLE logs(msg); INSERT INTO logs VALUES(zeroblob(100000))");
-        std::fstream file(path_, std::ios::in | std::ios::out | std::ios::binary);
-        file.seekp(4096);
-        file << std::string(80000, '\x77');
+    // That line, with that priority and part of its text.
+    void expectLine(const std::string& sql, int priority, const char* text) {
+        const auto lines = linesOf(sql);
+        ASSERT_EQ(lines.size(), 1U);
+        EXPECT_EQ(lines[0].priority, priority) << lines[0].text;
+        EXPECT_NE(lines[0].text.find(text), std::string::npos) << lines[0].text;
     }
 
-    const quor::test::TempFolder folder_;
+    void overwrite(std::streamoff at, const std::string& bytes) const {
+        std::fstream file(path_, std::ios::in | std::ios::out | std::ios::binary);
+        file.seekp(at);
+        file << bytes;
+    }
+
+    const TempFolder folder_;
     const std::string path_ = folder_.path("log.db");
 };
 
-}  // namespace
-
-TEST_F(Failure, OfASyntaxErrorIsAnErrorOnlyWithoutTableLogs) {
+TEST_F(Failure, IsAnErrorOrInformation) {
     SqliteFile(path_).run("CREATE TABLE other(x)");
-    auto lines = linesOf("SELEC 1");
-    ASSERT_EQ(lines.size(), 1U);
-    EXPECT_EQ(lines[0].priority, LOG_ERR);
-    EXPECT_EQ(lines[0].text, "dbhandler:125 Fail to execute SQL command: SELEC 1, error code is : 1, error cause: near "
-                             "\"SELEC\": syntax error");
-
-    SqliteFile(path_).run("CREATE TABLE logs(x)");
-    lines = linesOf("SELECT 1; DROP TABLE logs");
-    ASSERT_EQ(lines.size(), 1U);
-    EXPECT_EQ(lines[0].priority, LOG_INFO);
-    EXPECT_NE(lines[0].text.find("error code is : 1, "), std::string::npos) << lines[0].text;
-}
-
-TEST_F(Failure, OfTheTableCheckItselfEnds) {
-    SqliteFile(path_).run("CREATE TABLE logs(x)");
-    std::fstream file(path_, std::ios::in | std::ios::out | std::ios::binary);
-    file.seekp(47);
-    file.put(9);  // a schema format of the future: every statement fails with code 1
-    file.close();
+    expectLine("SELEC 1", LOG_ERR,
+               "dbhandler:125 Fail to execute SQL command: SELEC 1, error code is : 1, error cause: near \"SELEC\": "
+               "syntax error");
+    SqliteFile(path_).run("CREATE TABLE logs(x UNIQUE); INSERT INTO logs VALUES(1)");
+    expectLine("SELECT 1; DROP TABLE logs", LOG_INFO, "error code is : 1, ");
+    expectLine("INSERT INTO logs VALUES(1)", LOG_ERR, "error code is : 19, ");
+    {
+        SqliteFile other(path_);
+        other.run("BEGIN EXCLUSIVE");
+        expectLine("INSERT INTO logs VALUES(2)", LOG_INFO, "error code is : 5, error cause: database is locked");
+    }
+    overwrite(47, "\x09");  // a schema format of the future: every statement fails with code 1, the table check too
     const auto lines = linesOf("SELECT 1 FROM logs");
     ASSERT_EQ(lines.size(), 3U);
     EXPECT_NE(lines[2].text.find("SELECT 1 FROM logs"), std::string::npos);
     EXPECT_EQ(lines[2].priority, LOG_ERR);
-}
-
-TEST_F(Failure, OfALockedDatabaseIsInformation) {
-    SqliteFile(path_).run("CREATE TABLE logs(x)");
-    SqliteFile other(path_);
-    other.run("BEGIN EXCLUSIVE");
-    const auto lines = linesOf("INSERT INTO logs VALUES(1)");
-    ASSERT_EQ(lines.size(), 1U);
-    EXPECT_EQ(lines[0].priority, LOG_INFO);
-    EXPECT_NE(lines[0].text.find("error code is : 5, error cause: database is locked"), std::string::npos);
-}
-
-TEST_F(Failure, OfAFileThatIsNoDatabaseIsInformation) {
     folder_.write("log.db", std::string(8192, 'x'));
-    const auto lines = linesOf("SELECT 1 FROM logs");
-    ASSERT_EQ(lines.size(), 1U);
-    EXPECT_EQ(lines[0].priority, LOG_INFO);
+    expectLine("SELECT 1 FROM logs", LOG_INFO, "error code is : 26, ");
     EXPECT_TRUE(FakeNotices().sent.empty());
     EXPECT_TRUE(std::filesystem::exists(path_));
 }
 
-TEST_F(Failure, OfAConstraintIsAnError) {
-    SqliteFile(path_).run("CREATE TABLE logs(x UNIQUE); INSERT INTO logs VALUES(1)");
-    const auto lines = linesOf("INSERT INTO logs VALUES(1)");
-    ASSERT_EQ(lines.size(), 1U);
-    EXPECT_EQ(lines[0].priority, LOG_ERR);
-}
-
 TEST_F(Failure, OfACorruptDatabaseMovesItAsideAfterTheNotice) {
-    corrupt();
+    SqliteFile(path_).run("CREATE TABLE logs(msg); INSERT INTO logs VALUES(zeroblob(100000))");
+    overwrite(4096, std::string(80000, '\x77'));  // every page after the first
     folder_.write("log.db.corrupt", "older");
     bool stillThere = false;
     FakeNotices().onSend = [&] { stillThere = std::filesystem::exists(path_) && FakeServices().reloaded.empty(); };
@@ -121,16 +88,15 @@ TEST_F(Failure, OfACorruptDatabaseMovesItAsideAfterTheNotice) {
     EXPECT_NE(lines.back().text.find("error code is : 11, "), std::string::npos) << lines.back().text;
 }
 
-TEST_F(Failure, ToMoveTheFileStillSendsTheNotice) {
+TEST_F(Failure, OfOneStepOfTheRecoveryLeavesTheOthers) {
     EXPECT_EQ(DBErrorHandle_SQLITE_CORRUPT(nullptr, folder_.path("none.db")), -1);
     EXPECT_EQ(FakeNotices().sent.size(), 1U);
     EXPECT_TRUE(FakeServices().reloaded.empty());
-}
-
-TEST_F(Failure, ToReloadIsReported) {
     FakeServices().fail = true;
     FakeNotices().fail = true;
     EXPECT_EQ(DBErrorHandle_SQLITE_CORRUPT(nullptr, folder_.write("log.db", "x")), -1);
     EXPECT_TRUE(std::filesystem::exists(path_ + ".corrupt"));
     EXPECT_EQ(TakeSystemLog().back().text, "dbhandler:88 Fail to send HUP signal to syslog-ng");
 }
+
+}  // namespace

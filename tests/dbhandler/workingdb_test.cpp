@@ -1,47 +1,35 @@
-#include <gtest/gtest.h>
-
-#include "common/paths.h"
 #include "dbhandler.h"
 #include "support/services.h"
-#include "support/sqlite_file.h"
-#include "support/system_log.h"
-#include "support/temp_folder.h"
+#include "support/testing.h"
+
+using namespace quor::test;
+namespace fs = std::filesystem;
 
 namespace {
-
-using quor::test::FakeServices;
-using quor::test::TakeSystemLogTexts;
-using Strings = std::vector<std::string>;
-namespace fs = std::filesystem;
 
 class WorkingDb : public testing::Test {
   protected:
     WorkingDb() {
-        fs::create_directories(fs::path(marker_).parent_path());
-        fs::remove(marker_);
+        WriteFile(marker_, "");
         FakeServices() = {};
         TakeSystemLogTexts();
     }
     ~WorkingDb() override { fs::remove(marker_); }
 
-    void enablePackage() const { std::ofstream(marker_).put('\n'); }
-
     const std::string marker_ = quor::paths::kPackageEnabled;
-    const quor::test::TempFolder folder_;
+    const TempFolder folder_;
 };
 
-}  // namespace
-
 TEST_F(WorkingDb, HangsUpTheSyslogNgThatIsInCharge) {
-    EXPECT_EQ(SyslogngHupSignalSend(), 0);
-    enablePackage();
     EXPECT_EQ(SyslogngHupSignalSend(), 0);
     FakeServices().fail = true;
     EXPECT_EQ(SyslogngHupSignalSend(), -1);
     fs::remove(marker_);
     EXPECT_EQ(SyslogngHupSignalSend(), -1);
+    FakeServices().fail = false;
+    EXPECT_EQ(SyslogngHupSignalSend(), 0);
     EXPECT_EQ(FakeServices().reloaded,
-              Strings({"service syslog-ng", "job pkg-Orvane-syslog", "job pkg-Orvane-syslog", "service syslog-ng"}));
+              Strings({"job pkg-Orvane-syslog", "job pkg-Orvane-syslog", "service syslog-ng", "service syslog-ng"}));
     EXPECT_EQ(TakeSystemLogTexts(),
               Strings({"Fail to send HUP signal to pkg-Orvane-syslog", "Fail to send HUP signal to syslog-ng"}));
 }
@@ -75,9 +63,11 @@ TEST_F(WorkingDb, MustBeARegularFile) {
 
 TEST_F(WorkingDb, IsSwitchedToWriteAheadJournaling) {
     const std::string path = folder_.path("log.db");
-    quor::test::SqliteFile(path).run("CREATE TABLE logs(x)");
+    SqliteFile(path).run("CREATE TABLE logs(x)");
     EXPECT_EQ(SyslogngWorkingDbSetJouWal(path), 0);
-    EXPECT_EQ(quor::test::SqliteFile(path).query("PRAGMA journal_mode"), Strings({"wal"}));
+    EXPECT_EQ(SqliteFile(path).query("PRAGMA journal_mode"), Strings({"wal"}));
     EXPECT_EQ(SyslogngWorkingDbSetJouWal(folder_.path("a b")), 0) << "the shell ran";
     EXPECT_EQ(TakeSystemLogTexts(), Strings());
 }
+
+}  // namespace

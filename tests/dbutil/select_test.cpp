@@ -1,16 +1,10 @@
-#include <gtest/gtest.h>
-#include <syslog.h>
-
 #include "dbutil.h"
 #include "support/db_spy.h"
-#include "support/sqlite_file.h"
-#include "support/system_log.h"
-#include "support/temp_folder.h"
+#include "support/testing.h"
+
+using namespace quor::test;
 
 namespace {
-
-using quor::test::SpyOnDb;
-using Strings = std::vector<std::string>;
 
 // Counts down from `context` rows and then stops the walk; collects ids.
 struct Walk {
@@ -28,27 +22,25 @@ struct Walk {
 class Select : public testing::Test {
   protected:
     Select() {
-        quor::test::SqliteFile(path_).run(
+        SqliteFile(path_).run(
             "CREATE TABLE logs(id INTEGER PRIMARY KEY, host, msg);"
             "WITH RECURSIVE n(i) AS (SELECT 1 UNION ALL SELECT i+1 FROM n WHERE i < 10)"
             "INSERT INTO logs SELECT i, iif(i % 2, 'odd', 'even'), 'm' || i FROM n;"
             "CREATE TABLE general_log(id INTEGER PRIMARY KEY, host); INSERT INTO general_log VALUES(5, 'g');"
             "CREATE TABLE other(id INTEGER PRIMARY KEY); INSERT INTO other VALUES(1)");
         SpyOnDb() = {};
-        quor::test::TakeSystemLog();
+        TakeSystemLog();
     }
 
     static std::list<_SYSLOG_SQL_COND_tag> host(const char* name) { return {{SYSLOG_ATTRI_HOST, 0, name, {}}}; }
 
-    const quor::test::TempFolder folder_;
+    const TempFolder folder_;
     std::string path_ = folder_.path("log.db");
     std::list<_SYSLOG_SQL_COND_tag> none_;
     std::list<_SYSLOG_SQL_COND_tag> all_{{SYSLOG_ATTRI_MSG, 8, "**", {}}};
     _SYSLOG_SQL_ORDER_tag newest_{0, SYSLOG_ATTRI_ID};
     Walk walk_;
 };
-
-}  // namespace
 
 TEST_F(Select, PagesUnfilteredTablesByIdWindow) {
     _SYSLOG_SQL_LIMIT_tag page{3, 2};
@@ -71,24 +63,20 @@ TEST_F(Select, PagesFilteredTablesThroughTheLimitedSelect) {
     EXPECT_EQ(SpyOnDb().statements, Strings({"SELECT * FROM logs WHERE (host = 'odd') ORDER BY id desc [2,1]"}));
 }
 
-TEST_F(Select, WithoutAWindowGivesEveryRow) {
+TEST_F(Select, WithoutAWindowGivesEveryRowThatIsTaken) {
     _SYSLOG_SQL_LIMIT_tag everything{0, 4};
     _SYSLOG_SQL_ORDER_tag oldest{7, SYSLOG_ATTRI_HOST};
     ASSERT_EQ(SyslogDBSelect(path_, none_, &everything, &oldest, Walk::take, &walk_, false), 0);
     ASSERT_EQ(SyslogDBSelect(path_, none_, nullptr, nullptr, Walk::take, &walk_, false), 0);
     EXPECT_EQ(walk_.ids.size(), 20U);
     EXPECT_EQ(SpyOnDb().statements, Strings({"SELECT * FROM logs ORDER BY host asc", "SELECT * FROM logs"}));
-}
-
-TEST_F(Select, EndsTheWalkWhenAsked) {
-    walk_.most = 1;
-    EXPECT_EQ(SyslogDBSelect(path_, none_, nullptr, &newest_, Walk::take, &walk_, false), 0);
-    EXPECT_EQ(walk_.ids, Strings({"10"}));
     EXPECT_EQ(SyslogDBSelect(path_, none_, nullptr, nullptr, nullptr, nullptr, false), 0);
-
     std::string other = "other";
     EXPECT_EQ(SyslogDBSelectByTable(path_, other, none_, nullptr, nullptr, Walk::take, &walk_, false), 0);
-    EXPECT_EQ(walk_.ids.size(), 1U) << "a row of an unknown table was handed over";
+    EXPECT_EQ(walk_.ids.size(), 20U) << "a row of an unknown table was handed over";
+    walk_.most = 21;
+    EXPECT_EQ(SyslogDBSelect(path_, none_, nullptr, &newest_, Walk::take, &walk_, false), 0);
+    EXPECT_EQ(walk_.ids.back(), "10") << "the walk ends when it is asked to";
 }
 
 TEST_F(Select, ReportsWhatFailed) {
@@ -103,7 +91,7 @@ TEST_F(Select, ReportsWhatFailed) {
     EXPECT_EQ(SyslogDBSelectByTable(path_, table, none_, nullptr, nullptr, nullptr, nullptr, false), -1);
     EXPECT_EQ(SyslogDBSelectCount(missing, none_, nullptr, nullptr), -1);
     EXPECT_EQ(SyslogDBDelete(missing, none_), -1);
-    EXPECT_EQ(quor::test::TakeSystemLogTexts(),
+    EXPECT_EQ(TakeSystemLogTexts(),
               Strings({"dbutil:464 Invalid syslog db path!", "dbutil:573 Invalid syslog db path!",
                        "dbutil:653 Invalid syslog db path!", "fail to connect database (" + missing + ")",
                        "fail to execute database command (SELECT * FROM nowhere)"}));
@@ -111,7 +99,7 @@ TEST_F(Select, ReportsWhatFailed) {
 }
 
 TEST_F(Select, CountsByLargestIdUnlessFiltered) {
-    quor::test::SqliteFile(path_).run("DELETE FROM logs WHERE id IN (3, 4, 5)");
+    SqliteFile(path_).run("DELETE FROM logs WHERE id IN (3, 4, 5)");
     auto odd = host("odd");
     EXPECT_EQ(SyslogDBSelectCount(path_, none_, nullptr, nullptr), 10);
     EXPECT_EQ(SyslogDBSelectCount(path_, all_, nullptr, nullptr), 10);
@@ -122,7 +110,7 @@ TEST_F(Select, CountsByLargestIdUnlessFiltered) {
 
     _SYSLOG_SQL_LIMIT_tag beyond{1, 1};
     EXPECT_EQ(SyslogDBSelectCount(path_, none_, &beyond, nullptr), -1) << "the only row was skipped";
-    quor::test::SqliteFile(path_).run("UPDATE logs SET id = 5000000000 WHERE id = 10");
+    SqliteFile(path_).run("UPDATE logs SET id = 5000000000 WHERE id = 10");
     EXPECT_EQ(SyslogDBSelectCount(path_, none_, nullptr, nullptr), 705032704) << "not the low 32 bits";
 
     std::string twoRows = "logs GROUP BY host";
@@ -132,17 +120,15 @@ TEST_F(Select, CountsByLargestIdUnlessFiltered) {
 TEST_F(Select, DeletesOnlyWhatMatches) {
     auto hostile = host("odd' OR '1'='1");
     auto odd = host("odd");
+    std::string table = "logs; DELETE FROM logs; --";
     EXPECT_EQ(SyslogDBDelete(path_, hostile), 0);
-    EXPECT_EQ(quor::test::SqliteFile(path_).query("SELECT count(*) FROM logs"), Strings({"10"}));
+    EXPECT_EQ(SyslogDBSelectByTable(path_, table, none_, nullptr, nullptr, Walk::take, &walk_, false), -1);
+    EXPECT_EQ(SyslogDBSelectCountByTable(path_, table, none_, nullptr, nullptr), -1);
+    EXPECT_EQ(SqliteFile(path_).query("SELECT count(*) FROM logs"), Strings({"10"}));
     EXPECT_EQ(SyslogDBDelete(path_, odd), 0);
-    EXPECT_EQ(quor::test::SqliteFile(path_).query("SELECT DISTINCT host FROM logs"), Strings({"even"}));
+    EXPECT_EQ(SqliteFile(path_).query("SELECT DISTINCT host FROM logs"), Strings({"even"}));
     EXPECT_EQ(SyslogDBDelete(path_, none_), 0);
-    EXPECT_EQ(quor::test::SqliteFile(path_).query("SELECT count(*) FROM logs"), Strings({"0"}));
+    EXPECT_EQ(SqliteFile(path_).query("SELECT count(*) FROM logs"), Strings({"0"}));
 }
 
-TEST_F(Select, RunsNoSecondStatementFromTheTableName) {
-    std::string hostile = "logs; DELETE FROM logs; --";
-    EXPECT_EQ(SyslogDBSelectByTable(path_, hostile, none_, nullptr, nullptr, Walk::take, &walk_, false), -1);
-    EXPECT_EQ(SyslogDBSelectCountByTable(path_, hostile, none_, nullptr, nullptr), -1);
-    EXPECT_EQ(quor::test::SqliteFile(path_).query("SELECT count(*) FROM logs"), Strings({"10"}));
-}
+}  // namespace

@@ -1,18 +1,12 @@
-#include <gtest/gtest.h>
-
 #include <limits>
 
 #include "dbutil.h"
-#include "support/sqlite_file.h"
-#include "support/system_log.h"
-#include "support/temp_folder.h"
+#include "support/testing.h"
+
+using namespace quor::test;
+using Counts = std::map<std::string, unsigned long long>;
 
 namespace {
-
-using quor::test::SqliteFile;
-using quor::test::TakeSystemLogTexts;
-using Counts = std::map<std::string, unsigned long long>;
-using Texts = std::vector<std::string>;
 
 class Statistics : public testing::Test {
   protected:
@@ -22,13 +16,11 @@ class Statistics : public testing::Test {
         TakeSystemLogTexts();
     }
 
-    quor::test::TempFolder folder;
+    TempFolder folder;
     std::string path = folder.path("accounting.db");
     std::string missing = folder.path("missing.db");
     std::string relative = "accounting.db";
 };
-
-}  // namespace
 
 TEST_F(Statistics, AnswerNothingWithoutAReadableDatabase) {
     std::string damaged = folder.write("damaged.db", std::string(4096, 'x'));
@@ -39,18 +31,15 @@ TEST_F(Statistics, AnswerNothingWithoutAReadableDatabase) {
         EXPECT_TRUE(SyslogDBEpsGet(*bad, 0, 9).empty());
     }
     EXPECT_EQ(TakeSystemLogTexts(),
-              (Texts{"dbutil:1051 Invalid syslog db path!", "dbutil:1092 Invalid syslog db path!",
-                     "dbutil:1134 Invalid syslog db path!", "dbutil:982 Invalid syslog db path!"}));
-}
-
-TEST_F(Statistics, VersionDependsOnTheMetadataAlone) {
+              (Strings{"dbutil:1051 Invalid syslog db path!", "dbutil:1092 Invalid syslog db path!",
+                       "dbutil:1134 Invalid syslog db path!", "dbutil:982 Invalid syslog db path!"}));
+    EXPECT_EQ(SyslogDBVersionGet(relative), 1U);
+    EXPECT_EQ(TakeSystemLogTexts(), Strings{"dbutil:853 Invalid syslog db path! [accounting.db]"});
+    EXPECT_EQ(SyslogDBVersionGet(missing), 1U);
     EXPECT_EQ(SyslogDBVersionGet(path), 2U);
     SqliteFile(path).run("CREATE TABLE db_info (device TEXT)");
     EXPECT_EQ(SyslogDBVersionGet(path), 1U);
-    EXPECT_EQ(SyslogDBVersionGet(missing), 1U);
-    EXPECT_EQ(TakeSystemLogTexts(), Texts{});
-    EXPECT_EQ(SyslogDBVersionGet(relative), 1U);
-    EXPECT_EQ(TakeSystemLogTexts(), Texts{"dbutil:853 Invalid syslog db path! [accounting.db]"});
+    EXPECT_EQ(TakeSystemLogTexts(), Strings{});
 }
 
 TEST_F(Statistics, HistogramTotalSingleAndTop) {
@@ -109,7 +98,7 @@ TEST_F(Statistics, NamesOfBothLayouts) {
     EXPECT_EQ(SyslogDBExtkeyLookupByName(path, SYSLOG_EXTKEY_FAC, "Mail"), 0U);
     TakeSystemLogTexts();
     EXPECT_EQ(SyslogDBExtkeyLookupByName(path, SYSLOG_EXTKEY_HOST, "b"), 0U);  // there is no table hosts
-    EXPECT_EQ(TakeSystemLogTexts(), Texts{"dbutil:956 Fail to get foreign key map"});
+    EXPECT_EQ(TakeSystemLogTexts(), Strings{"dbutil:956 Fail to get foreign key map"});
 }
 
 TEST_F(Statistics, ValuesOfOneAttribute) {
@@ -127,5 +116,7 @@ TEST_F(Statistics, ValuesOfOneAttribute) {
     EXPECT_EQ(SyslogDBAttriValueGet(relative, ip, nullptr, values), -1);
     EXPECT_EQ(SyslogDBAttriValueGet(missing, ip, nullptr, values), -1);
     EXPECT_EQ(TakeSystemLogTexts(),
-              (Texts{"dbutil:702 Log attribute type is incorrect!", "dbutil:697 Invalid syslog db path!"}));
+              (Strings{"dbutil:702 Log attribute type is incorrect!", "dbutil:697 Invalid syslog db path!"}));
 }
+
+}  // namespace

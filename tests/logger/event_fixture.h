@@ -2,27 +2,17 @@
 #ifndef TESTS_LOGGER_EVENT_FIXTURE_H
 #define TESTS_LOGGER_EVENT_FIXTURE_H
 
-#include <gtest/gtest.h>
-
-#include "common/paths.h"
 #include "logger.h"
 #include "support/clock.h"
-#include "support/sqlite_file.h"
-#include "support/system_log.h"
-#include "support/temp_folder.h"
+#include "support/testing.h"
 
 namespace quor::test {
-
-using Strings = std::vector<std::string>;
 
 class EventLog : public testing::Test {
   protected:
     EventLog() {
-        namespace fs = std::filesystem;
-        const fs::path schema = paths::kEventSchema;
-        fs::create_directories(schema.parent_path());
-        fs::copy_file(SCHEMA_FOLDER "/quorsyslog.sql", schema, fs::copy_options::overwrite_existing);
-        fs::remove_all(own_.substr(0, own_.rfind('/')));
+        WriteFile(paths::kEventSchema, ReadFile(SCHEMA_FOLDER "/quorsyslog.sql"));
+        std::filesystem::remove_all(own_.substr(0, own_.rfind('/')));
         TakeSystemLog();
     }
     ~EventLog() override { ResetClock(); }

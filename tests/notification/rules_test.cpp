@@ -1,19 +1,13 @@
-#include <gtest/gtest.h>
-
-#include <filesystem>
 #include <tuple>
 
 #include "common/numbers.h"
-#include "common/paths.h"
 #include "notification.h"
 #include "support/notices.h"
-#include "support/system_log.h"
-#include "support/temp_folder.h"
+#include "support/testing.h"
+
+using namespace quor::test;
 
 namespace {
-
-using quor::test::TakeSystemLogTexts;
-using Lines = std::vector<std::string>;
 
 _SYSLOG_NOTIFY_RULES_tag rule(const std::string& name, int type, int pri, int64_t eps, const std::string& pattern,
                               bool enable = true) {
@@ -37,7 +31,7 @@ class Rules : public testing::Test {
         ASSERT_EQ(manager_.ConfigLoad(file_), 0);
     }
 
-    const quor::test::TempFolder folder_;
+    const TempFolder folder_;
     const std::string file_ = folder_.path("notify.conf");
     NotificationManager manager_ = withoutRules();
 };
@@ -53,12 +47,10 @@ TEST_F(Rules, ReadBackAsTheyWereWritten) {
         };
         EXPECT_EQ(fields(found), fields(wanted));
     }
-}
-
-TEST_F(Rules, NegativeNumbersAreWrittenUnsigned) {
+    folder_.write("notify.conf", "");
     _SYSLOG_NOTIFY_RULES_tag negative = rule("r", -2, 4, -1, "p");
     ASSERT_EQ(SyslogNotifyConfSet(file_, "r", negative), 0);
-    EXPECT_EQ(quor::test::ReadFile(file_),
+    EXPECT_EQ(ReadFile(file_),
               "[r]\nnotify_type=\"18446744073709551614\"\nnotify_eps=\"18446744073709551615\"\nnotify_pri=\"4\"\n"
               "notify_pat=\"p\"\nnotify_enable=\"1\"\n");
 }
@@ -69,14 +61,14 @@ TEST_F(Rules, WhatCannotBeWrittenIsReported) {
                                          rule("", 0, 0, 0, "a"), rule(std::string("r\0s", 3), 0, 0, 0, "a")}) {
         TakeSystemLogTexts();
         EXPECT_EQ(SyslogNotifyConfSet(file_, "r", bad), -1);
-        EXPECT_EQ(TakeSystemLogTexts(), Lines{"utils:139 Fail set section to file"});
+        EXPECT_EQ(TakeSystemLogTexts(), Strings{"utils:139 Fail set section to file"});
     }
-    EXPECT_EQ(quor::test::ReadFile(file_), "[r]\n");
+    EXPECT_EQ(ReadFile(file_), "[r]\n");
 }
 
 TEST_F(Rules, OddValuesReadButAMissingKeyFails) {
-    const Lines keys = {"notify_type=x\n", "notify_eps=-5\n", "notify_pri=99999999999\n", "notify_pat=\n",
-                        "notify_enable=\" 1\"\n"};
+    const Strings keys = {"notify_type=x\n", "notify_eps=-5\n", "notify_pri=99999999999\n", "notify_pat=\n",
+                          "notify_enable=\" 1\"\n"};
     TakeSystemLogTexts();
     for (size_t missing = 0; missing <= keys.size(); ++missing) {
         std::string text = "[r]\n";
@@ -91,35 +83,30 @@ TEST_F(Rules, OddValuesReadButAMissingKeyFails) {
         EXPECT_EQ(static_cast<int32_t>(found.notify_pri), complete ? INT32_MAX : 4);
         EXPECT_EQ(found.notify_eps, complete ? -5 : 9);
         EXPECT_EQ(found.notify_enable, !complete);
-        EXPECT_EQ(TakeSystemLogTexts(), complete ? Lines{} : Lines{"utils:85 Fail to do QLIBCFileGetSection"});
+        EXPECT_EQ(TakeSystemLogTexts(), complete ? Strings{} : Strings{"utils:85 Fail to do QLIBCFileGetSection"});
     }
 }
 
 TEST_F(Rules, LoadingStopsAtABadSection) {
-    EXPECT_EQ(TakeSystemLogTexts(), (Lines{"Fail to do QLIBCFileEnumSection", "Fail to load configuration"}));
+    EXPECT_EQ(TakeSystemLogTexts(), (Strings{"Fail to do QLIBCFileEnumSection", "Fail to load configuration"}));
     const std::string good = "notify_type=1\nnotify_pri=0\nnotify_pat=\nnotify_enable=1\nnotify_eps=";
     folder_.write("notify.conf", "[a]\n" + good + "100\n[bad]\nnotify_type=1\n[b]\n" + good + "10\n");
     EXPECT_EQ(manager_.ConfigLoad(file_), 0);
     EXPECT_EQ(TakeSystemLogTexts(),
-              (Lines{"utils:85 Fail to do QLIBCFileGetSection", "Fail to get notification setting bad"}));
+              (Strings{"utils:85 Fail to do QLIBCFileGetSection", "Fail to get notification setting bad"}));
     EXPECT_TRUE(manager_.CheckEps(100));
     EXPECT_FALSE(manager_.CheckEps(99));
 }
 
-TEST_F(Rules, OnlyEnabledOnesOfTheKindCount) {
+TEST_F(Rules, OnlyEnabledOnesOfTheKindCountInFileOrder) {
     load({rule("off", 1, 7, 0, "x", false), rule("other", 3, 7, 0, "x"), rule("e", 1, 7, INT64_MAX, "x"),
-          rule("s", 0, 3, 0, "x")});
+          rule("s", 0, 3, 0, "x"), rule("empty", 2, 0, 0, ""), rule("no", 2, 0, 0, "volume", false),
+          rule("long", 2, 0, 0, "disk full"), rule("short", 2, 0, 0, "disk")});
     EXPECT_FALSE(manager_.CheckEps(INT64_MAX - 1));
     EXPECT_TRUE(manager_.CheckEps(1ULL << 63U)) << "compared unsigned";
-    EXPECT_TRUE(manager_.CheckSev(SYSLOG_PRIORITY_EMERG));
     EXPECT_TRUE(manager_.CheckSev(SYSLOG_PRIORITY_ERR));
     EXPECT_FALSE(manager_.CheckSev(SYSLOG_PRIORITY_WARNING));
     EXPECT_EQ(manager_.CheckKeyword("x"), "");
-}
-
-TEST_F(Rules, TheFirstKeywordInFileOrderIsGiven) {
-    load({rule("empty", 2, 0, 0, ""), rule("off", 2, 0, 0, "volume", false), rule("long", 2, 0, 0, "disk full"),
-          rule("short", 2, 0, 0, "disk")});
     EXPECT_EQ(manager_.CheckKeyword("disk full on volume"), "disk full");
     EXPECT_EQ(manager_.CheckKeyword(std::string("\0a disk", 7)), "disk");
     EXPECT_EQ(manager_.CheckKeyword("a Disk"), "");
@@ -133,7 +120,7 @@ TEST(IsNotificationSet, AsksEveryChannelUntilOneCannotBeRead) {
         const char* recipient;  // null: the mail settings cannot be read
         int sms;                // negative: the SMS settings cannot be read
         bool set;
-        Lines log;
+        Strings log;
     } cases[] = {
         {all + "no", "", 0, false, {}},
         {all + "no", "a@b", 0, true, {}},
@@ -146,11 +133,9 @@ TEST(IsNotificationSet, AsksEveryChannelUntilOneCannotBeRead) {
         {all + "yes", nullptr, 1, false, {"utils:161 Fail to get mail setting"}},
         {all + "yes", "", -1, false, {"utils:178 Fail to get sms setting"}},
     };
-    const std::filesystem::path file = quor::paths::kSystemSettings;
-    std::filesystem::create_directories(file.parent_path());
-    quor::test::Notices& service = quor::test::FakeNotices();
+    Notices& service = FakeNotices();
     for (const auto& row : cases) {
-        std::ofstream(file) << row.settings << "\n";
+        WriteFile(quor::paths::kSystemSettings, row.settings + "\n");
         service = {};
         std::string("mail").copy(service.mail.server, sizeof service.mail.server - 1);
         std::string(quor::OrEmpty(row.recipient)).copy(service.mail.recipient, sizeof service.mail.recipient - 1);
@@ -162,7 +147,7 @@ TEST(IsNotificationSet, AsksEveryChannelUntilOneCannotBeRead) {
         EXPECT_EQ(TakeSystemLogTexts(), row.log) << row.settings;
         EXPECT_EQ(service.smsLent, 0) << row.settings;
     }
-    std::filesystem::remove(file);
+    std::filesystem::remove(quor::paths::kSystemSettings);
 }
 
 }  // namespace

@@ -13,7 +13,7 @@ class Delivery : public Notify {
   protected:
     // What servers.py keeps of a mail: sessions, sender, recipients, login, header names, defects, subject; the body.
     struct Mail {
-        std::vector<std::string> lines;
+        Strings lines;
         std::string body;
     };
     static Mail mailOf(std::string record) {
@@ -172,13 +172,13 @@ TEST_F(Delivery, TheTestNoticeTellsTheOutcomeOfEachChannel) {
     const Server server("http good");
     settings(mailTo(kAbsentPort,
                     "desktop_notify_enabled=\"yes\"\nwebhook_url=\"http://127.0.0.1:" + server.port() + "\"\n"));
-    std::vector<std::string> heard;
+    Strings heard;
     const auto report = [](const char* channel, int ok, const char* detail, void* context) {
-        static_cast<std::vector<std::string>*>(context)->push_back(
-            std::string(channel) + (ok != 0 ? " ok" : " failed") + (*detail != '\0' ? ", cause" : ""));
+        static_cast<Strings*>(context)->push_back(std::string(channel) + (ok != 0 ? " ok" : " failed") +
+                                                  (*detail != '\0' ? ", cause" : ""));
     };
     EXPECT_EQ(QUORNotifyTest(report, &heard), 3);
-    EXPECT_EQ(heard, (std::vector<std::string>{"desktop ok", "webhook ok", "mail failed, cause"}));
+    EXPECT_EQ(heard, (Strings{"desktop ok", "webhook ok", "mail failed, cause"}));
     settings("");
     EXPECT_EQ(QUORNotifyTest(report, &heard), 0);
 }

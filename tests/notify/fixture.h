@@ -3,35 +3,17 @@
 #define TESTS_NOTIFY_FIXTURE_H
 
 #include <fcntl.h>
-#include <gtest/gtest.h>
 #include <sys/file.h>
-#include <unistd.h>
 
-#include <functional>
 #include <map>
 #include <sstream>
-#include <string>
-#include <vector>
 
 #include "common/guards.h"
-#include "common/paths.h"
 #include "quor/quornotify.h"
 #include "support/clock.h"
-#include "support/system_log.h"
-#include "support/temp_folder.h"
+#include "support/testing.h"
 
 namespace quor::test {
-
-// Polls for at most ten seconds.
-inline bool Eventually(const std::function<bool()>& holds) {
-    for (int i = 0; i < 1000; ++i) {
-        if (holds()) {
-            return true;
-        }
-        usleep(10000);
-    }
-    return holds();
-}
 
 // A server of servers.py, with its own folder for what it received.
 class Server {
@@ -65,8 +47,7 @@ class Notify : public ::testing::Test {
   protected:
     Notify() {
         std::filesystem::remove_all(paths::kNotifySpool);
-        std::filesystem::create_directories(std::filesystem::path(paths::kSystemSettings).parent_path());
-        std::filesystem::remove(paths::kSystemSettings);
+        settings("");
         CopySystemLogTo(folder_.path("syslog"));
         folder_.write("T.txt", "Subject\n\nHost %HOST%\n%SYSLOG_CONTENT%\n");
     }
@@ -77,7 +58,7 @@ class Notify : public ::testing::Test {
         ResetClock();
     }
 
-    void settings(const std::string& text) { std::ofstream(paths::kSystemSettings) << text; }
+    static void settings(const std::string& text) { WriteFile(paths::kSystemSettings, text); }
     std::string mailTo(const std::string& port, const std::string& more = "") {
         return "smtp_mail_enabled=\"yes\"\nsmtp_server=\"127.0.0.1\"\nsmtp_port=\"" + port +
                "\"\nsmtp_recipient=\"one@example.com, two@example.com\"\nsmtp_security=\"none\"\n" + more;
@@ -107,8 +88,8 @@ class Notify : public ::testing::Test {
         return taken;
     }
 
-    static std::vector<std::string> linesOf(const std::string& text) {
-        std::vector<std::string> lines;
+    static Strings linesOf(const std::string& text) {
+        Strings lines;
         std::istringstream stream(text);
         for (std::string line; std::getline(stream, line);) {
             lines.push_back(line);
@@ -116,13 +97,13 @@ class Notify : public ::testing::Test {
         return lines;
     }
     // The lines of a file that workers append to, once there are that many.
-    static std::vector<std::string> awaitLines(const std::string& path, size_t count) {
+    static Strings awaitLines(const std::string& path, size_t count) {
         Eventually([&] { return linesOf(ReadFile(path)).size() >= count; });
         return linesOf(ReadFile(path));
     }
     // At least `count` lines, the missing ones empty.
-    std::vector<std::string> systemLog(size_t count) {
-        std::vector<std::string> lines = awaitLines(folder_.path("syslog"), count);
+    Strings systemLog(size_t count) {
+        Strings lines = awaitLines(folder_.path("syslog"), count);
         lines.resize(std::max(lines.size(), count));
         return lines;
     }

@@ -1,25 +1,22 @@
 // The log schema against SQLite's planner: a search that stops using an index takes a hundred times longer.
-#include <gtest/gtest.h>
-
 #include <algorithm>
-#include <string>
-#include <vector>
 
-#include "support/sqlite_file.h"
-#include "support/temp_folder.h"
+#include "support/testing.h"
+
+using namespace quor::test;
 
 namespace {
 
 class LogSchema : public ::testing::Test {
   protected:
-    LogSchema() { db_.run(quor::test::ReadFile(QUOR_SOURCE "/schema/syslog.sql")); }
+    LogSchema() { db_.run(ReadFile(QUOR_SOURCE "/schema/syslog.sql")); }
 
-    quor::test::TempFolder folder_;
-    quor::test::SqliteFile db_{folder_.path("logs.db")};
+    TempFolder folder_;
+    SqliteFile db_{folder_.path("logs.db")};
 };
 
 TEST_F(LogSchema, SearchesGoTheWayThatWasMeasured) {
-    quor::test::SqliteFile reader(folder_.path("logs.db"));
+    SqliteFile reader(folder_.path("logs.db"));  // reads the statistics that the schema left
     const struct {
         const char* sql;
         const char* plan;
@@ -42,10 +39,10 @@ TEST_F(LogSchema, SearchesGoTheWayThatWasMeasured) {
 
 TEST_F(LogSchema, LevelsAndNamesAreFound) {
     db_.run("INSERT INTO logs (host, prio, prog) VALUES ('b', 'err', 'su'), ('a', 'info', 'su'), ('b', 'err', NULL)");
-    EXPECT_EQ(db_.query("SELECT id FROM logs WHERE llevel = 'err'"), (std::vector<std::string>{"1", "3"}));
-    EXPECT_EQ(db_.query("SELECT host_name FROM hosts ORDER BY 1"), (std::vector<std::string>{"a", "b"}));
-    EXPECT_EQ(db_.query("SELECT count(DISTINCT prog_id) FROM progs"), std::vector<std::string>{"2"});
-    EXPECT_EQ(db_.query("SELECT * FROM db_info"), (std::vector<std::string>{"1", "0", "0", "0", ""}));
+    EXPECT_EQ(db_.query("SELECT id FROM logs WHERE llevel = 'err'"), (Strings{"1", "3"}));
+    EXPECT_EQ(db_.query("SELECT host_name FROM hosts ORDER BY 1"), (Strings{"a", "b"}));
+    EXPECT_EQ(db_.query("SELECT count(DISTINCT prog_id) FROM progs"), Strings{"2"});
+    EXPECT_EQ(db_.query("SELECT * FROM db_info"), (Strings{"1", "0", "0", "0", ""}));
 }
 
 }  // namespace

@@ -1,25 +1,17 @@
 // The program itself over a real database.
 #include <fcntl.h>
-#include <gtest/gtest.h>
-#include <sys/wait.h>
-#include <unistd.h>
-
-#include <thread>
 
 #include "program.h"
-#include "support/sqlite_file.h"
 
-using quor::test::Outcome;
-using quor::test::Program;
-using quor::test::ReadFile;
+using namespace quor::test;
 
 namespace {
 
 // A log database with five rows; id 4 is missing.
-class Commands : public testing::Test {
+class Commands : public Program {
   protected:
     Commands() {
-        quor::test::SqliteFile file(db_);
+        SqliteFile file(db_);
         file.run("CREATE TABLE logs(id INTEGER PRIMARY KEY AUTOINCREMENT, host, ip, fac, prio, llevel AS (prio), tag,"
                  " utcsec INTEGER, tzoffset, ldate, ltime, prog, msg)");
         file.run("INSERT INTO logs(id, host, ip, fac, prio, tag, utcsec, tzoffset, ldate, ltime, prog, msg) VALUES"
@@ -48,7 +40,7 @@ class Commands : public testing::Test {
 
     // On that database when the arguments name none.
     Outcome run(const std::string& arguments, const std::string& input = "") const {
-        return program_.run(line(arguments), input);
+        return Program::run(line(arguments), input);
     }
 
     // The ids that a search prints, in order.
@@ -61,31 +53,23 @@ class Commands : public testing::Test {
         return outcome.status == 2 ? outcome.err : found;
     }
 
-    Program program_;
-    const quor::test::TempFolder& folder_ = program_.folder();
     std::string db_ = folder_.path("the log.db");
 };
 
 TEST_F(Commands, SearchFindsWhatTheFiltersAskFor) {
     const std::pair<const char*, const char*> cases[] = {
         {"", "6 5 3 2 1"},
-        {"--limit 2", "6 5"},
         {"--limit 2 --offset 1", "5 3"},  // a page is full although an id is missing
         {"--limit 9 --offset 4", "1"},
-        {"--offset 3", "2 1"},
         {"--before 5 --limit 2", "3 2"},
-        {"--oldest --limit 2", "1 2"},
         {"--oldest --offset 2", "3 5 6"},
-        {"--host web", "2 1"},
         {"--host \"O'Neil\" --host web", "6 2 1"},
         {"--level err+", "3 1"},
-        {"--facility kern --program kernel", "3 2"},
         {"--keyword '[sda]'", "3"},
         {"--keyword 'login?'", "1"},  // not "login,"
         {"--keyword 'login?' --offset 1", ""},
         {"--glob 'login?*'", "2 1"},
         {"--from 2026-01-02 --to 2026-01-03", "5 3 2"},
-        {"--from 2026-01-04 --to 2026-01-04", "6"},
         {"--table transfer_log", "1"},
         {"--table general_log --level warning --keyword 'hat?'", "1"},
     };
@@ -95,12 +79,10 @@ TEST_F(Commands, SearchFindsWhatTheFiltersAskFor) {
 }
 
 TEST_F(Commands, SearchStreamsMoreRowsThanOnePiece) {
-    quor::test::SqliteFile(db_).run(
-        "WITH RECURSIVE n(i) AS (SELECT 10 UNION ALL SELECT i + 1 FROM n WHERE i < 30000) "
-        "INSERT INTO logs(id, host, msg) SELECT i + (i > 20000) * 1000000000, 'bulk', 'm?' FROM n");
-    EXPECT_EQ(run("count").out, "29996\n");
-    EXPECT_EQ(run("count --estimate").out, "1000030000\n");
-    EXPECT_EQ(run("count --keyword 'm?'").out, "29991\n");
+    SqliteFile(db_).run("WITH RECURSIVE n(i) AS (SELECT 10 UNION ALL SELECT i + 1 FROM n WHERE i < 30000) "
+                        "INSERT INTO logs(id, host, msg) SELECT i + (i > 20000) * 1000000000, 'bulk', 'm?' FROM n");
+    EXPECT_EQ(run("count").out + run("count --estimate").out + run("count --keyword 'm?'").out,
+              "29996\n1000030000\n29991\n");
     for (const char* order : {"", " --oldest"}) {
         const std::string rows = run(std::string("search --format ndjson") + order).out;
         EXPECT_EQ(std::count(rows.begin(), rows.end(), '\n'), 29996) << order;
@@ -129,24 +111,19 @@ TEST_F(Commands, SalvageReportsWhatItSaved) {
     const std::string salvage = "cd '" + folder_.path() + "' && " QUORLOG " db salvage damaged.db saved.db";
     EXPECT_EQ(WEXITSTATUS(system((salvage + " --format ndjson >out 2>err").c_str())), 0) << ReadFile("err");
     EXPECT_NE(ReadFile(folder_.path("out")).find(R"("rows":7,)"), std::string::npos) << ReadFile(folder_.path("out"));
-    EXPECT_EQ(quor::test::SqliteFile(folder_.path("saved.db")).query("SELECT group_concat(id) FROM logs").at(0),
-              "1,2,3,5,6");
+    EXPECT_EQ(SqliteFile(folder_.path("saved.db")).query("SELECT group_concat(id) FROM logs").at(0), "1,2,3,5,6");
     EXPECT_EQ(WEXITSTATUS(system((salvage + " >out 2>err").c_str())), 2) << "the new file exists";
 }
 
 TEST_F(Commands, NothingFoundNamesTheFilterThatExcludedEverything) {
     const std::pair<const char*, const char*> cases[] = {
         {"search --host web9,x --level err", "no row has --host web9,x"},
-        {"search --level emerg", "no row has --level emerg"},
-        {"search --from 2027-01-01", "no row is dated from 2027-01-01"},
         {"search --from 2025-01-01 --to 2025-01-01", "no row is dated 2025-01-01"},
         {"search --host web --program cron", "no row matches all filters together"},
         {"search --keyword nowhere", "no message matches"},
         {"search --host web --offset 2", "--offset is beyond the last row"},
         {"search --before 1 --host web", "no row has an id below 1"},
         {"search --table connection_log --host x", "table connection_log is empty"},
-        {"count --keyword 'nowhere?'", "no message matches"},
-        {"delete --host web9 --yes", "no row matches"},
     };
     for (const auto& [arguments, reason] : cases) {
         const Outcome outcome = run(arguments);
@@ -157,14 +134,10 @@ TEST_F(Commands, NothingFoundNamesTheFilterThatExcludedEverything) {
 
 TEST_F(Commands, WrongUsageAndFailuresAreOneLineThatHelps) {
     folder_.write("text.db", std::string(5000, 'x'));
-    quor::test::SqliteFile(folder_.path("bare.db")).run("CREATE TABLE logs(id INTEGER PRIMARY KEY, host, prio, msg)");
+    SqliteFile(folder_.path("bare.db")).run("CREATE TABLE logs(id INTEGER PRIMARY KEY, host, prio, msg)");
     const std::pair<const char*, const char*> cases[] = {
         {"nosuch", "no such command 'nosuch'; see quorlog --help-all"},
-        {"search --colour", "see quorlog --help-all"},
-        {"search --limit 0x1", "--limit"},
         {"search --limit 99999999999999999999", "--limit"},
-        {"search --table users", "--table"},
-        {"search --glob x --keyword y", "--glob"},
         {"search --table transfer_log --keyword x", "--keyword: table transfer_log has no column for it"},
         {"search --db missing.db", "missing.db; start syslog-ng, give another --db, or run quorlog db create"},
         {"search --db .", "is not a file"},
@@ -172,47 +145,38 @@ TEST_F(Commands, WrongUsageAndFailuresAreOneLineThatHelps) {
         {"search --db bare.db --level err", "no such column: llevel; choose another --table or --db"},
         {"search >/dev/full", "No space left"},
         {"search >&-", "standard output is closed"},
-        {"count --estimate --host web", "--estimate"},
         {"delete --yes", "--all"},
         {"delete --all --host web --yes", "--all"},
         {"delete --keyword 'a*' --yes", "--glob"},
         {"delete --host web", "--yes"},
         {"db create --db '$(id).db'", "cannot be used"},
         {"db create --db text.db", "exists already"},
-        {"db info --db bare2.db", "no database"},
     };
     for (const auto& [arguments, advice] : cases) {
         const Outcome outcome = run(arguments);
         EXPECT_EQ(outcome.status, 2) << arguments;
-        EXPECT_NE(outcome.err.find(advice), std::string::npos) << arguments << ": " << outcome.err;
-        EXPECT_NE(outcome.err.find("quorlog: "), std::string::npos) << arguments;
+        EXPECT_NE(outcome.err.find(advice, outcome.err.find("quorlog: ")), std::string::npos) << outcome.err;
     }
     EXPECT_EQ(run("count").out, "5\n");
 }
 
 TEST_F(Commands, DeleteAsksAndDeletesWhatMatches) {
+    const std::string info = run("db info --format json").out;
+    EXPECT_NE(info.find("\"logs\":5"), std::string::npos) << info;
+    EXPECT_NE(info.find("\"oldest\":\"1970-01-01\""), std::string::npos) << info;
     EXPECT_EQ(run("delete --host web", "n\n").status, 1);
     EXPECT_EQ(run("count").out, "5\n");
     EXPECT_EQ(run("delete --host web", "y\n").out, "deleted 2 rows\n");
     EXPECT_EQ(ids(""), "6 5 3");
     EXPECT_EQ(run("delete --all --yes").status, 0);
     EXPECT_EQ(run("count").status, 1);
-}
-
-TEST_F(Commands, DbInfoAndCheckpoint) {
-    const std::string info = run("db info --format json").out;
-    EXPECT_NE(info.find("\"logs\":5"), std::string::npos) << info;
-    EXPECT_NE(info.find("\"oldest\":\"1970-01-01\""), std::string::npos) << info;
     EXPECT_EQ(run("db checkpoint").status, 0);
 }
 
 TEST_F(Commands, FollowPrintsNewRowsUntilItIsInterrupted) {
     const std::string out = folder_.path("out");
-    const auto appears = [&](const std::string& text) {
-        for (int i = 0; i < 100 && ReadFile(out).find(text) == std::string::npos; ++i) {
-            std::this_thread::sleep_for(std::chrono::milliseconds(50));
-        }
-        return ReadFile(out).find(text) != std::string::npos;
+    const auto appears = [&](const char* text) {
+        return Eventually([&] { return ReadFile(out).find(text) != std::string::npos; });
     };
     const pid_t child = fork();
     if (child == 0) {
@@ -224,7 +188,7 @@ TEST_F(Commands, FollowPrintsNewRowsUntilItIsInterrupted) {
         _exit(127);
     }
     EXPECT_TRUE(appears("it's"));
-    quor::test::SqliteFile(db_).run("INSERT INTO logs(host, msg) VALUES('new', 'first'), ('web', 'other')");
+    SqliteFile(db_).run("INSERT INTO logs(host, msg) VALUES('new', 'first'), ('web', 'other')");
     EXPECT_TRUE(appears("first"));
     kill(child, SIGINT);
     int status = 0;

@@ -2,6 +2,7 @@
 #include <gtest/gtest.h>
 
 #include <CLI/CLI.hpp>
+#include <map>
 #include <set>
 #include <sstream>
 
@@ -12,56 +13,48 @@ namespace {
 
 using quor::test::ReadFile;
 
-class Help : public testing::Test {
-  protected:
-    Help() { quor::cli::AddCommands(app_, status_); }
+// "search" or "db info", with the words that may follow it.
+using Commands = std::map<std::string, std::set<std::string>>;
 
-    // "search" or "db info", with the words that may follow it.
-    using Commands = std::vector<std::pair<std::string, std::vector<std::string>>>;
-
-    static void collect(const CLI::App& app, const std::string& path, Commands& commands) {
-        std::vector<std::string> words;
-        for (const CLI::App* sub : app.get_subcommands([](const CLI::App*) { return true; })) {
-            words.push_back(sub->get_name());
-            collect(*sub, path.empty() ? sub->get_name() : path + " " + sub->get_name(), commands);
-        }
-        for (const CLI::Option* option : app.get_options()) {
-            for (const std::string& name : option->get_lnames()) {
-                words.push_back("--" + name);
-            }
-        }
-        commands.emplace_back(path, words);
+void collect(const CLI::App& app, const std::string& path, Commands& commands) {
+    std::set<std::string>& words = commands[path];
+    for (const CLI::App* sub : app.get_subcommands([](const CLI::App*) { return true; })) {
+        words.insert(sub->get_name());
+        collect(*sub, path.empty() ? sub->get_name() : path + " " + sub->get_name(), commands);
     }
-
-    Commands commands() const {
-        Commands found;
-        collect(app_, "", found);
-        return found;
+    for (const CLI::Option* option : app.get_options()) {
+        for (const std::string& name : option->get_lnames()) {
+            words.insert("--" + name);
+        }
     }
+}
 
-    CLI::App app_;
-    int status_ = 0;
-};
+Commands commands() {
+    CLI::App app;
+    int status = 0;
+    quor::cli::AddCommands(app, status);
+    Commands found;
+    collect(app, "", found);
+    return found;
+}
 
 std::set<std::string> wordsOf(const std::string& text) {
     std::istringstream stream(text);
     return {std::istream_iterator<std::string>(stream), {}};
 }
 
-TEST_F(Help, CompletionOffersWhatTheProgramHas) {
+TEST(Help, CompletionOffersWhatTheProgramHas) {
     const std::string script = ReadFile(SOURCE_FOLDER "/etc/bash-completion/quorlog");
     for (const auto& [command, words] : commands()) {
         const std::string start = "\n    '" + command + "') words='";
         const size_t at = script.find(start);
         ASSERT_NE(at, std::string::npos) << command;
         const size_t begin = at + start.size();
-        EXPECT_EQ(wordsOf(script.substr(begin, script.find('\'', begin) - begin)),
-                  std::set<std::string>(words.begin(), words.end()))
-            << command;
+        EXPECT_EQ(wordsOf(script.substr(begin, script.find('\'', begin) - begin)), words) << command;
     }
 }
 
-TEST_F(Help, ManualDescribesWhatTheProgramHas) {
+TEST(Help, ManualDescribesWhatTheProgramHas) {
     const std::string manual = ReadFile(SOURCE_FOLDER "/docs/man/quorlog.1");
     for (const auto& [command, words] : commands()) {
         EXPECT_TRUE(command.empty() || manual.find(" Cm " + command + "\n") != std::string::npos) << command;

@@ -2,12 +2,11 @@
 #ifndef TESTS_QUORLOG_PROGRAM_H
 #define TESTS_QUORLOG_PROGRAM_H
 
-#include <stdlib.h>
 #include <sys/wait.h>
 
-#include <string>
+#include <algorithm>
 
-#include "support/temp_folder.h"
+#include "support/testing.h"
 
 namespace quor::test {
 
@@ -17,8 +16,15 @@ struct Outcome {
     std::string err;
 };
 
-class Program {
-  public:
+class Program : public testing::Test {
+  protected:
+    struct Case {
+        const char* arguments;
+        int status;
+        const char* out;
+        const char* err;  // a part of it
+    };
+
     // `arguments` as a shell reads them.
     Outcome run(const std::string& arguments, const std::string& input = "") const {
         folder_.write("in", input);
@@ -27,10 +33,19 @@ class Program {
         return {WEXITSTATUS(status), ReadFile(folder_.path("out")), ReadFile(folder_.path("err"))};
     }
 
-    const TempFolder& folder() const { return folder_; }
+    void expect(std::initializer_list<Case> cases) const {
+        for (const Case& test : cases) {
+            const Outcome outcome = run(test.arguments);
+            EXPECT_EQ(outcome.status, test.status) << test.arguments << outcome.err;
+            EXPECT_EQ(outcome.out, test.out) << test.arguments;
+            EXPECT_NE(outcome.err.find(test.err), std::string::npos) << test.arguments << outcome.err;
+        }
+    }
 
-  private:
-    TempFolder folder_;
+    SqliteFile database(const std::string& name) const { return SqliteFile(folder_.path(name)); }
+    bool exists(const std::string& name) const { return std::filesystem::exists(folder_.path(name)); }
+
+    const TempFolder folder_;
 };
 
 }  // namespace quor::test

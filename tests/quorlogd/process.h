@@ -4,37 +4,28 @@
 
 #include <fcntl.h>
 #include <sys/wait.h>
-#include <unistd.h>
 
-#include <algorithm>
-#include <chrono>
 #include <csignal>
-#include <string>
-#include <thread>
-#include <vector>
 
-#include "support/temp_folder.h"
+#include "support/testing.h"
 
 namespace quor::test {
 
 class Quorlogd {
   public:
-    explicit Quorlogd(std::vector<std::string> options = {}) {
-        options.insert(options.begin(), {"/bin/sh", "-c", "exec " QUORLOGD " \"$@\"", "quorlogd", "--stderr"});
+    // `options` as a shell reads them.
+    explicit Quorlogd(const std::string& options = "") {
         int ends[2];
         if (pipe2(ends, O_CLOEXEC) != 0) {
             throw std::runtime_error("no pipe for the test");
         }
         input_ = ends[1];
-        const std::string messages = folder_.path("messages");
-        std::vector<char*> arguments(options.size() + 1);
-        std::transform(options.begin(), options.end(), arguments.begin(), [](std::string& o) { return o.data(); });
+        const std::string command =
+            "exec " QUORLOGD " --stderr " + options + " >/dev/null 2>>" + folder_.path("messages");
         pid_ = fork();
         if (pid_ == 0) {
             dup2(ends[0], STDIN_FILENO);
-            dup2(open("/dev/null", O_WRONLY), STDOUT_FILENO);
-            dup2(open(messages.c_str(), O_WRONLY | O_CREAT | O_APPEND, 0600), STDERR_FILENO);
-            execv(arguments[0], arguments.data());
+            execl("/bin/sh", "sh", "-c", command.c_str(), nullptr);
             _exit(127);
         }
         close(ends[0]);
@@ -75,18 +66,14 @@ class Quorlogd {
     std::string messages() const { return ReadFile(folder_.path("messages")); }
     // Whether a message holds `text` some seconds from now at the latest.
     bool says(const std::string& text) const {
-        return eventually([&] { return messages().find(text) != std::string::npos; });
+        return Eventually([&] { return messages().find(text) != std::string::npos; });
     }
-    template <typename Condition>
-    static bool eventually(Condition condition) {
-        constexpr int kTries = 1000;
-        for (int i = 0; i < kTries; ++i) {
-            if (condition()) {
-                return true;
-            }
-            std::this_thread::sleep_for(std::chrono::milliseconds(10));
-        }
-        return false;
+    // Until the message is there that the signal asks for.
+    bool saysWhenAsked(int number, const std::string& text) const {
+        return Eventually([&] {
+            signal(number);
+            return messages().find(text) != std::string::npos;
+        });
     }
 
   private:

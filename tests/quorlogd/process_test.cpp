@@ -1,19 +1,12 @@
-#include <gtest/gtest.h>
-
-#include <filesystem>
 #include <random>
 
-#include "common/paths.h"
 #include "dbutil.h"
 #include "process.h"
-#include "support/sqlite_file.h"
+
+using namespace quor::test;
+namespace paths = quor::paths;
 
 namespace {
-
-namespace paths = quor::paths;
-using quor::test::Quorlogd;
-using quor::test::SqliteFile;
-using Texts = std::vector<std::string>;
 
 std::string entry(const std::string& host, const std::string& message, const std::string& prio = "info") {
     return "local0 " + prio + " 2026-11-21 05:15:54 1795238154 1795238154 +00:00 " + host + " 10.0.0.1 kernel 84 " +
@@ -33,18 +26,15 @@ std::string keywordRule(const std::string& keyword) {
            "\"\nnotify_enable=\"1\"\n";
 }
 
-void writeFile(const std::filesystem::path& path, const std::string& text) {
-    std::filesystem::create_directories(path.parent_path());
-    std::ofstream(path, std::ios::binary) << text;
-}
-
 unsigned long long countOf(const std::string& device) {
     std::string path = paths::kAccountingDb;
     return SyslogDBHistGetSingle(path, device);
 }
 
-Texts events() {
-    return SqliteFile(paths::kEventDb).query("SELECT event FROM log ORDER BY id");
+Strings events() {
+    SqliteFile file(paths::kEventDb);
+    const bool created = !file.query("SELECT 1 FROM sqlite_master WHERE name = 'log'").empty();
+    return created ? file.query("SELECT event FROM log ORDER BY id") : Strings();
 }
 
 class QuorlogdProcess : public testing::Test {
@@ -55,29 +45,24 @@ class QuorlogdProcess : public testing::Test {
             std::filesystem::remove_all(std::filesystem::path(path).parent_path());
             std::filesystem::create_directories(std::filesystem::path(path).parent_path());
         }
-        writeFile(paths::kNotifyRules, "");
+        WriteFile(paths::kNotifyRules, "");
     }
 
     // Until the database holds what a write that is asked for leaves there.
     static bool writes(Quorlogd& daemon, const std::string& device, unsigned long long count) {
-        return Quorlogd::eventually([&] {
+        return Eventually([&] {
             daemon.signal(SIGUSR2);
             return countOf(device) == count;
         });
     }
     // Until statistics that are asked for tell of so many lines.
-    static bool takes(Quorlogd& daemon, int lines) {
-        return Quorlogd::eventually([&] {
-            daemon.signal(SIGUSR1);
-            return daemon.messages().find("Statistics: " + std::to_string(lines) + " lines") != std::string::npos;
-        });
+    static bool takes(const Quorlogd& daemon, int lines) {
+        return daemon.saysWhenAsked(SIGUSR1, "Statistics: " + std::to_string(lines) + " lines");
     }
 };
 
-}  // namespace
-
 TEST_F(QuorlogdProcess, AccountsTheInputUpToItsEnd) {
-    Quorlogd daemon({"--max-line", "1024"});
+    Quorlogd daemon("--max-line 1024");
     const std::string text = entry("router1", "it's up") + "not an entry\n\n" + entry("router2", "") +
                              entry("router1", std::string(1 << 20, 'x')) + entry("router1", "the last, without an end");
     for (const char c : text.substr(0, 300)) {
@@ -90,7 +75,7 @@ TEST_F(QuorlogdProcess, AccountsTheInputUpToItsEnd) {
     EXPECT_EQ(countOf("router2"), 1U);
     EXPECT_TRUE(daemon.says("5 lines, 1 bad, 1 oversized, 2 devices, 0 notices,")) << daemon.messages();
     EXPECT_EQ(events().size(), 2U);
-    EXPECT_EQ(SqliteFile(paths::kAccountingDb).query("SELECT sum(eps) FROM eps"), Texts{"4"});
+    EXPECT_EQ(SqliteFile(paths::kAccountingDb).query("SELECT sum(eps) FROM eps"), Strings{"4"});
 }
 
 TEST_F(QuorlogdProcess, AnswersSignals) {
@@ -109,12 +94,12 @@ TEST_F(QuorlogdProcess, AnswersSignals) {
 TEST_F(QuorlogdProcess, FollowsItsRulesAfterHup) {
     const std::string spool = paths::kNotifySpool + std::string("/desktop.jsonl");
     std::filesystem::remove(spool);
-    writeFile(paths::kSystemSettings, "desktop_notify_enabled=\"yes\"\n");
-    Quorlogd daemon({"--max-notices", "2"});
+    WriteFile(paths::kSystemSettings, "desktop_notify_enabled=\"yes\"\n");
+    Quorlogd daemon("--max-notices 2");
     ASSERT_TRUE(daemon.started());
     daemon.send(entry("router1", "it's down"));
     EXPECT_TRUE(takes(daemon, 1));
-    writeFile(paths::kNotifyRules, keywordRule("it's"));
+    WriteFile(paths::kNotifyRules, keywordRule("it's"));
     daemon.signal(SIGHUP);
     daemon.send(entry("router1", "it's down again") + entry("router2", "it is not") + entry("router2", "it's < down") +
                 entry("router3", "it's too much"));
@@ -122,19 +107,19 @@ TEST_F(QuorlogdProcess, FollowsItsRulesAfterHup) {
     EXPECT_EQ(daemon.waitForExit(), 0);
     EXPECT_TRUE(daemon.says("2 notices, 1 notices suppressed")) << daemon.messages();
     const std::string event = "Event detection: Received log which contains [it's]. Log content: ";
-    const Texts all = events();
+    const Strings all = events();
     ASSERT_EQ(all.size(), 4U);
-    EXPECT_EQ(Texts(all.begin() + 1, all.end() - 1),
-              (Texts{event + "[it's down again]", event + "[it's \u2039 down]"}));
-    EXPECT_TRUE(Quorlogd::eventually([&spool] {
-        const std::string notices = quor::test::ReadFile(spool);
+    EXPECT_EQ(Strings(all.begin() + 1, all.end() - 1),
+              (Strings{event + "[it's down again]", event + "[it's \u2039 down]"}));
+    EXPECT_TRUE(Eventually([&spool] {
+        const std::string notices = ReadFile(spool);
         return notices.find("it's down again") != std::string::npos && notices.find("it's < down") != std::string::npos;
     }));
     std::filesystem::remove(paths::kSystemSettings);
 }
 
 TEST_F(QuorlogdProcess, KeepsWhatADatabaseDoesNotTake) {
-    SqliteFile(paths::kAccountingDb).run(quor::test::ReadFile(paths::kAccountingSchema));
+    SqliteFile(paths::kAccountingDb).run(ReadFile(paths::kAccountingSchema));
     Quorlogd daemon;
     ASSERT_TRUE(daemon.started());
     daemon.send(entries("router1", 3));
@@ -143,13 +128,11 @@ TEST_F(QuorlogdProcess, KeepsWhatADatabaseDoesNotTake) {
         SqliteFile locked(paths::kAccountingDb);
         locked.run("BEGIN EXCLUSIVE");
         daemon.send(entries("router1", 4));
-        EXPECT_TRUE(Quorlogd::eventually([&daemon] {  // there is nothing to write before the second has passed
-            daemon.signal(SIGUSR2);
-            return daemon.messages().find("Accounting is kept in memory") != std::string::npos;
-        })) << daemon.messages();
+        // There is nothing to write before the second has passed.
+        EXPECT_TRUE(daemon.saysWhenAsked(SIGUSR2, "Accounting is kept in memory")) << daemon.messages();
     }
     EXPECT_TRUE(writes(daemon, "router1", 7));
-    EXPECT_EQ(SqliteFile(paths::kAccountingDb).query("SELECT sum(eps) FROM eps"), Texts{"7"});
+    EXPECT_EQ(SqliteFile(paths::kAccountingDb).query("SELECT sum(eps) FROM eps"), Strings{"7"});
     // Damaged below the header: it is moved aside and replaced.
     std::filesystem::remove(paths::kAccountingDb + std::string("-wal"));
     std::filesystem::resize_file(paths::kAccountingDb, 4096);
@@ -158,19 +141,18 @@ TEST_F(QuorlogdProcess, KeepsWhatADatabaseDoesNotTake) {
     EXPECT_TRUE(writes(daemon, "router1", 8)) << daemon.messages();
     EXPECT_TRUE(std::filesystem::exists(paths::kAccountingDb + std::string(".corrupt")));
     // Not a database at all: it stays, and so do the counts in memory.
-    const std::string good = quor::test::ReadFile(paths::kAccountingDb);
-    writeFile(paths::kAccountingDb, std::string(40960, 'x'));
+    WriteFile(paths::kAccountingDb, std::string(40960, 'x'));
     daemon.send(entries("router1", 1));
     daemon.signal(SIGTERM);
     EXPECT_EQ(daemon.waitForExit(), 0);
-    EXPECT_EQ(quor::test::ReadFile(paths::kAccountingDb), std::string(40960, 'x'));
+    EXPECT_EQ(ReadFile(paths::kAccountingDb), std::string(40960, 'x'));
 }
 
 TEST_F(QuorlogdProcess, LeavesSoundDatabasesWhenKilled) {
     std::random_device random;
     for (int i = 0; i < 5; ++i) {
-        writeFile(paths::kNotifyRules, keywordRule("up"));
-        Quorlogd daemon({"--max-notices", "10"});
+        WriteFile(paths::kNotifyRules, keywordRule("up"));
+        Quorlogd daemon("--max-notices 10");
         ASSERT_TRUE(daemon.started());
         const auto end = std::chrono::steady_clock::now() + std::chrono::microseconds(random() % 300000);
         while (std::chrono::steady_clock::now() < end) {
@@ -181,7 +163,7 @@ TEST_F(QuorlogdProcess, LeavesSoundDatabasesWhenKilled) {
         EXPECT_EQ(daemon.waitForExit(), -1);
         for (const char* path : {paths::kAccountingDb, paths::kEventDb}) {
             if (std::filesystem::exists(path)) {
-                EXPECT_EQ(SqliteFile(path).query("PRAGMA integrity_check"), Texts{"ok"}) << path;
+                EXPECT_EQ(SqliteFile(path).query("PRAGMA integrity_check"), Strings{"ok"}) << path;
             }
         }
     }
@@ -194,8 +176,8 @@ TEST_F(QuorlogdProcess, LeavesSoundDatabasesWhenKilled) {
 }
 
 TEST_F(QuorlogdProcess, RaisesAFullVolumeOnce) {
-    Quorlogd daemon({"--volume", "/", "--volume-full", "0.000001", "--check-interval", "1"});
-    EXPECT_TRUE(Quorlogd::eventually([] { return std::filesystem::exists(paths::kEventDb) && events().size() >= 2; }));
+    Quorlogd daemon("--volume / --volume-full 0.000001 --check-interval 1");
+    EXPECT_TRUE(Eventually([] { return std::filesystem::exists(paths::kEventDb) && events().size() >= 2; }));
     daemon.send("not an entry\n");
     EXPECT_TRUE(daemon.says("1 lines were not log entries")) << "no other check";
     daemon.closeInput();
@@ -206,7 +188,9 @@ TEST_F(QuorlogdProcess, RaisesAFullVolumeOnce) {
 
 TEST_F(QuorlogdProcess, RefusesWrongOptions) {
     for (const auto& [option, status] : {std::pair("--flush-interval=1", 2), {"--nonsense", 2}, {"--help", 0}}) {
-        EXPECT_EQ(Quorlogd({option}).waitForExit(), status) << option;
+        EXPECT_EQ(Quorlogd(option).waitForExit(), status) << option;
     }
     EXPECT_FALSE(std::filesystem::exists(paths::kEventDb));
 }
+
+}  // namespace

@@ -3,6 +3,7 @@
 #include <ctime>
 #include <optional>
 
+namespace quor::test {
 namespace {
 
 std::optional<time_t>& fixedTime() {
@@ -10,15 +11,7 @@ std::optional<time_t>& fixedTime() {
     return fixed;
 }
 
-time_t realTime() {
-    timespec now{};
-    clock_gettime(CLOCK_REALTIME, &now);
-    return now.tv_sec;
-}
-
 }  // namespace
-
-namespace quor::test {
 
 void SetClock(int64_t now) {
     fixedTime() = static_cast<time_t>(now);
@@ -31,9 +24,11 @@ void ResetClock() {
 }  // namespace quor::test
 
 extern "C" time_t time(time_t* timer) noexcept {
-    const time_t now = fixedTime() ? *fixedTime() : realTime();
+    timespec now{};
+    clock_gettime(CLOCK_REALTIME, &now);
+    const time_t seconds = quor::test::fixedTime().value_or(now.tv_sec);
     if (timer != nullptr) {
-        *timer = now;
+        *timer = seconds;
     }
-    return now;
+    return seconds;
 }

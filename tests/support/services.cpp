@@ -11,19 +11,12 @@ Services& FakeServices() {
 
 }  // namespace quor::test
 
-namespace {
-
-int record(const char* kind, const char* name) {
-    quor::test::FakeServices().reloaded.push_back(std::string(kind) + name);
+int QLIBServiceReload(const char* service) {
+    quor::test::FakeServices().reloaded.push_back(std::string("service ") + service);
     return quor::test::FakeServices().fail ? -1 : 0;
 }
 
-}  // namespace
-
-int QLIBServiceReload(const char* service) {
-    return record("service ", service);
-}
-
 int QLIBServicectlJobReload(const char* job) {
-    return record("job ", job);
+    quor::test::FakeServices().reloaded.push_back(std::string("job ") + job);
+    return quor::test::FakeServices().fail ? -1 : 0;
 }

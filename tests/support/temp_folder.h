@@ -1,4 +1,4 @@
-// A fresh folder for one test, removed with everything in it.
+// A fresh folder for one test, removed with everything in it; files read and written whole.
 #ifndef TESTS_SUPPORT_TEMP_FOLDER_H
 #define TESTS_SUPPORT_TEMP_FOLDER_H
 
@@ -38,6 +38,12 @@ class TempFolder {
   private:
     std::string path_;
 };
+
+// Creates the folders above the file.
+inline void WriteFile(const std::filesystem::path& path, const std::string& text) {
+    std::filesystem::create_directories(path.parent_path());
+    std::ofstream(path, std::ios::binary) << text;
+}
 
 inline std::string ReadFile(const std::string& path) {
     std::ifstream file(path, std::ios::binary);

@@ -1,0 +1,129 @@
+#include <gtest/gtest.h>
+#include <json/value.h>
+#include <syslog.h>
+
+#include <climits>
+#include <cstring>
+#include <sstream>
+
+#include "common.h"
+#include "common/guards.h"
+#include "common/numbers.h"
+#include "support/system_log.h"
+#include "support/temp_folder.h"
+
+namespace {
+
+using quor::test::TakeSystemLog;
+using Strings = std::list<std::string>;
+
+// The entries stored for a file of this content, null ones as "(null)".
+Strings reversed(const std::string& content, int maxLines, int count = 0) {
+    const quor::test::TempFolder folder;
+    const quor::File file(fopen(folder.write("lines", content).c_str(), "r"));
+    char** lines = nullptr;
+    EXPECT_EQ(readfileinreverse(file.get(), &lines, count, maxLines), -1);
+    Strings entries;
+    for (int i = 0; i < maxLines; ++i) {
+        entries.emplace_back(lines[i] != nullptr ? lines[i] : "(null)");
+        free(lines[i]);
+    }
+    free(lines);
+    return entries;
+}
+
+TEST(Tokenize, KeepsEmptyFields) {
+    EXPECT_EQ(Tokenize("", ","), Strings());
+    EXPECT_EQ(Tokenize("a,,b;c,", ",;"), Strings({"a", "", "b", "c", ""}));
+    EXPECT_EQ(ullNumberToString(ULLONG_MAX), "18446744073709551615");
+}
+
+TEST(EncodeJson, EscapesQuotesAndBackslashesWithinTheBuffer) {
+    struct Case {
+        const char* in;
+        int size;
+        const char* out;  // null: does not fit
+    };
+    for (const Case& c : {Case{"", 1, ""}, Case{"", 0, nullptr}, Case{"a\"b", 5, "a\\\"b"}, Case{"a\"b", 4, nullptr},
+                          Case{"\\", 3, "\\\\"}, Case{"\\", 2, nullptr}, Case{"\\", 1, nullptr},
+                          Case{"\t\n\x01", 4, "\t\n\x01"}, Case{"ab", -1, nullptr}}) {
+        SCOPED_TRACE(testing::Message() << '"' << c.in << "\" into " << c.size);
+        char out[8] = "#######";
+        EXPECT_EQ(EncodeJson(c.in, out, c.size), c.out != nullptr ? 0 : -1);
+        if (c.out != nullptr) {
+            EXPECT_STREQ(out, c.out);
+        }
+        EXPECT_EQ(out[c.size < 0 ? 0 : c.size], '#') << "written past the size";
+    }
+    char same[] = "a";
+    EXPECT_EQ(EncodeJson(same, same, 2), -1);
+    EXPECT_EQ(EncodeJson(nullptr, same, 2), -1);
+    EXPECT_EQ(EncodeJson(same, nullptr, 2), -1);
+}
+
+TEST(ReadFileInReverse, StoresLinesFromTheLast) {
+    EXPECT_EQ(reversed("a\nb\n", 4), Strings({"", "b", "a", "(null)"}));
+    EXPECT_EQ(reversed("a\nb\nc", 2), Strings({"c", "b"}));
+    EXPECT_EQ(reversed("", 2), Strings({"", "(null)"}));
+    EXPECT_EQ(reversed("\n", 2), Strings({"", ""}));
+    EXPECT_EQ(reversed("a\nb", 5, 3), Strings({"(null)", "(null)", "(null)", "b", "a"}));
+    EXPECT_EQ(reversed("a", 2, 2), Strings({"(null)", "(null)"}));
+    EXPECT_EQ(reversed(std::string("x\0y\nz", 5), 2), Strings({"z", "x"}));
+    const std::string line = "begin" + std::string(1'018, 'm') + "end";
+    EXPECT_EQ(reversed(line + "\n" + line, 2), Strings({line.substr(0, 1023), line.substr(0, 1023)}));
+}
+
+TEST(CmdParser, CutsAfterEveryClosingBraceAndStopsAtTheFirstFailure) {
+    struct Case {
+        const char* input;
+        int result;
+        size_t values;
+    };
+    for (const Case& c :
+         {Case{"", 1, 0}, Case{"}}}", 1, 0}, Case{R"({"a":1}{"b":2})", 1, 2}, Case{R"(}{"a":1}}{"b":2}})", 1, 2},
+          Case{R"({"a":{"b":1}})", 0, 0}, Case{R"({"a":"}"})", 0, 0}, Case{R"({"a":1}{"b")", 0, 1},
+          Case{R"({"a":1}{"b"}{"c":1})", 0, 1}}) {
+        SCOPED_TRACE(c.input);
+        TakeSystemLog();
+        std::string input = c.input;
+        std::vector<Json::Value> values{Json::Value(7)};
+        EXPECT_EQ(CmdParser().CmdParse(input, values), c.result);
+        EXPECT_EQ(values.size(), 1 + c.values) << "appended";
+        EXPECT_EQ(values[0].asInt(), 7);
+        const auto lines = TakeSystemLog();
+        ASSERT_EQ(lines.size(), c.result == 1 ? 0U : 1U);
+        if (!lines.empty()) {
+            EXPECT_EQ(lines[0].text.rfind("Error: parsing error, reason = * Line 1", 0), 0U) << lines[0].text;
+        }
+    }
+}
+
+TEST(Debuger, WritesOnlyLevelsBelowOneAndLeavesPercentSignsAlone) {
+    TakeSystemLog();
+    for (const int level : {-1, 0, 1, 2}) {
+        Debuger::MSG(level, "100%s %n" + std::to_string(level));
+    }
+    Debuger::MSG(0, "");
+    const auto lines = TakeSystemLog();
+    ASSERT_EQ(lines.size(), 3U);
+    EXPECT_EQ(lines[0].text + lines[1].text + lines[2].text, "100%s %n-1100%s %n0");
+    EXPECT_EQ(lines[0].priority, LOG_ERR);
+}
+
+TEST(Numbers, ReadAsTheCLibraryDoesAtEveryBoundary) {
+    std::istringstream texts("x - + 0 -0 12abc +7 --7 0x10 2147483647 2147483648 -2147483648 -2147483649 4294967296 "
+                             "9223372036854775807 9223372036854775808 -9223372036854775808 -9223372036854775809 "
+                             "18446744073709551615 18446744073709551616 -1 -18446744073709551615 "
+                             "-18446744073709551616 99999999999999999999999 1.5 \xff\x31");
+    Strings all{"", " \t\n42", "- 7"};
+    all.insert(all.end(), std::istream_iterator<std::string>(texts), {});
+    for (const std::string& text : all) {
+        EXPECT_EQ(quor::ToInt64(text.c_str()), strtoll(text.c_str(), nullptr, 10)) << text;
+        EXPECT_EQ(quor::ToUint64(text.c_str()), strtoull(text.c_str(), nullptr, 10)) << text;
+    }
+    EXPECT_EQ(quor::ToInt32("2147483648"), INT32_MAX);
+    EXPECT_EQ(quor::ToInt32("-99999999999999999999"), INT32_MIN);
+    EXPECT_EQ(quor::ToInt32(nullptr), 0);
+}
+
+}  // namespace
