@@ -130,14 +130,12 @@ TEST_F(Accounting, TheFirstLogOfAnIdleSpellClosesNothing) {
 
 TEST_F(Accounting, AFlushIsDueMoreThanFiveSecondsAfterTheLastQuestion) {
     AccountingManager accounting;
-    const struct {
-        int64_t now;
-        bool due;
-    } questions[] = {{100, true}, {103, false},       {108, false},        {114, true},
-                     {50, false}, {0x7ffffffd, true}, {0x80000001, false}, {0x80000007, true}};
-    for (const auto& question : questions) {
-        at(question.now);
-        EXPECT_EQ(accounting.isNeed2Flush(), question.due) << question.now;
+    const std::pair<int64_t, bool> questions[] = {{100, true},         {103, false},      {108, false},
+                                                  {114, true},         {50, false},       {0x7ffffffd, true},
+                                                  {0x80000001, false}, {0x80000007, true}};
+    for (const auto& [now, due] : questions) {
+        at(now);
+        EXPECT_EQ(accounting.isNeed2Flush(), due) << now;
     }
 }
 

@@ -39,21 +39,18 @@ TEST(Tokenize, KeepsEmptyFields) {
 }
 
 TEST(EncodeJson, EscapesQuotesAndBackslashesWithinTheBuffer) {
-    struct Case {
-        const char* in;
-        int size;
-        const char* out;  // null: does not fit
-    };
-    for (const Case& c : {Case{"", 1, ""}, Case{"", 0, nullptr}, Case{"a\"b", 5, "a\\\"b"}, Case{"a\"b", 4, nullptr},
-                          Case{"\\", 3, "\\\\"}, Case{"\\", 2, nullptr}, Case{"\\", 1, nullptr},
-                          Case{"\t\n\x01", 4, "\t\n\x01"}, Case{"ab", -1, nullptr}}) {
-        SCOPED_TRACE(testing::Message() << '"' << c.in << "\" into " << c.size);
+    using Case = std::tuple<const char*, int, const char*>;  // null: does not fit
+    for (const auto& [in, size, expected] :
+         {Case{"", 1, ""}, Case{"", 0, nullptr}, Case{"a\"b", 5, "a\\\"b"}, Case{"a\"b", 4, nullptr},
+          Case{"\\", 3, "\\\\"}, Case{"\\", 2, nullptr}, Case{"\\", 1, nullptr}, Case{"\t\n\x01", 4, "\t\n\x01"},
+          Case{"ab", -1, nullptr}}) {
+        SCOPED_TRACE(testing::Message() << '"' << in << "\" into " << size);
         char out[8] = "#######";
-        EXPECT_EQ(EncodeJson(c.in, out, c.size), c.out != nullptr ? 0 : -1);
-        if (c.out != nullptr) {
-            EXPECT_STREQ(out, c.out);
+        EXPECT_EQ(EncodeJson(in, out, size), expected != nullptr ? 0 : -1);
+        if (expected != nullptr) {
+            EXPECT_STREQ(out, expected);
         }
-        EXPECT_EQ(out[c.size < 0 ? 0 : c.size], '#') << "written past the size";
+        EXPECT_EQ(out[size < 0 ? 0 : size], '#') << "written past the size";
     }
     char same[] = "a";
     EXPECT_EQ(EncodeJson(same, same, 2), -1);
@@ -74,24 +71,20 @@ TEST(ReadFileInReverse, StoresLinesFromTheLast) {
 }
 
 TEST(CmdParser, CutsAfterEveryClosingBraceAndStopsAtTheFirstFailure) {
-    struct Case {
-        const char* input;
-        int result;
-        size_t values;
-    };
-    for (const Case& c :
+    using Case = std::tuple<const char*, int, size_t>;
+    for (const auto& [text, result, count] :
          {Case{"", 1, 0}, Case{"}}}", 1, 0}, Case{R"({"a":1}{"b":2})", 1, 2}, Case{R"(}{"a":1}}{"b":2}})", 1, 2},
           Case{R"({"a":{"b":1}})", 0, 0}, Case{R"({"a":"}"})", 0, 0}, Case{R"({"a":1}{"b")", 0, 1},
           Case{R"({"a":1}{"b"}{"c":1})", 0, 1}}) {
-        SCOPED_TRACE(c.input);
+        SCOPED_TRACE(text);
         TakeSystemLog();
-        std::string input = c.input;
+        std::string input = text;
         std::vector<Json::Value> values{Json::Value(7)};
-        EXPECT_EQ(CmdParser().CmdParse(input, values), c.result);
-        EXPECT_EQ(values.size(), 1 + c.values) << "appended";
+        EXPECT_EQ(CmdParser().CmdParse(input, values), result);
+        EXPECT_EQ(values.size(), 1 + count) << "appended";
         EXPECT_EQ(values[0].asInt(), 7);
         const auto lines = TakeSystemLog();
-        ASSERT_EQ(lines.size(), c.result == 1 ? 0U : 1U);
+        ASSERT_EQ(lines.size(), result == 1 ? 0U : 1U);
         if (!lines.empty()) {
             EXPECT_EQ(lines[0].text.rfind("Error: parsing error, reason = * Line 1", 0), 0U) << lines[0].text;
         }

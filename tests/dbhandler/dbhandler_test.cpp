@@ -73,23 +73,19 @@ TEST_F(Handle, TransactionsKeepTheirFlag) {
 }
 
 TEST_F(Handle, FailedTransactionStatementsLeaveTheFlag) {
-    struct Case {
-        const char* statement;
-        int (DBHandler::*operation)();
-        int flag;
-        const char* message;
-    };
+    using Case = std::tuple<const char*, int (DBHandler::*)(), int, const char*>;
     handle_.DBCon();
-    for (const Case& c : {Case{"BEGIN;", &DBHandler::DBTranStart, 0, "Fail to begin transaction"},
-                          Case{"END;", &DBHandler::DBTranEnd, 1, "Fail to end transaction"},
-                          Case{"ROLLBACK;", &DBHandler::DBTranRollback, 1, "Fail to rollback transaction"}}) {
-        SpyOnDb().failing = c.statement;
-        if (c.flag == 1 && handle_.isInTran() == 0) {
+    for (const auto& [statement, operation, flag, message] :
+         {Case{"BEGIN;", &DBHandler::DBTranStart, 0, "Fail to begin transaction"},
+          Case{"END;", &DBHandler::DBTranEnd, 1, "Fail to end transaction"},
+          Case{"ROLLBACK;", &DBHandler::DBTranRollback, 1, "Fail to rollback transaction"}}) {
+        SpyOnDb().failing = statement;
+        if (flag == 1 && handle_.isInTran() == 0) {
             handle_.DBTranStart();
         }
-        EXPECT_EQ((handle_.*c.operation)(), -1);
-        EXPECT_EQ(handle_.isInTran(), c.flag);
-        EXPECT_EQ(TakeSystemLogTexts(), Strings({c.message})) << "and nothing from the error handler";
+        EXPECT_EQ((handle_.*operation)(), -1);
+        EXPECT_EQ(handle_.isInTran(), flag);
+        EXPECT_EQ(TakeSystemLogTexts(), Strings({message})) << "and nothing from the error handler";
     }
     handle_.DBDiscon();
     EXPECT_EQ(handle_.isInTran(), 1) << "disconnecting changed the flag";

@@ -35,21 +35,18 @@ TEST_F(WorkingDb, HangsUpTheSyslogNgThatIsInCharge) {
 }
 
 TEST_F(WorkingDb, IsRemovedAboveItsLimitInWholeKibibytes) {
-    struct Case {
-        uintmax_t bytes;
-        int limitKB;
-        bool kept;
-    };
-    for (const Case& c : {Case{3 * 1024ULL + 1023, 3, true}, Case{4 * 1024ULL, 3, false}, Case{0, 0, true},
-                          Case{0, -1, false}, Case{5ULL << 40, 2147483647, false}}) {
-        SCOPED_TRACE(testing::Message() << c.bytes << " bytes, limit " << c.limitKB);
+    using Case = std::tuple<uintmax_t, int, bool>;
+    for (const auto& [bytes, limitKB, kept] :
+         {Case{3 * 1024ULL + 1023, 3, true}, Case{4 * 1024ULL, 3, false}, Case{0, 0, true}, Case{0, -1, false},
+          Case{5ULL << 40, 2147483647, false}}) {
+        SCOPED_TRACE(testing::Message() << bytes << " bytes, limit " << limitKB);
         FakeServices() = {};
         const std::string path = folder_.write("log.db", "");
         folder_.write("log.db-wal", "");
-        fs::resize_file(path, c.bytes);
-        EXPECT_EQ(SyslogngWorkingDbCheck(path, c.limitKB), 0);
-        EXPECT_EQ(fs::exists(path), c.kept);
-        EXPECT_EQ(FakeServices().reloaded.size(), c.kept ? 0U : 1U);
+        fs::resize_file(path, bytes);
+        EXPECT_EQ(SyslogngWorkingDbCheck(path, limitKB), 0);
+        EXPECT_EQ(fs::exists(path), kept);
+        EXPECT_EQ(FakeServices().reloaded.size(), kept ? 0U : 1U);
         EXPECT_TRUE(fs::exists(path + "-wal"));
     }
 }

@@ -15,17 +15,12 @@ std::string rendered(const _SYSLOG_SQL_COND_tag& condition) {
 }
 
 TEST(Condition, EscapesTheValueForItsOperator) {
-    struct Case {
-        _SYSLOG_DB_ATTRI_tag attr;
-        int op;
-        const char* value;
-        const char* text;
-    };
-    for (const Case& c : {
+    using Case = std::tuple<_SYSLOG_DB_ATTRI_tag, int, const char*, const char*>;
+    for (const auto& [attr, op, value, text] : {
              Case{SYSLOG_ATTRI_HOST, 0, "ab", "(host = 'ab')"},
              Case{SYSLOG_ATTRI_HOST, 1, "O'Neil", "(host != 'O''Neil')"},
              Case{SYSLOG_ATTRI_HOST, 0, R"(a\%_*?[])", R"((host = 'a\%_*?[]'))"},
-             Case{SYSLOG_ATTRI_MSG, 6, "a*b", R"((msg LIKE 'a%b' escape '\'))"},
+             Case{SYSLOG_ATTRI_MSG, 6, "a*b", "(msg LIKE 'a%b' escape '\\')"},
              Case{SYSLOG_ATTRI_MSG, 7, "50%_*?\\'", "(msg NOT LIKE '50\\%\\_%_\\\\''' escape '\\')"},
              Case{SYSLOG_ATTRI_MSG, 8, "[x]", "(msg GLOB '[[]x[]]')"},
              Case{SYSLOG_ATTRI_MSG, 9, "*e'r?", "(msg NOT GLOB '*e''r?')"},
@@ -35,7 +30,7 @@ TEST(Condition, EscapesTheValueForItsOperator) {
              Case{SYSLOG_ATTRI_ISDIR, 2, "1", "(isdir < '1')"},
              Case{SYSLOG_ATTRI_XFERIP, 3, "", "(ip <= '')"},
          }) {
-        EXPECT_EQ(rendered(cond(c.attr, c.op, c.value)), c.text);
+        EXPECT_EQ(rendered(cond(attr, op, value)), text);
     }
     EXPECT_EQ(CondValueEscape(nullptr), "");
 }

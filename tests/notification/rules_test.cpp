@@ -115,13 +115,8 @@ TEST_F(Rules, OnlyEnabledOnesOfTheKindCountInFileOrder) {
 TEST(IsNotificationSet, AsksEveryChannelUntilOneCannotBeRead) {
     const std::string all = "smtp_mail_enabled=yes\npushservice_mobile_enabled=no\npushservice_msn_enabled=no\n"
                             "pushservice_skype_enabled=";
-    const struct {
-        std::string settings;
-        const char* recipient;  // null: the mail settings cannot be read
-        int sms;                // negative: the SMS settings cannot be read
-        bool set;
-        Strings log;
-    } cases[] = {
+    // The recipient is null when the mail settings cannot be read, the SMS setting negative when those cannot be.
+    const std::tuple<std::string, const char*, int, bool, Strings> cases[] = {
         {all + "no", "", 0, false, {}},
         {all + "no", "a@b", 0, true, {}},
         {all + "no", "", 1, true, {}},
@@ -134,18 +129,18 @@ TEST(IsNotificationSet, AsksEveryChannelUntilOneCannotBeRead) {
         {all + "yes", "", -1, false, {"utils:178 Fail to get sms setting"}},
     };
     Notices& service = FakeNotices();
-    for (const auto& row : cases) {
-        WriteFile(quor::paths::kSystemSettings, row.settings + "\n");
+    for (const auto& [settings, recipient, sms, set, log] : cases) {
+        WriteFile(quor::paths::kSystemSettings, settings + "\n");
         service = {};
         std::string("mail").copy(service.mail.server, sizeof service.mail.server - 1);
-        std::string(quor::OrEmpty(row.recipient)).copy(service.mail.recipient, sizeof service.mail.recipient - 1);
-        service.mailUnreadable = row.recipient == nullptr;
-        service.sms.enabled = row.sms;
-        service.smsUnreadable = row.sms < 0;
+        std::string(quor::OrEmpty(recipient)).copy(service.mail.recipient, sizeof service.mail.recipient - 1);
+        service.mailUnreadable = recipient == nullptr;
+        service.sms.enabled = sms;
+        service.smsUnreadable = sms < 0;
         TakeSystemLogTexts();
-        EXPECT_EQ(IsNotificationSet(), row.set) << row.settings;
-        EXPECT_EQ(TakeSystemLogTexts(), row.log) << row.settings;
-        EXPECT_EQ(service.smsLent, 0) << row.settings;
+        EXPECT_EQ(IsNotificationSet(), set) << settings;
+        EXPECT_EQ(TakeSystemLogTexts(), log) << settings;
+        EXPECT_EQ(service.smsLent, 0) << settings;
     }
     std::filesystem::remove(quor::paths::kSystemSettings);
 }

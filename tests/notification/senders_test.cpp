@@ -1,21 +1,18 @@
-#include <gtest/gtest.h>
-
-#include "common/paths.h"
 #include "notification.h"
 #include "support/notices.h"
-#include "support/system_log.h"
+#include "support/testing.h"
+
+using namespace quor::test;
 
 namespace {
 
-using quor::test::FakeNotices;
-using Lines = std::vector<std::string>;
 using Values = std::map<std::string, std::string>;
 
 class Senders : public testing::Test {
   protected:
     Senders() {
         FakeNotices() = {};
-        quor::test::TakeSystemLog();
+        TakeSystemLog();
     }
 
     NotificationManager manager_;
@@ -48,7 +45,7 @@ TEST_F(Senders, FillThePlaceholdersOfTheirTemplates) {
         {"QUORSYSLOG_ShareEncUnmount", {{"%SHARED_FOLDER%", "4"}}},
     };
     std::vector<std::pair<std::string, Values>> sent;
-    for (const quor::test::Notice& notice : FakeNotices().sent) {
+    for (const Notice& notice : FakeNotices().sent) {
         sent.emplace_back(notice.tag, notice.values);
         EXPECT_EQ(notice.textsDir, quor::paths::kNotifyTexts);
         EXPECT_EQ(notice.filterFile, quor::paths::kNotifyFilter);
@@ -60,9 +57,9 @@ TEST_F(Senders, ReportAFailedSendAndRefuseNull) {
     FakeNotices().fail = true;
     EXPECT_EQ(manager_.NotificationSendVolFull("s"), -1);
     EXPECT_EQ(SyslogMailShareRename("s"), -1);
-    EXPECT_EQ(quor::test::TakeSystemLogTexts(),
-              (Lines{"Fail to send notification: QUORSYSLOG_VOL_FULL", "Fail to send notification",
-                     "Fail to send notification: QUORSYSLOG_ShareRename"}));
+    EXPECT_EQ(TakeSystemLogTexts(),
+              (Strings{"Fail to send notification: QUORSYSLOG_VOL_FULL", "Fail to send notification",
+                       "Fail to send notification: QUORSYSLOG_ShareRename"}));
     FakeNotices() = {};
     EXPECT_EQ(SyslogMailShareRename(nullptr), -1);
     EXPECT_EQ(SyslogMailSeverityExceeded(nullptr, "x"), -1);
@@ -71,25 +68,20 @@ TEST_F(Senders, ReportAFailedSendAndRefuseNull) {
 }
 
 TEST_F(Senders, GuardAndBoundLogContent) {
-    const struct {
-        std::string text;
-        size_t sent;
-        int manager;
-        int mail;
-    } cases[] = {
+    const std::tuple<std::string, size_t, int, int> cases[] = {
         {"x Failed to send email. y", 0, 0, 0}, {"Failed to send email." + std::string(4096, 'x'), 0, 0, -1},
         {"failed to send email.", 1, 0, 0},     {std::string(2047, 'x'), 1, 0, 0},
         {std::string(2048, 'x'), 0, -1, -1},    {std::string(1023, '"') + "x", 1, 0, 0},
         {std::string(1024, '\\'), 0, -1, -1},
     };
-    for (const auto& row : cases) {
+    for (const auto& [text, sent, manager, mail] : cases) {
         FakeNotices() = {};
-        EXPECT_EQ(manager_.NotificationSendSev("h", std::string("err"), row.text), row.manager) << row.text;
-        EXPECT_EQ(manager_.NotificationSendKeyword("h", "k", row.text), row.manager);
-        EXPECT_EQ(FakeNotices().sent.size(), 2 * row.sent) << row.text;
-        EXPECT_EQ(quor::test::TakeSystemLogTexts(), Lines(row.manager < 0 ? 2 : 0, "Not enough memory"));
-        EXPECT_EQ(SyslogMailSeverityExceeded("err", row.text.c_str()), row.mail) << row.text;
-        EXPECT_EQ(SyslogMailKeywordMatched("k", row.text.c_str()), row.mail);
+        EXPECT_EQ(manager_.NotificationSendSev("h", std::string("err"), text), manager) << text;
+        EXPECT_EQ(manager_.NotificationSendKeyword("h", "k", text), manager);
+        EXPECT_EQ(FakeNotices().sent.size(), 2 * sent) << text;
+        EXPECT_EQ(TakeSystemLogTexts(), Strings(manager < 0 ? 2 : 0, "Not enough memory"));
+        EXPECT_EQ(SyslogMailSeverityExceeded("err", text.c_str()), mail) << text;
+        EXPECT_EQ(SyslogMailKeywordMatched("k", text.c_str()), mail);
     }
 }
 

@@ -38,13 +38,10 @@ class Notices : public Notify {
 };
 
 TEST_F(Notices, ShowValuesAsTheyWereReceived) {
-    struct Case {
-        const char* text;
-        std::map<std::string, std::string> values;
-        const char* subject;
-        const char* body;
-    };
-    const std::vector<Case> cases{
+    using Values = std::map<std::string, std::string>;
+    const std::tuple<const char*, Values, const char*, const char*> cases[]{
+        // template, values, subject, body
+
         {"%A% of %\n\n100%%A%% %B\n", {{"%A%", "x"}}, "x of %", "100%x% %B\n"},
         {"S\r\n\r\nHost: %HOST%\r\nEnd", {}, "S", "End\n"},
         {"%NONE%s\nno blank line\n", {}, "s", "no blank line\n"},
@@ -54,12 +51,11 @@ TEST_F(Notices, ShowValuesAsTheyWereReceived) {
         {"%A%\n\n%A%\n", {{"%A%", "\xE9z"}}, "\xEF\xBF\xBDz", "\xEF\xBF\xBDz\n"},
     };
     Json::Value notice;
-    for (const Case& c : cases) {
-        SCOPED_TRACE(c.text);
-        folder_.write("T.txt", c.text);
-        notice = sent(c.values);
-        EXPECT_EQ(notice["subject"].asString(), c.subject);
-        EXPECT_EQ(notice["body"].asString(), c.body);
+    for (const auto& [text, values, subject, body] : cases) {
+        folder_.write("T.txt", text);
+        notice = sent(values);
+        EXPECT_EQ(notice["subject"].asString(), subject) << text;
+        EXPECT_EQ(notice["body"].asString(), body) << text;
     }
     EXPECT_EQ(notice["bodyBase64"].asString(), "6XoK");
 }
@@ -105,27 +101,24 @@ TEST_F(Notices, TheShippedFilesServeEveryTag) {
 TEST_F(Notices, KeepTheIntervalOfTheirTagAndHost) {
     const std::string filter = folder_.write("filter", "[T]\ninterval=\"60\"\n[M]\nchannels=\"mail\"\n");
     folder_.write("M.txt", "Subject\n");
-    struct Step {
-        time_t now;
-        std::string host;
-        int suppressed;  // of the notice that arrives; -1 when none does
-    };
     const std::string hostile = "\n../\x1b" + std::string(300, 'x');
-    const std::vector<Step> steps{{1000, "a", 0}, {1059, "a", -1},    {1059, "b", 0},
-                                  {1059, "", 0},  {1001, hostile, 0}, {1002, hostile, -1},
-                                  {1060, "a", 1}, {1061, "a", -1},    {500, "a", 1} /* the clock was set back */,
-                                  {559, "a", -1}, {560, "a", 1}};
-    for (const Step& step : steps) {
-        SCOPED_TRACE(step.now);
-        SetClock(step.now);
+    // The time, the host and what is counted as suppressed in the notice that arrives; -1 when none does.
+    const std::vector<std::tuple<time_t, std::string, int>> steps{
+        {1000, "a", 0}, {1059, "a", -1},    {1059, "b", 0},
+        {1059, "", 0},  {1001, hostile, 0}, {1002, hostile, -1},
+        {1060, "a", 1}, {1061, "a", -1},    {500, "a", 1} /* the clock was set back */,
+        {559, "a", -1}, {560, "a", 1}};
+    for (const auto& [now, host, suppressed] : steps) {
+        SCOPED_TRACE(now);
+        SetClock(now);
         const std::map<std::string, std::string> noHost;
-        const auto values = step.host.empty() ? noHost : decltype(noHost){{"%HOST%", step.host}};
-        if (step.suppressed < 0) {
+        const auto values = host.empty() ? noHost : decltype(noHost){{"%HOST%", host}};
+        if (suppressed < 0) {
             ASSERT_EQ(send(values, "T", filter), 0);
         } else {
             const Json::Value notice = sent(values, "T", filter);
-            EXPECT_EQ(notice["time"].asInt64(), step.now);
-            EXPECT_EQ(notice["suppressed"].asInt(), step.suppressed);
+            EXPECT_EQ(notice["time"].asInt64(), now);
+            EXPECT_EQ(notice["suppressed"].asInt(), suppressed);
         }
         ASSERT_EQ(send({}, "M", filter), 0) << "a channel that is not set up";
     }
@@ -196,20 +189,18 @@ TEST_F(Notices, TheDesktopSpoolIsTurnedOver) {
 }
 
 TEST_F(Notices, SettingsAreReadWithTheirDefaults) {
-    struct Case {
-        const char* text;
-        int security, port, verify, sms;
-    };
+    using Case = std::tuple<const char*, int, int, int, int>;
     QUORMAIL mail;
-    for (const Case& c : {Case{"sms_enabled=\"yes\"\n", 1, 587, 1, 1}, Case{"smtp_security=\"none\"\n", 0, 25, 1, 0},
-                          Case{"smtp_security=tls\nsmtp_tls_verify=no\n", 2, 465, 0, 0},
-                          Case{"smtp_security=\"word\"\nsmtp_port=\"70000\"\n", 1, 587, 1, 0}}) {
-        SCOPED_TRACE(c.text);
-        settings(c.text);
+    for (const auto& [text, security, port, verify, smsEnabled] :
+         {Case{"sms_enabled=\"yes\"\n", 1, 587, 1, 1}, Case{"smtp_security=\"none\"\n", 0, 25, 1, 0},
+          Case{"smtp_security=tls\nsmtp_tls_verify=no\n", 2, 465, 0, 0},
+          Case{"smtp_security=\"word\"\nsmtp_port=\"70000\"\n", 1, 587, 1, 0}}) {
+        SCOPED_TRACE(text);
+        settings(text);
         ASSERT_EQ(QUORMailGet(&mail), 0);
-        EXPECT_EQ(std::tie(mail.security, mail.port, mail.verify), std::tie(c.security, c.port, c.verify));
+        EXPECT_EQ(std::tie(mail.security, mail.port, mail.verify), std::tuple(security, port, verify));
         const std::unique_ptr<QUORSMSCONF, Releaser<QUORSmsConfFree>> sms(QUORSmsConfGet());
-        EXPECT_EQ(sms->enabled, c.sms);
+        EXPECT_EQ(sms->enabled, smsEnabled);
     }
     std::filesystem::remove(paths::kSystemSettings);
     EXPECT_LT(QUORMailGet(&mail), 0);

@@ -84,32 +84,23 @@ TEST_F(Database, OneStatementIsRunAndNothingBehindIt) {
 }
 
 TEST_F(Database, FailureLeavesTheErrorOnTheConnection) {
-    const struct {
-        const char* sql;
-        int code;
-        const char* text;
-    } cases[] = {
+    const std::tuple<const char*, int, const char*> cases[] = {
         {" -- nothing\n;", SQLITE_EMPTY, "empty statement"},
         {"SELECT * FROM absent", SQLITE_ERROR, "no such table: absent"},
         {"SELECT 'open", SQLITE_ERROR, "unrecognized token: \"'open\""},
         {"SELECT abs(-9223372036854775807 - 1)", SQLITE_ERROR, "integer overflow"},
         {"INSERT INTO t(id) VALUES(1)", SQLITE_CONSTRAINT, "UNIQUE constraint failed: t.id"},
     };
-    for (const auto& c : cases) {
-        EXPECT_LT(execute(c.sql), 0) << c.sql;
-        EXPECT_EQ(errorCode(), c.code) << c.sql;
-        EXPECT_STREQ(QUORDBErrorGet(connection_.get()), c.text);
+    for (const auto& [sql, code, text] : cases) {
+        EXPECT_LT(execute(sql), 0) << sql;
+        EXPECT_EQ(errorCode(), code) << sql;
+        EXPECT_STREQ(QUORDBErrorGet(connection_.get()), text);
     }
     EXPECT_EQ(execute("SELECT * FROM t"), 0);  // the connection is still good
 }
 
 TEST_F(Database, LimitStandsInFrontOfWhateverEndsTheText) {
-    const struct {
-        const char* sql;
-        unsigned int count;
-        unsigned int skip;
-        const char* names;
-    } cases[] = {
+    const std::tuple<const char*, unsigned int, unsigned int, const char*> cases[] = {
         {"SELECT name FROM t", 2, 0, "ab"},
         {"SELECT name FROM t;", 2, 1, "bc"},
         {"SELECT name FROM t -- to the end", 1, 1, "b"},
@@ -120,9 +111,9 @@ TEST_F(Database, LimitStandsInFrontOfWhateverEndsTheText) {
         {"SELECT name FROM t", 0, 2, "c"},
         {"SELECT name FROM t", UINT_MAX, UINT_MAX, ""},
     };
-    for (const auto& c : cases) {
-        EXPECT_EQ(selectLimit(c.sql, c.count, c.skip), 0) << c.sql;
-        EXPECT_EQ(names(), c.names) << c.sql << " " << c.count << " " << c.skip;
+    for (const auto& [sql, count, skip, expected] : cases) {
+        EXPECT_EQ(selectLimit(sql, count, skip), 0) << sql;
+        EXPECT_EQ(names(), expected) << sql << " " << count << " " << skip;
     }
     EXPECT_LT(selectLimit("SELECT name FROM t LIMIT 1", 2, 0), 0);
     EXPECT_LT(selectLimit("", 2, 0), 0);

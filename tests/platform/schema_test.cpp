@@ -17,10 +17,7 @@ class LogSchema : public ::testing::Test {
 
 TEST_F(LogSchema, SearchesGoTheWayThatWasMeasured) {
     SqliteFile reader(folder_.path("logs.db"));  // reads the statistics that the schema left
-    const struct {
-        const char* sql;
-        const char* plan;
-    } cases[] = {
+    const std::pair<const char*, const char*> cases[] = {
         {"SELECT * FROM logs WHERE (host = 'a') ORDER BY id desc LIMIT 50",
          "SEARCH logs USING INDEX logs_host_idx (host=?)"},
         {"SELECT * FROM logs WHERE (prog = 'a') AND (msg GLOB '*b*') ORDER BY id desc LIMIT 50",
@@ -30,8 +27,8 @@ TEST_F(LogSchema, SearchesGoTheWayThatWasMeasured) {
         {"SELECT COUNT(*) FROM logs WHERE (host = 'a')", "SEARCH logs USING COVERING INDEX logs_host_idx (host=?)"},
         {"SELECT prog FROM logs GROUP BY prog ORDER BY prog asc", "SCAN logs USING COVERING INDEX logs_prog_idx"},
     };
-    for (const auto& c : cases) {
-        EXPECT_EQ(reader.query(std::string("EXPLAIN QUERY PLAN ") + c.sql).at(3), c.plan) << c.sql;
+    for (const auto& [sql, plan] : cases) {
+        EXPECT_EQ(reader.query(std::string("EXPLAIN QUERY PLAN ") + sql).at(3), plan) << sql;
     }
     const auto code = reader.query("EXPLAIN SELECT DISTINCT host FROM logs");  // skips from one host to the next
     EXPECT_NE(std::find(code.begin(), code.end(), "SeekGT"), code.end());

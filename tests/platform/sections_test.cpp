@@ -46,10 +46,8 @@ class Sections : public testing::Test {
 };
 
 TEST_F(Sections, ReadsWhatPeopleWrite) {
-    const struct {
-        const char* text;
-        const char* value;  // of the key k in the section s
-    } cases[] = {
+    const std::pair<const char*, const char*> cases[] = {
+        // with the value of the key k in the section s
         {"[s]\nk=\"v\"\n", "v"},
         {"\xEF\xBB\xBF[s]\r\nk=\"v\"\r\n", "v"},
         {"[s]\n\t k  =  v w \t\n", "v w"},
@@ -65,8 +63,8 @@ TEST_F(Sections, ReadsWhatPeopleWrite) {
         {"[ s ]\n[]\n[S]\nk=v\n", "no section"},
         {"", "no section"},
     };
-    for (const auto& row : cases) {
-        EXPECT_EQ(value(folder_.write("file", row.text), "s", "k"), row.value) << row.text;
+    for (const auto& [text, expected] : cases) {
+        EXPECT_EQ(value(folder_.write("file", text), "s", "k"), expected) << text;
     }
     EXPECT_EQ(names(folder_.write("file", "[b]\n[a]c]\nx=1\n[b]\n[broken\n[]\n [ d]")), Strings({"b", "a]c", " d"}));
 }
@@ -147,16 +145,12 @@ TEST_F(Sections, KeepsModeAndLinkAndLeavesNoDraft) {
 
 TEST_F(Sections, KeyValueIsTheFirstInTheFileCutToFit) {
     const std::string file = folder_.write("file", "a=\"yes\"\n[s]\nb=first\n[t]\nb=second\n");
-    const struct {
-        const char* key;
-        int size;
-        int result;
-        const char* text;
-    } cases[] = {{"a", 16, 0, "yes"}, {"b", 16, 0, "first"}, {"b", 3, 0, "fi"}, {"c", 16, -1, "?"}, {"a", 0, -1, "?"}};
-    for (const auto& row : cases) {
+    const std::tuple<const char*, int, int, const char*> cases[] = {
+        {"a", 16, 0, "yes"}, {"b", 16, 0, "first"}, {"b", 3, 0, "fi"}, {"c", 16, -1, "?"}, {"a", 0, -1, "?"}};
+    for (const auto& [key, size, result, text] : cases) {
         char out[16] = "?";
-        EXPECT_EQ(QLIBCFileGetKeyValue(file.c_str(), row.key, out, row.size, 0), row.result) << row.key;
-        EXPECT_STREQ(out, row.text);
+        EXPECT_EQ(QLIBCFileGetKeyValue(file.c_str(), key, out, size, 0), result) << key;
+        EXPECT_STREQ(out, text);
     }
 }
 

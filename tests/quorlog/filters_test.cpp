@@ -24,12 +24,7 @@ FilterOptions with(std::string FilterOptions::*member, const std::string& value)
 }
 
 TEST(Filters, BecomeConditions) {
-    const struct {
-        std::string FilterOptions::*member;
-        const char* value;
-        const char* sql;
-        const char* literal;
-    } cases[] = {
+    const std::tuple<std::string FilterOptions::*, const char*, const char*, const char*> cases[] = {
         {&FilterOptions::host, "any", "", ""},
         {&FilterOptions::host, "a,O'Neil", "((host = 'a') OR (host = 'O''Neil'))", ""},
         {&FilterOptions::level, "crit+", "((llevel = 'emerg') OR (llevel = 'alert') OR (llevel = 'crit'))", ""},
@@ -43,20 +38,15 @@ TEST(Filters, BecomeConditions) {
         {&FilterOptions::from, "2026-01-02", "(ldate >= '2026-01-02')", ""},
         {&FilterOptions::to, "2026-01-02", "(ldate <= '2026-01-02')", ""},
     };
-    for (const auto& test : cases) {
-        SCOPED_TRACE(test.value);
-        const Filter filter = BuildFilter(with(test.member, test.value), "logs", 0);
-        EXPECT_EQ(sqlOf(filter.conditions), test.sql);
-        EXPECT_EQ(filter.literal, test.literal);
+    for (const auto& [member, value, sql, literal] : cases) {
+        const Filter filter = BuildFilter(with(member, value), "logs", 0);
+        EXPECT_EQ(sqlOf(filter.conditions), sql) << value;
+        EXPECT_EQ(filter.literal, literal) << value;
     }
 }
 
 TEST(Filters, ThatWouldMatchSomethingElseAreRefused) {
-    const struct {
-        std::string FilterOptions::*member;
-        const char* value;
-        const char* table;
-    } cases[] = {
+    const std::tuple<std::string FilterOptions::*, const char*, const char*> cases[] = {
         {&FilterOptions::host, "a,,b", "logs"},
         {&FilterOptions::host, "a,any", "logs"},
         {&FilterOptions::level, "warn", "logs"},
@@ -67,8 +57,8 @@ TEST(Filters, ThatWouldMatchSomethingElseAreRefused) {
         {&FilterOptions::level, "err", "transfer_log"},
         {&FilterOptions::keyword, "x", "transfer_log"},
     };
-    for (const auto& test : cases) {
-        EXPECT_THROW(BuildFilter(with(test.member, test.value), test.table, 0), Failure) << test.value;
+    for (const auto& [member, value, table] : cases) {
+        EXPECT_THROW(BuildFilter(with(member, value), table, 0), Failure) << value;
     }
     EXPECT_THROW(BuildFilter(with(&FilterOptions::glob, std::string(20000, '[')), "logs", 0), Failure);
     FilterOptions backwards = with(&FilterOptions::from, "2026-02-02");

@@ -41,8 +41,7 @@ std::string written(const Style& style, const std::vector<Cells>& rows) {
 Style styled(Format format, bool terminal = false) {
     Style style;
     style.format = format;
-    style.terminal = terminal;
-    style.color = terminal;
+    style.terminal = style.color = terminal;
     return style;
 }
 
@@ -95,25 +94,17 @@ TEST(Output, AFullDiskIsNoticed) {
     Output out(full);
     const auto sink = MakeSink(styled(Format::Ndjson), kColumns, out);
     const std::string message(100, 'm');
-    EXPECT_THROW(
-        {
-            for (int i = 0; i < 1000; ++i) {
-                sink->row({"1", "h", "err", message});
-            }
-        },
-        Failure);
+    const auto write = [&] {
+        for (int i = 0; i < 1000; ++i) {
+            sink->row({"1", "h", "err", message});
+        }
+    };
+    EXPECT_THROW(write(), Failure);
     close(full);
 }
 
-struct TextCase {
-    const char* name;
-    std::string text;
-    std::string visible;
-    size_t width;
-    std::string json;
-};
-
-const TextCase kTexts[] = {
+// A name; the text, as it is shown, that many columns wide, and in JSON.
+const std::tuple<const char*, std::string, std::string, size_t, std::string> kTexts[] = {
     {"quotes", R"(a"b\c)", R"(a"b\c)", 5, R"("a\"b\\c")"},
     {"line breaks", "a\r\n\tb", R"(a\r\n\tb)", 8, R"("a\r\n\tb")"},
     {"terminal escape", "\033[2J", R"(\x1b[2J)", 7, R"("\u001b[2J")"},
@@ -132,23 +123,20 @@ const TextCase kTexts[] = {
 };
 
 TEST(Text, IsShownAndEncodedWithoutAnythingRaw) {
-    for (const TextCase& test : kTexts) {
-        SCOPED_TRACE(test.name);
+    for (const auto& [name, text, shown, width, encoded] : kTexts) {
+        SCOPED_TRACE(name);
         std::string visible;
-        EXPECT_EQ(AppendVisible(visible, test.text), test.width);
-        EXPECT_EQ(visible, test.visible);
+        EXPECT_EQ(AppendVisible(visible, text), width);
+        EXPECT_EQ(visible, shown);
         std::string json;
-        AppendJsonString(json, test.text);
-        EXPECT_EQ(json, test.json);
+        AppendJsonString(json, text);
+        EXPECT_EQ(json, encoded);
     }
 }
 
 TEST(Text, CsvCellsAreQuotedAndFormulasDefused) {
-    const struct {
-        const char* text;
-        const char* plain;
-        const char* safe;
-    } cases[] = {
+    const std::tuple<const char*, const char*, const char*> cases[] = {
+        // text, plain, safe
         {"a b", "a b", "a b"},
         {"a,b", R"("a,b")", R"("a,b")"},
         {"a\nb", "\"a\nb\"", "\"a\nb\""},
@@ -158,13 +146,12 @@ TEST(Text, CsvCellsAreQuotedAndFormulasDefused) {
         {"'quoted'", "'quoted'", "''quoted'"},
         {"a=b", "a=b", "a=b"},
     };
-    for (const auto& test : cases) {
-        std::string plain;
-        std::string safe;
-        AppendCsvCell(plain, test.text, false);
-        AppendCsvCell(safe, test.text, true);
-        EXPECT_EQ(plain, test.plain);
-        EXPECT_EQ(safe, test.safe);
+    for (const auto& [text, plain, safe] : cases) {
+        for (const bool defuse : {false, true}) {
+            std::string cell;
+            AppendCsvCell(cell, text, defuse);
+            EXPECT_EQ(cell, defuse ? safe : plain);
+        }
     }
 }
 
