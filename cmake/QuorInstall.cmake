@@ -30,8 +30,6 @@ if(QUOR_BUILD_TOOLS)
             RENAME syslog-ng.conf COMPONENT tools)
     install(FILES ${etc}/quorinfo.conf.example DESTINATION ${CMAKE_INSTALL_DATADIR}/doc/quorsyslog/examples
             COMPONENT tools)
-    install(FILES ${etc}/systemd/quorlog-checkpoint.service ${etc}/systemd/quorlog-checkpoint.timer
-            DESTINATION lib/systemd/system COMPONENT tools)
     install(FILES ${etc}/systemd/syslog-ng-quorsyslog.conf DESTINATION lib/systemd/system/syslog-ng.service.d
             RENAME quorsyslog.conf COMPONENT tools)
     install(FILES docs/man/notify.conf.5 docs/man/notify.filter.5 docs/man/quorinfo.conf.5
