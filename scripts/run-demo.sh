@@ -74,7 +74,7 @@ start_syslog_ng() {
         etc/syslog-ng/quorsyslog.conf > "$conf/quorsyslog.conf"
     printf '@version: 3.38\n@include "%s"\n' "$conf/quorsyslog.conf" > "$conf/syslog-ng.conf"
     /usr/sbin/syslog-ng -F --no-caps -f "$conf/syslog-ng.conf" --persist-file "$root/run/syslog-ng.persist" \
-        --control "$root/run/syslog-ng.ctl" > "$root/syslog-ng.log" 2>&1 &
+        --control "$root/run/syslog-ng.ctl" --pidfile "$root/run/syslog-ng.pid" > "$root/syslog-ng.log" 2>&1 &
     children+=($!)
     echo $! > "$root/run/syslog-ng.pid"
     await "the start of syslog-ng on port $port" listening "$port"
