@@ -64,9 +64,9 @@ fuzz:           ## every fuzz target on its corpus and on new inputs, for FUZZ_S
 	scripts/fuzz.sh $(BUILD)/fuzz $(FUZZ_SECONDS)
 
 soak:           ## the real syslog-ng beside searchers, a deleter and a checkpointer, for ten minutes
-	scripts/install-deps.sh build run test
-	scripts/build.sh default
-	scripts/soak-database.sh $(BUILD)/default
+	scripts/install-deps.sh build run bench
+	scripts/build.sh bench
+	scripts/soak-database.sh $(BUILD)/bench
 
 release:
 	scripts/install-deps.sh build

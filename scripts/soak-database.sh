@@ -37,7 +37,7 @@ sender=$!
 for _ in $(seq 100); do [ "$(rows 'SELECT max(id) > 0 FROM logs')" = 1 ] && break; sleep 0.1; done
 
 status=0
-"$build/tests/soak/soak" "$db" "$seconds" "${3:-100000}" || status=1
+"$build/bench/soak/soak" "$db" "$seconds" "${3:-100000}" || status=1
 wait "$sender" || true
 sent=$(grep -o 'count=[0-9]*' "$folder/loggen.log" | grep -o '[0-9]*')  # it may send a few more than asked for
 for _ in $(seq 100); do [ "$(rows 'SELECT max(id) FROM logs')" = "$sent" ] && break; sleep 0.1; done
