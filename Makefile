@@ -61,7 +61,7 @@ docs:           ## check the manuals; the interface as HTML, in build/docs
 fuzz:           ## every fuzz target on its corpus and on new inputs, for FUZZ_SECONDS each
 	scripts/install-deps.sh build check
 	scripts/build.sh fuzz
-	scripts/fuzz.sh $(BUILD)/fuzz $(FUZZ_SECONDS)
+	scripts/fuzz.sh $(BUILD)/fuzz $(FUZZ_SECONDS) $(FUZZ_SEED)
 
 soak:           ## the real syslog-ng beside searchers, a deleter and a checkpointer, for ten minutes
 	scripts/install-deps.sh build run bench
