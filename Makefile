@@ -1,6 +1,7 @@
 # The commands of the project; see README.md. Each installs what it needs from Debian's packages.
 BUILD := build
 FUZZ_SECONDS := 60
+FUZZ_SEED := 0
 
 .PHONY: run test bench check format tidy asan fuzz soak powerpc package try-package linking docs release install clean
 
