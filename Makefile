@@ -7,8 +7,8 @@ FUZZ_SEED := 0
 
 run:            ## start the real receiving chain on loopback and show what it received
 	scripts/install-deps.sh build run
-	scripts/build.sh default
-	scripts/run-demo.sh $(BUILD)/default
+	scripts/build.sh run
+	scripts/run-demo.sh $(BUILD)/run
 
 test:           ## build and run the whole suite
 	scripts/install-deps.sh build run test
