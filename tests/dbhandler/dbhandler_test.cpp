@@ -1,26 +1,23 @@
 #include "dbhandler.h"
 
 #include "quor/quordb.h"
+#include "support/database.h"
 #include "support/db_spy.h"
-#include "support/testing.h"
 
 using namespace quor::test;
 
 namespace {
 
-class Handle : public testing::Test {
+class Handle : public DatabaseTest {
   protected:
     Handle() {
-        SqliteFile(path_).run("CREATE TABLE logs(utcsec); INSERT INTO logs VALUES(1), (2)");
+        run("CREATE TABLE logs(utcsec); INSERT INTO logs VALUES(1), (2)");
         SpyOnDb() = {};
-        TakeSystemLogTexts();
     }
     ~Handle() override { handle_.DBDiscon(); }
 
-    std::string count() { return SqliteFile(path_).query("SELECT count(*) FROM logs").front(); }
+    std::string count() const { return query("SELECT count(*) FROM logs").front(); }
 
-    const TempFolder folder_;
-    const std::string path_ = folder_.path("log.db");
     DBHandler handle_{path_, ""};
 };
 
@@ -31,97 +28,152 @@ int countRows(DBResult_tag* result, void* rows) {
 
 TEST_F(Handle, WorksWhileItIsConnected) {
     EXPECT_EQ(handle_.DBExecute("DELETE FROM logs"), -1);
-    EXPECT_EQ(TakeSystemLogTexts(), Strings()) << "only the callback form reports";
+    expectLog({});  // only the callback form reports
     EXPECT_EQ(handle_.DBWalCheckpoint(false), -1);
     EXPECT_EQ(handle_.DBExecute("DELETE FROM logs", nullptr, nullptr), -1);
     EXPECT_EQ(handle_.DBLogCountGet(), ~0ULL);
-    EXPECT_FALSE(handle_.isConnected());
     EXPECT_EQ(handle_.DBCon(), 0);
     EXPECT_EQ(handle_.DBCon(), -1);
-    EXPECT_TRUE(handle_.isConnected());
-    EXPECT_EQ(TakeSystemLogTexts(), Strings({"Fail to force WAL checkpoint(FULL)", "DB is not connected",
-                                             "DB is not connected", "Connection is already existed"}));
+    expectLog({"Fail to force WAL checkpoint(FULL)", "DB is not connected", "DB is not connected",
+               "Connection is already existed"});
     int rows = 0;
     EXPECT_EQ(handle_.DBExecute("SELECT * FROM logs", countRows, &rows), 0);
     EXPECT_EQ(rows, 2);
     EXPECT_EQ(handle_.DBExecute("SELECT * FROM logs", nullptr, nullptr), 0);
     EXPECT_EQ(handle_.DBExecute("SELECT * FROM nowhere", countRows, &rows), -1);
+    EXPECT_TRUE(handle_.isConnected());
     EXPECT_EQ(handle_.DBDiscon(), 0);
     EXPECT_FALSE(handle_.isConnected());
     EXPECT_EQ(handle_.DBDiscon(), 0);
 }
 
-TEST_F(Handle, TransactionsKeepTheirFlag) {
-    EXPECT_EQ(handle_.DBTranStart(), -1);
+TEST_F(Handle, KeepsTheFlagOfATransaction) {
+    // An operation, the statement that fails meanwhile; the flag, the rows that others see and the message then.
+    using Step = std::tuple<int (DBHandler::*)(), const char*, int, const char*, const char*>;
+    const auto start = &DBHandler::DBTranStart;
+    const auto end = &DBHandler::DBTranEnd;
+    const auto rollback = &DBHandler::DBTranRollback;
+    EXPECT_EQ(handle_.DBTranStart(), -1) << "not connected";
+    expectLog({"Fail to check sanity (DBTranStart)"});
     handle_.DBCon();
-    EXPECT_EQ(handle_.DBTranEnd(), -1);
-    EXPECT_EQ(handle_.DBTranRollback(), -1);
-    EXPECT_EQ(handle_.DBTranStart(), 0);
-    EXPECT_EQ(handle_.DBTranStart(), -1);
-    EXPECT_EQ(handle_.isInTran(), 1);
-    EXPECT_EQ(TakeSystemLogTexts(),
-              Strings({"Fail to check sanity (DBTranStart)", "Fail to check sanity (DBTranEnd)",
-                       "Fail to check sanity (DBTranRollback)", "Fail to check sanity (DBTranStart)"}));
-    handle_.DBExecute("DELETE FROM logs");
-    EXPECT_EQ(handle_.DBTranRollback(), 0);
-    EXPECT_EQ(handle_.isInTran(), 0);
-    EXPECT_EQ(count(), "2");
-    handle_.DBTranStart();
-    handle_.DBExecute("DELETE FROM logs");
-    EXPECT_EQ(handle_.DBTranEnd(), 0);
-    EXPECT_EQ(count(), "0");
-}
-
-TEST_F(Handle, FailedTransactionStatementsLeaveTheFlag) {
-    using Case = std::tuple<const char*, int (DBHandler::*)(), int, const char*>;
-    handle_.DBCon();
-    for (const auto& [statement, operation, flag, message] :
-         {Case{"BEGIN;", &DBHandler::DBTranStart, 0, "Fail to begin transaction"},
-          Case{"END;", &DBHandler::DBTranEnd, 1, "Fail to end transaction"},
-          Case{"ROLLBACK;", &DBHandler::DBTranRollback, 1, "Fail to rollback transaction"}}) {
-        SpyOnDb().failing = statement;
-        if (flag == 1 && handle_.isInTran() == 0) {
-            handle_.DBTranStart();
-        }
-        EXPECT_EQ((handle_.*operation)(), -1);
+    for (const auto& [operation, failing, flag, rows, message] : {
+             Step{end, "", 0, "2", "Fail to check sanity (DBTranEnd)"},
+             Step{rollback, "", 0, "2", "Fail to check sanity (DBTranRollback)"},
+             Step{start, "BEGIN;", 0, "2", "Fail to begin transaction"},
+             Step{start, "", 1, "2", ""},
+             Step{start, "", 1, "2", "Fail to check sanity (DBTranStart)"},
+             Step{rollback, "ROLLBACK;", 1, "2", "Fail to rollback transaction"},
+             Step{rollback, "", 0, "2", ""},
+             Step{start, "", 1, "2", ""},
+             Step{end, "END;", 1, "2", "Fail to end transaction"},
+             Step{end, "", 0, "0", ""},
+             Step{start, "", 1, "0", ""},
+         }) {
+        SpyOnDb().failing = failing;
+        const bool fails = *message != '\0';
+        EXPECT_EQ((handle_.*operation)(), fails ? -1 : 0);
         EXPECT_EQ(handle_.isInTran(), flag);
-        EXPECT_EQ(TakeSystemLogTexts(), Strings({message})) << "and nothing from the error handler";
+        expectLog(fails ? Strings{message} : Strings{});
+        if (flag == 1) {
+            handle_.DBExecute("DELETE FROM logs");
+        }
+        EXPECT_EQ(count(), rows);
     }
     handle_.DBDiscon();
     EXPECT_EQ(handle_.isInTran(), 1) << "disconnecting changed the flag";
 }
 
 TEST_F(Handle, EscapesCountsAndFindsTables) {
-    EXPECT_EQ(handle_.DBCmdEscape("''"), "''''");
-    EXPECT_EQ(handle_.DBCmdEscape("a'b\\\"%_"), "a''b\\\"%_");
+    EXPECT_EQ(handle_.DBCmdEscape("a'b\\\"%_''"), "a''b\\\"%_''''");
     handle_.DBCon();
     EXPECT_EQ(handle_.DBLogCountGet(), 2U);
     EXPECT_EQ(handle_.DBInfoCntGet(), 2U);
     EXPECT_EQ(handle_.DBcheckTableExist("logs"), 1);
     EXPECT_EQ(handle_.DBcheckTableExist("LOG"), 0);
-    EXPECT_EQ(TakeSystemLogTexts(), Strings());
+    expectLog({});
     EXPECT_EQ(handle_.DBcheckTableExist("x'; DROP TABLE logs; --"), 0);
-    EXPECT_EQ(TakeSystemLogTexts().back(),
-              "Fail to execute SQL command : SELECT count(*) as count_result FROM sqlite_master WHERE type='table' AND "
-              "name='x'; DROP TABLE logs; --'");
+    EXPECT_EQ(lastMessage(), "Fail to execute SQL command : SELECT count(*) as count_result FROM sqlite_master WHERE "
+                             "type='table' AND name='x'; DROP TABLE logs; --'");
     EXPECT_EQ(count(), "2");
 }
 
 TEST_F(Handle, ChecksPointsTheLogAndRemovesItsFiles) {
-    SqliteFile(path_).run("PRAGMA journal_mode=WAL");
+    run("PRAGMA journal_mode=WAL");
     handle_.DBCon();
     handle_.DBExecute("DELETE FROM logs WHERE utcsec = 1");
-    EXPECT_EQ(handle_.DBWalCheckpoint(false), 0);
-    EXPECT_TRUE(std::filesystem::exists(path_ + "-wal"));
-    EXPECT_EQ(handle_.DBWalCheckpoint(true), 0);
-    EXPECT_FALSE(std::filesystem::exists(path_ + "-wal"));
-    EXPECT_FALSE(std::filesystem::exists(path_ + "-shm"));
+    for (const bool remove : {false, true}) {
+        EXPECT_EQ(handle_.DBWalCheckpoint(remove), 0);
+        EXPECT_NE(std::filesystem::exists(path_ + "-wal"), remove);
+        EXPECT_NE(std::filesystem::exists(path_ + "-shm"), remove);
+    }
     handle_.DBDiscon();
     EXPECT_EQ(count(), "1");
     SpyOnDb().failing = "wal_checkpoint(FULL);";
     handle_.DBCon();
     EXPECT_EQ(handle_.DBWalCheckpoint(true), -1);
-    EXPECT_EQ(TakeSystemLogTexts(), Strings({"Fail to force WAL checkpoint(FULL)"}));
+    expectLog({"Fail to force WAL checkpoint(FULL)"});
+}
+
+class Metadata : public DatabaseTest {
+  protected:
+    ~Metadata() override { handle_.DBDiscon(); }
+
+    const std::string schema_ = folder_.write(
+        "schema.sql", "CREATE TABLE logs(utcsec INTEGER); CREATE TABLE db_info(id, start_time INTEGER, end_time,"
+                      " log_count, device); INSERT INTO db_info VALUES(1, 0, 0, '18446744073709551615', NULL);");
+    const std::string new_ = folder_.path("a b/c d/log.db");
+    DBHandler handle_{new_, schema_};
+};
+
+TEST_F(Metadata, AMissingDatabaseIsCreatedFromTheSchema) {
+    ASSERT_EQ(handle_.DBCon(), 0);
+    EXPECT_EQ(SqliteFile(new_).query("PRAGMA journal_mode"), Strings({"wal"}));
+    EXPECT_EQ(handle_.DBcheckTableExist("db_info"), 1);
+    const std::string path = folder_.write("file", "") + "/log.db";
+    EXPECT_EQ(DBHandler(path, schema_).DBCon(), -1);
+    expectLog({"create database: " + new_ + " by " + schema_, "Fail to create folder: " + folder_.path("file"),
+               "Fail to create database: " + path});
+    EXPECT_EQ(DBHandler(path_, folder_.path("none.sql")).DBCreate(), 0) << "the shell ran";
+}
+
+TEST_F(Metadata, TheInfoRowIsReadAndWritten) {
+    ASSERT_EQ(handle_.DBCon(), 0);
+    EXPECT_EQ(handle_.DBInfoStartSet(1000), 0);
+    EXPECT_EQ(handle_.DBInfoEndSet(18446744073709551615ULL), 0);
+    EXPECT_EQ(handle_.DBInfoDevSet(handle_.DBCmdEscape("O'Neil")), 0);
+    EXPECT_EQ(SqliteFile(new_).query("SELECT typeof(start_time), end_time FROM db_info"),
+              Strings({"integer", "18446744073709551615"}));
+    _ARCH_DB_INFO_tag info;
+    ASSERT_EQ(handle_.DBInfoGet(info), 0);
+    EXPECT_EQ(info.start_time, 1000);
+    EXPECT_EQ(info.end_time, 2147483647) << "times are read as 32 bits, saturated";
+    EXPECT_EQ(info.log_count, 18446744073709551615ULL);
+    EXPECT_EQ(info.device, "O'Neil");
+
+    EXPECT_EQ(handle_.DBInfoDevSet("x'; DELETE FROM db_info; --"), -1);
+    EXPECT_EQ(lastMessage(), "Fail to execute SQL command: UPDATE db_info SET device='x'; DELETE FROM db_info; --' "
+                             "WHERE id=1");
+    SqliteFile(new_).run("DROP TABLE db_info");
+    EXPECT_EQ(handle_.DBInfoGet(info), -1);
+    EXPECT_EQ(info.start_time, 1000) << "a failure left the record untouched";
+}
+
+TEST_F(Metadata, TimesComeFromTheLogs) {
+    setenv("TZ", "UTC-3", 1);
+    tzset();
+    ASSERT_EQ(handle_.DBCon(), 0);
+    TakeSystemLog();
+    EXPECT_EQ(handle_.DBInfoStartStrGet(), "1970-01-01");
+    EXPECT_EQ(handle_.DBInfoEndStrGet(), "1970-01-01");
+    expectLog({"Fail to get database start time", "Fail to get database end time"});
+    handle_.DBExecute("INSERT INTO logs VALUES(1767222000), (1767214800), (4294967296)");  // 23:00, 21:00 in UTC
+    EXPECT_EQ(handle_.DBLogStartTimeGet(), 1767214800);
+    EXPECT_EQ(handle_.DBInfoEndGet(), 2147483647) << "saturated too";
+    EXPECT_EQ(handle_.DBInfoStartStrGet(), "2026-01-01") << "a local date";
+    handle_.DBExecute("DROP TABLE logs");
+    expectLog({});
+    EXPECT_EQ(handle_.DBLogStartTimeGet(), 0);
+    EXPECT_NE(lastMessage().rfind("Fail to execute SQL command: ", 0), 0U) << "not reported without the table";
 }
 
 }  // namespace

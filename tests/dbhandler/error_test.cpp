@@ -1,15 +1,15 @@
 #include <syslog.h>
 
 #include "dbhandler.h"
+#include "support/database.h"
 #include "support/notices.h"
 #include "support/services.h"
-#include "support/testing.h"
 
 using namespace quor::test;
 
 namespace {
 
-class Failure : public testing::Test {
+class Failure : public DatabaseTest {
   protected:
     Failure() {
         FakeNotices() = {};
@@ -26,12 +26,12 @@ class Failure : public testing::Test {
         return TakeSystemLog();
     }
 
-    // That line, with that priority and part of its text.
-    void expectLine(const std::string& sql, int priority, const char* text) {
+    // So many, the last one with that priority and part of its text.
+    void expectLines(const std::string& sql, size_t count, int priority, const char* text) {
         const auto lines = linesOf(sql);
-        ASSERT_EQ(lines.size(), 1U);
-        EXPECT_EQ(lines[0].priority, priority) << lines[0].text;
-        EXPECT_NE(lines[0].text.find(text), std::string::npos) << lines[0].text;
+        ASSERT_EQ(lines.size(), count);
+        EXPECT_EQ(lines.back().priority, priority) << lines.back().text;
+        EXPECT_NE(lines.back().text.find(text), std::string::npos) << lines.back().text;
     }
 
     void overwrite(std::streamoff at, const std::string& bytes) const {
@@ -39,37 +39,31 @@ class Failure : public testing::Test {
         file.seekp(at);
         file << bytes;
     }
-
-    const TempFolder folder_;
-    const std::string path_ = folder_.path("log.db");
 };
 
 TEST_F(Failure, IsAnErrorOrInformation) {
-    SqliteFile(path_).run("CREATE TABLE other(x)");
-    expectLine("SELEC 1", LOG_ERR,
-               "dbhandler:125 Fail to execute SQL command: SELEC 1, error code is : 1, error cause: near \"SELEC\": "
-               "syntax error");
-    SqliteFile(path_).run("CREATE TABLE logs(x UNIQUE); INSERT INTO logs VALUES(1)");
-    expectLine("SELECT 1; DROP TABLE logs", LOG_INFO, "error code is : 1, ");
-    expectLine("INSERT INTO logs VALUES(1)", LOG_ERR, "error code is : 19, ");
+    run("CREATE TABLE other(x)");
+    expectLines("SELEC 1", 1, LOG_ERR,
+                "dbhandler:125 Fail to execute SQL command: SELEC 1, error code is : 1, error cause: near \"SELEC\": "
+                "syntax error");
+    run("CREATE TABLE logs(x UNIQUE); INSERT INTO logs VALUES(1)");
+    expectLines("SELECT 1; DROP TABLE logs", 1, LOG_INFO, "error code is : 1, ");
+    expectLines("INSERT INTO logs VALUES(1)", 1, LOG_ERR, "error code is : 19, ");
     {
         SqliteFile other(path_);
         other.run("BEGIN EXCLUSIVE");
-        expectLine("INSERT INTO logs VALUES(2)", LOG_INFO, "error code is : 5, error cause: database is locked");
+        expectLines("INSERT INTO logs VALUES(2)", 1, LOG_INFO, "error code is : 5, error cause: database is locked");
     }
     overwrite(47, "\x09");  // a schema format of the future: every statement fails with code 1, the table check too
-    const auto lines = linesOf("SELECT 1 FROM logs");
-    ASSERT_EQ(lines.size(), 3U);
-    EXPECT_NE(lines[2].text.find("SELECT 1 FROM logs"), std::string::npos);
-    EXPECT_EQ(lines[2].priority, LOG_ERR);
+    expectLines("SELECT 1 FROM logs", 3, LOG_ERR, "SELECT 1 FROM logs");
     folder_.write("log.db", std::string(8192, 'x'));
-    expectLine("SELECT 1 FROM logs", LOG_INFO, "error code is : 26, ");
+    expectLines("SELECT 1 FROM logs", 1, LOG_INFO, "error code is : 26, ");
     EXPECT_TRUE(FakeNotices().sent.empty());
     EXPECT_TRUE(std::filesystem::exists(path_));
 }
 
 TEST_F(Failure, OfACorruptDatabaseMovesItAsideAfterTheNotice) {
-    SqliteFile(path_).run("CREATE TABLE logs(msg); INSERT INTO logs VALUES(zeroblob(100000))");
+    run("CREATE TABLE logs(msg); INSERT INTO logs VALUES(zeroblob(100000))");
     overwrite(4096, std::string(80000, '\x77'));  // every page after the first
     folder_.write("log.db.corrupt", "older");
     bool stillThere = false;
@@ -96,7 +90,7 @@ TEST_F(Failure, OfOneStepOfTheRecoveryLeavesTheOthers) {
     FakeNotices().fail = true;
     EXPECT_EQ(DBErrorHandle_SQLITE_CORRUPT(nullptr, folder_.write("log.db", "x")), -1);
     EXPECT_TRUE(std::filesystem::exists(path_ + ".corrupt"));
-    EXPECT_EQ(TakeSystemLog().back().text, "dbhandler:88 Fail to send HUP signal to syslog-ng");
+    EXPECT_EQ(lastMessage(), "dbhandler:88 Fail to send HUP signal to syslog-ng");
 }
 
 }  // namespace

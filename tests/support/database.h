@@ -1,0 +1,29 @@
+// A fresh folder with one database that the code under test and the test itself open.
+#ifndef TESTS_SUPPORT_DATABASE_H
+#define TESTS_SUPPORT_DATABASE_H
+
+#include "support/testing.h"
+
+namespace quor::test {
+
+class DatabaseTest : public testing::Test {
+  protected:
+    DatabaseTest() { TakeSystemLog(); }
+
+    void run(const std::string& sql) const { SqliteFile(path_).run(sql); }
+    Strings query(const std::string& sql) const { return SqliteFile(path_).query(sql); }
+
+    // Nothing else was written since the last look.
+    static void expectLog(const Strings& lines) { EXPECT_EQ(TakeSystemLogTexts(), lines); }
+    static std::string lastMessage() {
+        const Strings lines = TakeSystemLogTexts();
+        return lines.empty() ? "" : lines.back();
+    }
+
+    const TempFolder folder_;
+    std::string path_ = folder_.path("log.db");
+};
+
+}  // namespace quor::test
+
+#endif
