@@ -1,5 +1,6 @@
 #include "accounting.h"
 
+#include <algorithm>
 #include <random>
 
 #include "support/clock.h"
@@ -14,6 +15,7 @@ using Histogram = std::vector<std::pair<std::string, unsigned long long>>;
 namespace paths = quor::paths;
 
 const std::string kDb = paths::kAccountingDb;
+
 class Accounting : public testing::Test {
   protected:
     void SetUp() override {
@@ -22,7 +24,7 @@ class Accounting : public testing::Test {
         std::filesystem::remove(paths::kEventDb);
         WriteFile(paths::kNotifyRules, "");
         FakeNotices() = {};
-        at(1000);
+        SetClock(1000);
     }
 
     // The package's database, and more.
@@ -31,16 +33,14 @@ class Accounting : public testing::Test {
         SqliteFile(kDb).run(sql);
     }
 
-    static void at(int64_t now) { SetClock(now); }
-
     // Closes one sample of one log for each device, at `now` + 1. Whole only when the last one was closed at `now`, or
     // with a single log: the second log of another second closes a sample itself.
     static void sample(AccountingManager& accounting, int64_t now, const Strings& devices) {
-        at(now);
+        SetClock(now);
         for (const std::string& device : devices) {
             accounting.LogInc(device);
         }
-        at(now + 1);
+        SetClock(now + 1);
         accounting.CurEpsUpdate();
     }
 
@@ -63,7 +63,7 @@ struct Model {
     int64_t stamp = 0;
     Strings rows;
 
-    void log(int64_t now, const std::string& device) {
+    void update(int64_t now) {
         if (now != stamp && eps != 0) {
             stamp = now;
             for (const auto& [name, count] : open) {
@@ -72,15 +72,18 @@ struct Model {
             open.clear();
             eps = 0;
         }
+    }
+
+    void log(int64_t now, const std::string& device) {
+        update(now);
         ++open[device];
         ++eps;
-        bool known = false;
-        for (auto& row : histogram) {
-            row.second += row.first == device ? 1 : 0;
-            known = known || row.first == device;
-        }
-        if (!known) {
+        const auto row = std::find_if(histogram.begin(), histogram.end(),
+                                      [&device](const auto& known) { return known.first == device; });
+        if (row == histogram.end()) {
             histogram.emplace_back(device, 1);
+        } else {
+            ++row->second;
         }
     }
 };
@@ -96,11 +99,16 @@ TEST_F(Accounting, CountsAsAWalkOfTheHistogramWould) {
     int64_t now = 1000;
     for (unsigned long long i = 1; i <= 3000; ++i) {
         now += random() % 10 == 0 ? static_cast<int64_t>(random() % 3) - 1 : 0;  // the clock may go back
-        at(now);
+        SetClock(now);
         std::string device = (random() % 4 == 0 ? "D" : "d") + std::to_string(random() % 12);
         device += random() % 6 == 0 ? std::string(1, '\0') : "";
         model.log(now, device);
         accounting.LogInc(device);
+        if (random() % 20 == 0) {
+            SetClock(++now);
+            model.update(now);
+            accounting.CurEpsUpdate();
+        }
         ASSERT_EQ(accounting.CurrentEpsGet(), model.eps);
         ASSERT_EQ(accounting.TotalCountGet(), i);
     }
@@ -112,29 +120,13 @@ TEST_F(Accounting, CountsAsAWalkOfTheHistogramWould) {
     EXPECT_EQ(rows(), model.rows);
 }
 
-TEST_F(Accounting, TheFirstLogOfAnIdleSpellClosesNothing) {
-    AccountingManager accounting;
-    accounting.LogInc("a");
-    accounting.LogInc("a");  // the stamp is still 0, so this closes a sample of one log
-    EXPECT_EQ(accounting.CurrentEpsGet(), 1U);
-    at(1001);
-    accounting.CurEpsUpdate();
-    at(1002);
-    accounting.CurEpsUpdate();
-    EXPECT_EQ(accounting.CurrentEpsGet(), 0U);
-    accounting.LogInc("b");
-    EXPECT_EQ(accounting.CurrentEpsGet(), 1U);
-    EXPECT_EQ(accounting.AccoutingFlush2DB(), 0);
-    EXPECT_EQ(rows(), (Strings{"1000", "a", "1", "1001", "a", "1"}));
-}
-
 TEST_F(Accounting, AFlushIsDueMoreThanFiveSecondsAfterTheLastQuestion) {
     AccountingManager accounting;
     const std::pair<int64_t, bool> questions[] = {{100, true},         {103, false},      {108, false},
                                                   {114, true},         {50, false},       {0x7ffffffd, true},
                                                   {0x80000001, false}, {0x80000007, true}};
     for (const auto& [now, due] : questions) {
-        at(now);
+        SetClock(now);
         EXPECT_EQ(accounting.isNeed2Flush(), due) << now;
     }
 }
@@ -175,53 +167,49 @@ TEST_F(Accounting, DestructionWritesAndTheNextStartReadsBack) {
     EXPECT_EQ(rows(), (Strings{"1001", "it's", "1", "1002", "b", "1", "1002", "it's", "1", "1003", "b", "1"}));
 }
 
-TEST_F(Accounting, AFailedSampleKeepsTheOnesBeforeIt) {
-    create("CREATE TRIGGER t BEFORE INSERT ON eps WHEN NEW.device = 'b' BEGIN SELECT RAISE(ABORT, 'no'); END");
-    AccountingManager accounting;
-    sample(accounting, 1000, {"a"});
-    sample(accounting, 1001, {"b"});
-    TakeSystemLogTexts();
-    EXPECT_EQ(accounting.AccoutingFlush2DB(), -1);
-    EXPECT_EQ(TakeSystemLogTexts().back(),
-              "Fail to execute SQL command: INSERT INTO eps VALUES(NULL, '1002', 'b', '1');");
-    EXPECT_EQ(rows(), (Strings{"1001", "a", "1"}));
-    EXPECT_EQ(SqliteFile(kDb).query("SELECT device FROM histogram"), Strings{});
-    SqliteFile(kDb).run("DROP TRIGGER t");
-    EXPECT_EQ(accounting.AccoutingFlush2DB(), 0);
-    EXPECT_EQ(rows(), (Strings{"1001", "a", "1", "1001", "a", "1", "1002", "b", "1"}));
-}
-
-TEST_F(Accounting, AFailedHistogramUndoesTheSamples) {
-    create("ALTER TABLE histogram RENAME TO aside");
-    AccountingManager accounting;
-    sample(accounting, 1000, {"a"});
-    TakeSystemLogTexts();
-    EXPECT_EQ(accounting.AccoutingFlush2DB(), -1);
-    const Strings messages = TakeSystemLogTexts();
-    ASSERT_GE(messages.size(), 2U);
-    EXPECT_EQ(Strings(messages.end() - 2, messages.end()),
-              (Strings{"Fail to execute SQL command: INSERT OR REPLACE INTO histogram VALUES(NULL, 'a', 1);",
-                       "Fail to check sanity (DBTranEnd)"}));
-    EXPECT_EQ(rows(), Strings{});
-    SqliteFile(kDb).run("ALTER TABLE aside RENAME TO histogram");
-    EXPECT_EQ(accounting.AccoutingFlush2DB(), 0);
-    EXPECT_EQ(rows(), (Strings{"1001", "a", "1"}));
+TEST_F(Accounting, AFailedSampleKeepsTheOnesBeforeItAFailedHistogramNone) {
+    const std::tuple<const char*, const char*, const char*, Strings> cases[] = {
+        {"CREATE TRIGGER t BEFORE INSERT ON eps WHEN NEW.device = 'b' BEGIN SELECT RAISE(ABORT, 'no'); END",
+         "DROP TRIGGER t",
+         "INSERT INTO eps VALUES(NULL, '1002', 'b', '1');",
+         {"1001", "a", "1"}},
+        {"ALTER TABLE histogram RENAME TO aside",
+         "ALTER TABLE aside RENAME TO histogram",
+         "INSERT OR REPLACE INTO histogram VALUES(NULL, 'a', 1);",
+         {}},
+    };
+    for (const auto& [damage, repair, statement, kept] : cases) {
+        SetUp();
+        create(damage);
+        AccountingManager accounting;
+        sample(accounting, 1000, {"a"});
+        sample(accounting, 1001, {"b"});
+        TakeSystemLogTexts();
+        EXPECT_EQ(accounting.AccoutingFlush2DB(), -1);
+        const Strings messages = TakeSystemLogTexts();
+        EXPECT_EQ(
+            std::count(messages.begin(), messages.end(), std::string("Fail to execute SQL command: ") + statement), 1)
+            << statement;
+        EXPECT_EQ(rows(), kept);
+        SqliteFile(kDb).run(repair);
+        EXPECT_EQ(accounting.AccoutingFlush2DB(), 0);
+        Strings all = kept;
+        all.insert(all.end(), {"1001", "a", "1", "1002", "b", "1"});
+        EXPECT_EQ(rows(), all);
+    }
 }
 
 TEST_F(Accounting, OldSamplesGoOnceTheFileIsLarge) {
-    SqliteFile db(kDb);
     create("INSERT INTO eps VALUES (NULL, 1000, 'old', 1), (NULL, strftime('%s', 'now') - 3600, 'recent', 1);"
            "CREATE TABLE filler (data BLOB); INSERT INTO filler VALUES (zeroblob(5200000))");
-    std::filesystem::resize_file(kDb, 5242880);
     AccountingManager accounting;
-    const auto devices = [&db] { return db.query("SELECT DISTINCT device FROM eps ORDER BY device"); };
-    sample(accounting, 1000, {"new"});
-    ASSERT_EQ(accounting.AccoutingFlush2DB(), 0);
-    EXPECT_EQ(devices(), (Strings{"new", "old", "recent"}));
-    std::filesystem::resize_file(kDb, 5242881);
-    sample(accounting, 1001, {"new"});
-    ASSERT_EQ(accounting.AccoutingFlush2DB(), 0);
-    EXPECT_EQ(devices(), Strings{"recent"});  // the new samples carry stamps of the test's clock
+    // The new samples carry stamps of the test's clock.
+    for (const auto& [size, left] : {std::pair(5242880, Strings{"new", "old", "recent"}), {5242881, {"recent"}}}) {
+        std::filesystem::resize_file(kDb, static_cast<uintmax_t>(size));
+        sample(accounting, 1000 + size % 2, {"new"});
+        ASSERT_EQ(accounting.AccoutingFlush2DB(), 0);
+        EXPECT_EQ(SqliteFile(kDb).query("SELECT DISTINCT device FROM eps ORDER BY device"), left);
+    }
 }
 
 TEST_F(Accounting, FailsWhereTheDatabaseIsNoFile) {
@@ -230,7 +218,7 @@ TEST_F(Accounting, FailsWhereTheDatabaseIsNoFile) {
     EXPECT_EQ(accounting.AccoutingFlush2DB(), 0);
     EXPECT_FALSE(std::filesystem::exists(kDb)) << "nothing to write";
     std::filesystem::create_directories(kDb);
-    at(1001);
+    SetClock(1001);
     accounting.CurEpsUpdate();
     TakeSystemLogTexts();
     EXPECT_EQ(accounting.AccoutingFlush2DB(), -1);
@@ -246,9 +234,9 @@ TEST_F(Accounting, TrimForgetsTheOldestSamples) {
     sample(accounting, 1001, {"a", "b"});
     sample(accounting, 1002, {"a", "b"});
     sample(accounting, 1003, {"c"});
-    EXPECT_EQ(accounting.EpsListTrim(5), 1U);
-    EXPECT_EQ(accounting.EpsListTrim(5), 0U);
-    EXPECT_EQ(accounting.EpsListTrim(2), 2U);
+    for (const auto& [most, forgotten] : {std::pair(5U, 1U), {5U, 0U}, {2U, 2U}}) {
+        EXPECT_EQ(accounting.EpsListTrim(most), forgotten);
+    }
     EXPECT_EQ(accounting.AccoutingFlush2DB(), 0);
     EXPECT_EQ(rows(), (Strings{"1004", "c", "1"}));
     EXPECT_EQ(SqliteFile(kDb).query("SELECT sum(count) FROM histogram"), Strings{"6"});
