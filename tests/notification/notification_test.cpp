@@ -14,6 +14,10 @@ _SYSLOG_NOTIFY_RULES_tag rule(const std::string& name, int type, int pri, int64_
     return {name, type, static_cast<_SYSLOG_DB_PRIORITY_tag>(pri), eps, pattern, enable};
 }
 
+auto fields(const _SYSLOG_NOTIFY_RULES_tag& r) {
+    return std::tie(r.name, r.notify_type, r.notify_pri, r.notify_eps, r.notify_pat, r.notify_enable);
+}
+
 class Rules : public testing::Test {
   protected:
     // The package's own rule file is not there.
@@ -42,28 +46,23 @@ TEST_F(Rules, ReadBackAsTheyWereWritten) {
         ASSERT_EQ(SyslogNotifyConfSet(file_, "not used", wanted), 0);
         _SYSLOG_NOTIFY_RULES_tag found;
         ASSERT_EQ(SyslogNotifyConfGet(file_, wanted.name, found), 0);
-        const auto fields = [](const _SYSLOG_NOTIFY_RULES_tag& r) {
-            return std::tie(r.name, r.notify_type, r.notify_pri, r.notify_eps, r.notify_pat, r.notify_enable);
-        };
         EXPECT_EQ(fields(found), fields(wanted));
     }
+}
+
+TEST_F(Rules, AreWrittenWholeOrReported) {
     folder_.write("notify.conf", "");
     _SYSLOG_NOTIFY_RULES_tag negative = rule("r", -2, 4, -1, "p");
     ASSERT_EQ(SyslogNotifyConfSet(file_, "r", negative), 0);
-    EXPECT_EQ(ReadFile(file_),
-              "[r]\nnotify_type=\"18446744073709551614\"\nnotify_eps=\"18446744073709551615\"\nnotify_pri=\"4\"\n"
-              "notify_pat=\"p\"\nnotify_enable=\"1\"\n");
-}
-
-TEST_F(Rules, WhatCannotBeWrittenIsReported) {
-    folder_.write("notify.conf", "[r]\n");
     for (_SYSLOG_NOTIFY_RULES_tag bad : {rule("r", 0, 0, 0, "a\n[evil]"), rule("r", 0, 0, 0, std::string("a\0b", 3)),
                                          rule("", 0, 0, 0, "a"), rule(std::string("r\0s", 3), 0, 0, 0, "a")}) {
         TakeSystemLogTexts();
         EXPECT_EQ(SyslogNotifyConfSet(file_, "r", bad), -1);
         EXPECT_EQ(TakeSystemLogTexts(), Strings{"utils:139 Fail set section to file"});
     }
-    EXPECT_EQ(ReadFile(file_), "[r]\n");
+    EXPECT_EQ(ReadFile(file_),
+              "[r]\nnotify_type=\"18446744073709551614\"\nnotify_eps=\"18446744073709551615\"\nnotify_pri=\"4\"\n"
+              "notify_pat=\"p\"\nnotify_enable=\"1\"\n");
 }
 
 TEST_F(Rules, OddValuesReadButAMissingKeyFails) {
@@ -78,11 +77,9 @@ TEST_F(Rules, OddValuesReadButAMissingKeyFails) {
         const bool complete = missing == keys.size();
         _SYSLOG_NOTIFY_RULES_tag found = rule("before", 2, 4, 9, "before");
         EXPECT_EQ(SyslogNotifyConfGet(folder_.write("notify.conf", text), "r", found), complete ? 0 : -1) << text;
-        EXPECT_EQ(found.name, complete ? "r" : "before");
-        EXPECT_EQ(found.notify_type, complete ? 0 : 2);
-        EXPECT_EQ(static_cast<int32_t>(found.notify_pri), complete ? INT32_MAX : 4);
-        EXPECT_EQ(found.notify_eps, complete ? -5 : 9);
-        EXPECT_EQ(found.notify_enable, !complete);
+        const _SYSLOG_NOTIFY_RULES_tag wanted =
+            complete ? rule("r", 0, INT32_MAX, -5, "", false) : rule("before", 2, 4, 9, "before");
+        EXPECT_EQ(fields(found), fields(wanted)) << text;
         EXPECT_EQ(TakeSystemLogTexts(), complete ? Strings{} : Strings{"utils:85 Fail to do QLIBCFileGetSection"});
     }
 }
@@ -143,6 +140,85 @@ TEST(IsNotificationSet, AsksEveryChannelUntilOneCannotBeRead) {
         EXPECT_EQ(service.smsLent, 0) << settings;
     }
     std::filesystem::remove(quor::paths::kSystemSettings);
+}
+
+using Values = std::map<std::string, std::string>;
+
+class Senders : public testing::Test {
+  protected:
+    Senders() {
+        FakeNotices() = {};
+        TakeSystemLog();
+    }
+
+    NotificationManager manager_;
+};
+
+TEST_F(Senders, FillThePlaceholdersOfTheirTemplates) {
+    _SYSLOG_LOG_DATA_tag log;
+    log.msg = "a\"b\\c\n%HOST%";
+    int failures = manager_.NotificationSendSev("h\"", SYSLOG_PRIORITY_ERR, log);
+    failures += manager_.NotificationSendKeyword("h", "k\"", log);
+    failures += manager_.NotificationSendEps(UINT64_MAX);
+    failures += manager_.NotificationSendVolFull("s\"");
+    failures += SyslogMailSeverityExceeded("m\"", log.msg.c_str()) + SyslogMailKeywordMatched("m", log.msg.c_str());
+    failures += SyslogMailShareRemove("1") + SyslogMailShareRename("2");
+    failures += SyslogMailShareEncMount("3") + SyslogMailShareEncUnmount("4");
+    EXPECT_EQ(failures, 0);
+
+    const std::pair<const std::string, std::string> escaped{"%SYSLOG_CONTENT%", "a\\\"b\\\\c\n%HOST%"};
+    const std::pair<const std::string, std::string> desktop{"DESKTOP_NOTIFY_CLASSNAME", "QUOR.KVX.Orvane.Instance"};
+    const std::vector<std::pair<std::string, Values>> wanted{
+        {"QUORSYSLOG_SEV_EXCEED", {desktop, {"%HOST%", "h\""}, {"%SEV%", "err"}, escaped}},
+        {"QUORSYSLOG_KEYWORD_MATCH", {desktop, {"%HOST%", "h"}, {"%KEYWORD%", "k\""}, escaped}},
+        {"QUORSYSLOG_EPS_EXCEED", {desktop, {"%EPS%", "18446744073709551615"}}},
+        {"QUORSYSLOG_VOL_FULL", {desktop, {"%SHARED_FOLDER%", "s\""}}},
+        {"QUORSYSLOG_SEV_EXCEED", {{"%SEV%", "m\""}, escaped}},
+        {"QUORSYSLOG_KEYWORD_MATCH", {{"%KEYWORD%", "m"}, escaped}},
+        {"QUORSYSLOG_ShareRemove", {{"%SHARED_FOLDER%", "1"}}},
+        {"QUORSYSLOG_ShareRename", {{"%SHARED_FOLDER%", "2"}}},
+        {"QUORSYSLOG_ShareEncMount", {{"%SHARED_FOLDER%", "3"}}},
+        {"QUORSYSLOG_ShareEncUnmount", {{"%SHARED_FOLDER%", "4"}}},
+    };
+    std::vector<std::pair<std::string, Values>> sent;
+    for (const Notice& notice : FakeNotices().sent) {
+        sent.emplace_back(notice.tag, notice.values);
+        EXPECT_EQ(notice.textsDir, quor::paths::kNotifyTexts);
+        EXPECT_EQ(notice.filterFile, quor::paths::kNotifyFilter);
+    }
+    EXPECT_EQ(sent, wanted);
+}
+
+TEST_F(Senders, ReportAFailedSendAndRefuseNull) {
+    FakeNotices().fail = true;
+    EXPECT_EQ(manager_.NotificationSendVolFull("s"), -1);
+    EXPECT_EQ(SyslogMailShareRename("s"), -1);
+    EXPECT_EQ(TakeSystemLogTexts(),
+              (Strings{"Fail to send notification: QUORSYSLOG_VOL_FULL", "Fail to send notification",
+                       "Fail to send notification: QUORSYSLOG_ShareRename"}));
+    FakeNotices() = {};
+    EXPECT_EQ(SyslogMailShareRename(nullptr), -1);
+    EXPECT_EQ(SyslogMailSeverityExceeded(nullptr, "x"), -1);
+    EXPECT_EQ(SyslogMailKeywordMatched("k", nullptr), -1);
+    EXPECT_TRUE(FakeNotices().sent.empty());
+}
+
+TEST_F(Senders, GuardAndBoundLogContent) {
+    const std::tuple<std::string, size_t, int, int> cases[] = {
+        {"x Failed to send email. y", 0, 0, 0}, {"Failed to send email." + std::string(4096, 'x'), 0, 0, -1},
+        {"failed to send email.", 1, 0, 0},     {std::string(2047, 'x'), 1, 0, 0},
+        {std::string(2048, 'x'), 0, -1, -1},    {std::string(1023, '"') + "x", 1, 0, 0},
+        {std::string(1024, '\\'), 0, -1, -1},
+    };
+    for (const auto& [text, sent, manager, mail] : cases) {
+        FakeNotices() = {};
+        EXPECT_EQ(manager_.NotificationSendSev("h", std::string("err"), text), manager) << text;
+        EXPECT_EQ(manager_.NotificationSendKeyword("h", "k", text), manager);
+        EXPECT_EQ(FakeNotices().sent.size(), 2 * sent) << text;
+        EXPECT_EQ(TakeSystemLogTexts(), Strings(manager < 0 ? 2 : 0, "Not enough memory"));
+        EXPECT_EQ(SyslogMailSeverityExceeded("err", text.c_str()), mail) << text;
+        EXPECT_EQ(SyslogMailKeywordMatched("k", text.c_str()), mail);
+    }
 }
 
 }  // namespace
