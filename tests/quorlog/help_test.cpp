@@ -29,34 +29,25 @@ void collect(const CLI::App& app, const std::string& path, Commands& commands) {
     }
 }
 
-Commands commands() {
-    CLI::App app;
-    int status = 0;
-    quor::cli::AddCommands(app, status);
-    Commands found;
-    collect(app, "", found);
-    return found;
-}
-
 std::set<std::string> wordsOf(const std::string& text) {
     std::istringstream stream(text);
     return {std::istream_iterator<std::string>(stream), {}};
 }
 
-TEST(Help, CompletionOffersWhatTheProgramHas) {
+TEST(Help, CompletionAndManualHaveWhatTheProgramHas) {
     const std::string script = ReadFile(SOURCE_FOLDER "/etc/bash-completion/quorlog");
-    for (const auto& [command, words] : commands()) {
+    const std::string manual = ReadFile(SOURCE_FOLDER "/docs/man/quorlog.1");
+    CLI::App app;
+    int status = 0;
+    quor::cli::AddCommands(app, status);
+    Commands commands;
+    collect(app, "", commands);
+    for (const auto& [command, words] : commands) {
         const std::string start = "\n    '" + command + "') words='";
         const size_t at = script.find(start);
         ASSERT_NE(at, std::string::npos) << command;
         const size_t begin = at + start.size();
         EXPECT_EQ(wordsOf(script.substr(begin, script.find('\'', begin) - begin)), words) << command;
-    }
-}
-
-TEST(Help, ManualDescribesWhatTheProgramHas) {
-    const std::string manual = ReadFile(SOURCE_FOLDER "/docs/man/quorlog.1");
-    for (const auto& [command, words] : commands()) {
         EXPECT_TRUE(command.empty() || manual.find(" Cm " + command + "\n") != std::string::npos) << command;
         for (const std::string& word : words) {
             const bool option = word.front() == '-';

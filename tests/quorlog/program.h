@@ -22,7 +22,7 @@ class Program : public testing::Test {
         const char* arguments;
         int status;
         const char* out;
-        const char* err;  // a part of it
+        const char* err = "";  // a part of it
     };
 
     // `arguments` as a shell reads them.
@@ -33,12 +33,15 @@ class Program : public testing::Test {
         return {WEXITSTATUS(status), ReadFile(folder_.path("out")), ReadFile(folder_.path("err"))};
     }
 
-    void expect(std::initializer_list<Case> cases) const {
+    // `options` end the arguments of each case that does not name a database.
+    void expect(std::initializer_list<Case> cases, const std::string& options = "") const {
         for (const Case& test : cases) {
-            const Outcome outcome = run(test.arguments);
-            EXPECT_EQ(outcome.status, test.status) << test.arguments << outcome.err;
-            EXPECT_EQ(outcome.out, test.out) << test.arguments;
-            EXPECT_NE(outcome.err.find(test.err), std::string::npos) << test.arguments << outcome.err;
+            const std::string arguments = test.arguments;
+            const Outcome outcome = run(arguments + (arguments.find("--db") == std::string::npos ? options : ""));
+            EXPECT_EQ(outcome.status, test.status) << arguments << outcome.err;
+            EXPECT_EQ(outcome.out, test.out) << arguments;
+            const size_t message = test.status == 2 ? outcome.err.find("quorlog: ") : 0;
+            EXPECT_NE(outcome.err.find(test.err, message), std::string::npos) << arguments << outcome.err;
         }
     }
 

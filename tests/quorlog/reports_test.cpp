@@ -16,14 +16,13 @@ TEST_F(Reports, StatisticsCountAndRate) {
                            "(3, 1767225604, 'b', 2), (4, 1767312000, 'a', 1)");
     database("empty.db").run("CREATE TABLE histogram(id, device, count)");
     expect({
-        {"stats total --db acc.db", 0, "count  30\n", ""},
-        {"stats device --db acc.db \"O'Neil\" --format ndjson", 0, "{\"device\":\"O'Neil\",\"count\":7}\n", ""},
+        {"stats total --db acc.db", 0, "count  30\n"},
+        {"stats device --db acc.db \"O'Neil\" --format ndjson", 0, "{\"device\":\"O'Neil\",\"count\":7}\n"},
         {"stats device --db acc.db \"x' OR 'a\"", 1, "device  x' OR 'a\ncount   0\n", "no log was counted"},
-        {"stats top --limit 3 --db acc.db", 0, "COUNT  DEVICE\n    9  b\n    9  c\n    7  O'Neil\n", ""},
+        {"stats top --limit 3 --db acc.db", 0, "COUNT  DEVICE\n    9  b\n    9  c\n    7  O'Neil\n"},
         {"stats eps --from 2026-01-01 --to 2026-01-01 --format ndjson --db acc.db", 0,
          "{\"stamp\":1767225600,\"logs\":6,\"seconds\":null,\"per_second\":null}\n"
-         "{\"stamp\":1767225604,\"logs\":3,\"seconds\":4,\"per_second\":0.75}\n",
-         ""},
+         "{\"stamp\":1767225604,\"logs\":3,\"seconds\":4,\"per_second\":0.75}\n"},
         {"stats eps --db acc.db --last 5s", 1, "", "no sample from"},
         {"stats eps --db acc.db --last 5w", 2, "", "give 90s, 10m, 6h or 2d"},
         {"stats top --db empty.db", 1, "", "no log was counted"},
@@ -38,13 +37,13 @@ TEST_F(Reports, ValuesAndNamesOfALogDatabase) {
     database("old.db").run("CREATE TABLE db_info(id); CREATE TABLE hosts(host_id, host_name);"
                            "INSERT INTO hosts VALUES(3, 'x'), (7, 'y')");
     expect({
-        {"values host --db log.db", 0, "a\\n\nb\n", ""},
-        {"values host --db log.db --limit 1 --offset 1 --format csv", 0, "host\r\nb\r\n", ""},
-        {"values id --db log.db --format ndjson --limit 1", 0, "{\"id\":\"1\"}\n", ""},
+        {"values host --db log.db", 0, "a\\n\nb\n"},
+        {"values host --db log.db --limit 1 --offset 1 --format csv", 0, "host\r\nb\r\n"},
+        {"values id --db log.db --format ndjson --limit 1", 0, "{\"id\":\"1\"}\n"},
         {"values 'host FROM logs;--' --db log.db", 2, "", "has no column"},
         {"values ip --db log.db", 2, "", "no such column: ip"},
-        {"names host --db log.db --format csv", 0, "key,name\r\n0,b\r\n1,\"a\n\"\r\n", ""},
-        {"names host --db old.db --format csv", 0, "key,name\r\n3,x\r\n7,y\r\n", ""},
+        {"names host --db log.db --format csv", 0, "key,name\r\n0,b\r\n1,\"a\n\"\r\n"},
+        {"names host --db old.db --format csv", 0, "key,name\r\n3,x\r\n7,y\r\n"},
     });
 }
 
@@ -56,9 +55,9 @@ TEST_F(Reports, EventsAreListedExportedAndCleared) {
     database("it's.db").run("CREATE TABLE log(id INTEGER PRIMARY KEY, level INTEGER, time INTEGER, user, event)");
     expect({
         {"events list --limit 1 --db log.db", 0,
-         "ID  TIME                 LEVEL    USER  EVENT\n 2  2026-01-01T00:00:01  Warning  x&y   full\n", ""},
+         "ID  TIME                 LEVEL    USER  EVENT\n 2  2026-01-01T00:00:01  Warning  x&y   full\n"},
         {"events list --offset 1 --format ndjson --db log.db", 0,
-         "{\"id\":1,\"time\":1767225600,\"level\":\"Information\",\"user\":\"SYSTEM\",\"event\":\"<b>\"}\n", ""},
+         "{\"id\":1,\"time\":1767225600,\"level\":\"Information\",\"user\":\"SYSTEM\",\"event\":\"<b>\"}\n"},
         {"events html none/page --db log.db", 2, "", "none/page: No such file"},
         {"events clear --db log.db", 2, "", "give --yes"},
         {"events clear --yes --db \"it's.db\"", 2, "", "apostrophe"},
@@ -81,23 +80,22 @@ TEST_F(Reports, RulesAreSetListedAndTested) {
     std::filesystem::remove(rules);
     expect({
         {"rules list", 1, "", "no rule is set"},
-        {"rules set worst --level crit", 0, "set rule worst: severity crit\n", ""},
-        {"rules set many --eps 50", 0, "set rule many: eps 50\n", ""},
-        {"rules set word --keyword 'a \"b\" 100%'", 0, "set rule word: keyword a \"b\" 100%\n", ""},
-        {"rules set many --disable", 0, "set rule many: eps 50, disabled\n", ""},
+        {"rules set worst --level crit", 0, "set rule worst: severity crit\n"},
+        {"rules set many --eps 50", 0, "set rule many: eps 50\n"},
+        {"rules set word --keyword 'a \"b\" 100%'", 0, "set rule word: keyword a \"b\" 100%\n"},
+        {"rules set many --disable", 0, "set rule many: eps 50, disabled\n"},
         {"rules set other", 2, "", "give --level, --eps or --keyword"},
         {"rules set 'x]' --eps 1", 2, "", "cannot be used"},
         {"rules set x --keyword 'a\nb=\"c\"'", 2, "", "line break"},
         {"rules set x --level fatal", 2, "", "--level"},
         {"rules list --format csv", 0,
          "name,type,threshold,enabled\r\nworst,severity,crit,yes\r\nmany,eps,50,no\r\n"
-         "word,keyword,\"a \"\"b\"\" 100%\",yes\r\n",
-         ""},
+         "word,keyword,\"a \"\"b\"\" 100%\",yes\r\n"},
         {"rules test --level alert --eps 99 --format csv", 0,
-         "type,given,notifies,keyword\r\nseverity,alert,yes,\r\neps,99,no,\r\n", ""},
+         "type,given,notifies,keyword\r\nseverity,alert,yes,\r\neps,99,no,\r\n"},
         {"rules test --message 'so a \"b\" 100% x' --format csv --safe-csv", 0,
-         "type,given,notifies,keyword\r\nkeyword,\"so a \"\"b\"\" 100% x\",yes,\"a \"\"b\"\" 100%\"\r\n", ""},
-        {"rules test --level info", 1, "TYPE      GIVEN  NOTIFIES  KEYWORD\nseverity  info   no\n", ""},
+         "type,given,notifies,keyword\r\nkeyword,\"so a \"\"b\"\" 100% x\",yes,\"a \"\"b\"\" 100%\"\r\n"},
+        {"rules test --level info", 1, "TYPE      GIVEN  NOTIFIES  KEYWORD\nseverity  info   no\n"},
     });
     const std::string all = ReadFile(rules);
     WriteFile(rules, all.substr(0, all.find("[many")) + "[half]\nnotify_type=\"1\"\n");
