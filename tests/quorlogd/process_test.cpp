@@ -1,16 +1,89 @@
+// quorlogd as a process: fed, signalled and read like the real one.
+#include <fcntl.h>
+#include <sys/wait.h>
+
+#include <csignal>
 #include <random>
 
+#include "common/guards.h"
 #include "dbutil.h"
-#include "process.h"
+#include "support/testing.h"
 
 using namespace quor::test;
 namespace paths = quor::paths;
 
 namespace {
 
-std::string entry(const std::string& host, const std::string& message, const std::string& prio = "info") {
-    return "local0 " + prio + " 2026-11-21 05:15:54 1795238154 1795238154 +00:00 " + host + " 10.0.0.1 kernel 84 " +
-           message + "\n";
+class Quorlogd {
+  public:
+    // `options` as a shell reads them.
+    explicit Quorlogd(const std::string& options = "") {
+        int ends[2];
+        if (pipe2(ends, O_CLOEXEC) != 0) {
+            throw std::runtime_error("no pipe for the test");
+        }
+        const quor::Descriptor output(ends[0]);
+        input_ = quor::Descriptor(ends[1]);
+        const std::string command =
+            "exec " QUORLOGD " --stderr " + options + " >/dev/null 2>>" + folder_.path("messages");
+        pid_ = fork();
+        if (pid_ == 0) {
+            dup2(output.get(), STDIN_FILENO);
+            execl("/bin/sh", "sh", "-c", command.c_str(), nullptr);
+            _exit(127);
+        }
+    }
+    Quorlogd(const Quorlogd&) = delete;
+    Quorlogd& operator=(const Quorlogd&) = delete;
+    ~Quorlogd() {
+        if (pid_ > 0) {
+            endOf(SIGKILL);
+        }
+    }
+
+    // Until it is gone.
+    void send(std::string_view text) {
+        for (ssize_t written = 0; !text.empty() && written >= 0;) {
+            written = write(input_.get(), text.data(), text.size());
+            text.remove_prefix(static_cast<size_t>(std::max<ssize_t>(written, 0)));
+        }
+    }
+    void signal(int number) const {
+        if (pid_ > 0) {
+            kill(pid_, number);
+        }
+    }
+    // The exit status after a signal or the end of the input, or -1 when it was killed.
+    int endOf(int number) {
+        signal(number);
+        int status = 0;
+        waitpid(std::exchange(pid_, -1), &status, 0);
+        return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+    }
+    int endOfInput() {
+        input_ = quor::Descriptor();
+        return endOf(0);
+    }
+
+    std::string messages() const { return ReadFile(folder_.path("messages")); }
+    // Whether a message holds `text` some seconds from now at the latest, asked for by a signal when one is given.
+    bool says(const std::string& text, int number = 0) const {
+        return Eventually([&] {
+            signal(number);
+            return messages().find(text) != std::string::npos;
+        });
+    }
+    bool started() const { return says("Started: "); }  // and answers signals
+    bool takes(int lines) const { return says("Statistics: " + std::to_string(lines) + " lines", SIGUSR1); }
+
+  private:
+    TempFolder folder_;
+    quor::Descriptor input_;
+    pid_t pid_ = -1;
+};
+
+std::string entry(const std::string& host, const std::string& message) {
+    return "local0 info 2026-11-21 05:15:54 1795238154 7 +00:00 " + host + " 10.0.0.1 kernel 84 " + message + "\n";
 }
 
 std::string entries(const std::string& host, int count) {
@@ -55,10 +128,6 @@ class QuorlogdProcess : public testing::Test {
             return countOf(device) == count;
         });
     }
-    // Until statistics that are asked for tell of so many lines.
-    static bool takes(const Quorlogd& daemon, int lines) {
-        return daemon.saysWhenAsked(SIGUSR1, "Statistics: " + std::to_string(lines) + " lines");
-    }
 };
 
 TEST_F(QuorlogdProcess, AccountsTheInputUpToItsEnd) {
@@ -69,8 +138,7 @@ TEST_F(QuorlogdProcess, AccountsTheInputUpToItsEnd) {
         daemon.send({&c, 1});
     }
     daemon.send(std::string_view(text).substr(300, text.size() - 301));
-    daemon.closeInput();
-    EXPECT_EQ(daemon.waitForExit(), 0);
+    EXPECT_EQ(daemon.endOfInput(), 0);
     EXPECT_EQ(countOf("router1"), 3U);
     EXPECT_EQ(countOf("router2"), 1U);
     EXPECT_TRUE(daemon.says("5 lines, 1 bad, 1 oversized, 2 devices, 0 notices,")) << daemon.messages();
@@ -83,10 +151,9 @@ TEST_F(QuorlogdProcess, AnswersSignals) {
         Quorlogd daemon;
         ASSERT_TRUE(daemon.started());
         daemon.send(entries("router1", 5));
-        EXPECT_TRUE(takes(daemon, 5)) << daemon.messages();
+        EXPECT_TRUE(daemon.takes(5)) << daemon.messages();
         daemon.send(entries("router1", 2));
-        daemon.signal(last);
-        EXPECT_EQ(daemon.waitForExit(), 0);
+        EXPECT_EQ(daemon.endOf(last), 0);
         EXPECT_EQ(countOf("router1"), last == SIGTERM ? 7U : 14U);  // the second reads back what the first wrote
     }
 }
@@ -98,13 +165,12 @@ TEST_F(QuorlogdProcess, FollowsItsRulesAfterHup) {
     Quorlogd daemon("--max-notices 2");
     ASSERT_TRUE(daemon.started());
     daemon.send(entry("router1", "it's down"));
-    EXPECT_TRUE(takes(daemon, 1));
+    EXPECT_TRUE(daemon.takes(1));
     WriteFile(paths::kNotifyRules, keywordRule("it's"));
     daemon.signal(SIGHUP);
     daemon.send(entry("router1", "it's down again") + entry("router2", "it is not") + entry("router2", "it's < down") +
                 entry("router3", "it's too much"));
-    daemon.closeInput();
-    EXPECT_EQ(daemon.waitForExit(), 0);
+    EXPECT_EQ(daemon.endOfInput(), 0);
     EXPECT_TRUE(daemon.says("2 notices, 1 notices suppressed")) << daemon.messages();
     const std::string event = "Event detection: Received log which contains [it's]. Log content: ";
     const Strings all = events();
@@ -129,7 +195,7 @@ TEST_F(QuorlogdProcess, KeepsWhatADatabaseDoesNotTake) {
         locked.run("BEGIN EXCLUSIVE");
         daemon.send(entries("router1", 4));
         // There is nothing to write before the second has passed.
-        EXPECT_TRUE(daemon.saysWhenAsked(SIGUSR2, "Accounting is kept in memory")) << daemon.messages();
+        EXPECT_TRUE(daemon.says("Accounting is kept in memory", SIGUSR2)) << daemon.messages();
     }
     EXPECT_TRUE(writes(daemon, "router1", 7));
     EXPECT_EQ(SqliteFile(paths::kAccountingDb).query("SELECT sum(eps) FROM eps"), Strings{"7"});
@@ -143,8 +209,7 @@ TEST_F(QuorlogdProcess, KeepsWhatADatabaseDoesNotTake) {
     // Not a database at all: it stays, and so do the counts in memory.
     WriteFile(paths::kAccountingDb, std::string(40960, 'x'));
     daemon.send(entries("router1", 1));
-    daemon.signal(SIGTERM);
-    EXPECT_EQ(daemon.waitForExit(), 0);
+    EXPECT_EQ(daemon.endOf(SIGTERM), 0);
     EXPECT_EQ(ReadFile(paths::kAccountingDb), std::string(40960, 'x'));
 }
 
@@ -159,8 +224,7 @@ TEST_F(QuorlogdProcess, LeavesSoundDatabasesWhenKilled) {
             daemon.send(entries("router" + std::to_string(random() % 100), 20));
             daemon.signal(SIGUSR2);
         }
-        daemon.signal(SIGKILL);
-        EXPECT_EQ(daemon.waitForExit(), -1);
+        EXPECT_EQ(daemon.endOf(SIGKILL), -1);
         for (const char* path : {paths::kAccountingDb, paths::kEventDb}) {
             if (std::filesystem::exists(path)) {
                 EXPECT_EQ(SqliteFile(path).query("PRAGMA integrity_check"), Strings{"ok"}) << path;
@@ -170,8 +234,7 @@ TEST_F(QuorlogdProcess, LeavesSoundDatabasesWhenKilled) {
     const unsigned long long before = countOf("last");
     Quorlogd daemon;
     daemon.send(entries("last", 3));
-    daemon.closeInput();
-    EXPECT_EQ(daemon.waitForExit(), 0);
+    EXPECT_EQ(daemon.endOfInput(), 0);
     EXPECT_EQ(countOf("last"), before + 3);
 }
 
@@ -180,15 +243,14 @@ TEST_F(QuorlogdProcess, RaisesAFullVolumeOnce) {
     EXPECT_TRUE(Eventually([] { return std::filesystem::exists(paths::kEventDb) && events().size() >= 2; }));
     daemon.send("not an entry\n");
     EXPECT_TRUE(daemon.says("1 lines were not log entries")) << "no other check";
-    daemon.closeInput();
-    EXPECT_EQ(daemon.waitForExit(), 0);
+    EXPECT_EQ(daemon.endOfInput(), 0);
     EXPECT_EQ(events().size(), 3U);
     EXPECT_EQ(events()[1], "Volume space is not enough.");
 }
 
 TEST_F(QuorlogdProcess, RefusesWrongOptions) {
     for (const auto& [option, status] : {std::pair("--flush-interval=1", 2), {"--nonsense", 2}, {"--help", 0}}) {
-        EXPECT_EQ(Quorlogd(option).waitForExit(), status) << option;
+        EXPECT_EQ(Quorlogd(option).endOf(0), status) << option;
     }
     EXPECT_FALSE(std::filesystem::exists(paths::kEventDb));
 }
