@@ -162,24 +162,19 @@ TEST(Salvage, RefusesAndLeavesNothing) {
     const std::string text = folder.write("text", std::string(9999, 'x'));
     const std::string fresh = folder.path("fresh.db");
     const auto giveUp = [](unsigned long long, unsigned long long, void*) { return 1; };
-    const struct {
-        const char* damaged;
-        const char* fresh;
-        QUORSALVAGEPROGRESS progress;
-        const char* reason;
-    } cases[] = {
-        {path.c_str(), path.c_str(), nullptr, "new file"},
-        {path.c_str(), folder.path().c_str(), nullptr, "new file"},
+    const std::tuple<const char*, std::string, QUORSALVAGEPROGRESS, const char*> cases[] = {
+        {path.c_str(), path, nullptr, "new file"},
+        {path.c_str(), folder.path(), nullptr, "new file"},
         {path.c_str(), "/nonexistent/fresh.db", nullptr, "new file"},
-        {path.c_str(), fresh.c_str(), giveUp, "given up"},
-        {text.c_str(), fresh.c_str(), nullptr, "cannot be read"},
-        {folder.path().c_str(), fresh.c_str(), nullptr, "cannot be read"},
-        {nullptr, fresh.c_str(), nullptr, "two files"},
+        {path.c_str(), fresh, giveUp, "given up"},
+        {text.c_str(), fresh, nullptr, "cannot be read"},
+        {folder.path().c_str(), fresh, nullptr, "cannot be read"},
+        {nullptr, fresh, nullptr, "two files"},
     };
-    for (const auto& each : cases) {
+    for (const auto& [damaged, into, progress, reason] : cases) {
         QUORSALVAGE report;
-        EXPECT_EQ(QUORDBSalvage(each.damaged, each.fresh, nullptr, each.progress, nullptr, &report), -1);
-        EXPECT_NE(std::string(report.error).find(each.reason), std::string::npos) << report.error;
+        EXPECT_EQ(QUORDBSalvage(damaged, into.c_str(), nullptr, progress, nullptr, &report), -1);
+        EXPECT_NE(std::string(report.error).find(reason), std::string::npos) << report.error;
         EXPECT_FALSE(std::filesystem::exists(fresh) || std::filesystem::exists(fresh + ".partial"));
     }
 }
