@@ -11,31 +11,10 @@ constexpr const char kAbsentPort[] = "9";  // nothing listens there
 
 class Delivery : public Notify {
   protected:
-    // What servers.py keeps of a mail: sessions, sender, recipients, login, header names, defects, subject; the body.
-    struct Mail {
-        Strings lines;
-        std::string body;
-    };
-    static Mail mailOf(std::string record) {
-        Mail mail;
-        for (int i = 0; i < 7; ++i) {
-            const size_t end = record.find('\n');
-            mail.lines.push_back(record.substr(0, end));
-            record.erase(0, end == std::string::npos ? end : end + 1);
-        }
-        mail.body = record;
-        return mail;
-    }
-
     static double secondsOf(const std::function<void()>& work) {
         const auto begin = std::chrono::steady_clock::now();
         work();
         return std::chrono::duration<double>(std::chrono::steady_clock::now() - begin).count();
-    }
-
-    static size_t openDescriptors() {
-        const std::filesystem::directory_iterator entries("/proc/self/fd");
-        return static_cast<size_t>(std::distance(begin(entries), end(entries)));
     }
 };
 
@@ -44,25 +23,23 @@ TEST_F(Delivery, MailsCarryWhatWasReceivedAndNoHeaderOfItsMaking) {
     settings(mailTo(server.port(), "smtp_sender=\"log@example.com\"\n"));
     folder_.write("T.txt", "About %KEYWORD%\n\n%SYSLOG_CONTENT%\n");
     const std::string longWord = "k\xC3\xA4\xE2\x82\xAC" + std::string(100, 'y') + "\xF0\x9F\x98\x80";
-    struct Case {
-        std::string keyword, content, subject, body;
-    };
-    const std::vector<Case> cases{
+    // keyword, content, subject, body
+    const std::tuple<std::string, std::string, std::string, std::string> cases[]{
         {"x", "a\\\"b\\\\c\t\x1b[2J .\r\n.\r\nQUIT", "About x", "a\"b\\c\t\x1b[2J .\r\n.\r\nQUIT"},
         {"x\r\nBcc: evil@example.com\r\n\r\n", "caf\xC3\xA9", "About x  Bcc: evil@example.com    ", "caf\xC3\xA9"},
         {longWord, "caf\xE9 \xFF\xC3\xA9", "About " + longWord, "caf\xE9 \xFF\xC3\xA9"},
         {"=?UTF-8?B?eA==?=", "", "About =?UTF-8?B?eA==?=", ""},
     };
-    for (size_t i = 0; i < cases.size(); ++i) {
-        ASSERT_EQ(send({{"%KEYWORD%", cases[i].keyword}, {"%SYSLOG_CONTENT%", cases[i].content}}), 0);
-        const Mail mail = mailOf(server.received(static_cast<int>(i) + 1));
-        EXPECT_EQ(mail.lines[1], "log@example.com");
-        EXPECT_EQ(mail.lines[2], "one@example.com,two@example.com");
-        EXPECT_EQ(mail.lines[4], "auto-submitted,content-transfer-encoding,content-type,date,from,message-id,"
-                                 "mime-version,subject,to");
-        EXPECT_EQ(mail.lines[5], "0");
-        EXPECT_EQ(mail.lines[6], cases[i].subject);
-        EXPECT_EQ(mail.body, cases[i].body + "\n");
+    int mails = 0;
+    for (const auto& [keyword, content, subject, body] : cases) {
+        ASSERT_EQ(send({{"%KEYWORD%", keyword}, {"%SYSLOG_CONTENT%", content}}), 0);
+        // Sessions at a time, sender, recipients, login, header names, defects, subject.
+        EXPECT_EQ(server.received(++mails),
+                  (Strings{"1", "log@example.com", "one@example.com,two@example.com", "-",
+                           "auto-submitted,content-transfer-encoding,content-type,date,from,message-id,mime-version,"
+                           "subject,to",
+                           "0", subject}));
+        EXPECT_EQ(server.body(mails), body + "\n");
     }
 }
 
@@ -89,9 +66,9 @@ TEST_F(Delivery, EncryptedMailLogsInAndChecksTheCertificate) {
         with("");
         EXPECT_NE(systemLog(1)[0].find("Failed to send email."), std::string::npos);
         with("smtp_ca_file=\"" + certificate + "\"\n");
-        EXPECT_EQ(mailOf(server.received(1)).lines[3], "user");
+        EXPECT_EQ(server.received(1)[3], "user");
         with("smtp_tls_verify=\"no\"\n");
-        EXPECT_NE(server.received(2).find("verify"), std::string::npos);
+        EXPECT_NE(server.received(2)[0], "") << "not verified";
     }
 }
 
@@ -123,9 +100,8 @@ TEST_F(Delivery, OneUnknownRecipientCostsNobodyTheMailWhichCountsWhatWasHeldBack
         SetClock(now);
         ASSERT_EQ(send({}, "T", filter), 0);
     }
-    const std::string both = server.received(1) + server.received(2);
-    EXPECT_EQ(mailOf(both).lines[2], "two@example.com");
-    EXPECT_NE(both.find("held back: 1\n"), std::string::npos);
+    EXPECT_EQ(server.received(1)[2] + server.received(2)[2], "two@example.comtwo@example.com");
+    EXPECT_NE((server.body(1) + server.body(2)).find("held back: 1\n"), std::string::npos);
 }
 
 TEST_F(Delivery, WebhooksGetValidJsonAndTellTheirFailures) {
@@ -135,8 +111,8 @@ TEST_F(Delivery, WebhooksGetValidJsonAndTellTheirFailures) {
     const auto url = [](const std::string& port) { return "http://127.0.0.1:" + port + "/hook"; };
     settings("webhook_url=\"" + url(refusing.port()) + " " + url(good.port()) + "\"\n");
     ASSERT_EQ(send({{"%HOST%", "h\"\x01\xFF"}, {"%SYSLOG_CONTENT%", invalid}}), 0);
-    const std::string record = good.received(1);  // comes only when it is UTF-8 and JSON
-    EXPECT_EQ(record.rfind("post\napplication/json\n{\"tag\":\"T\",", 0), 0U) << record;
+    EXPECT_EQ(good.received(1), (Strings{"post", "application/json"}));  // comes only when it is UTF-8 and JSON
+    EXPECT_EQ(good.body(1).rfind("{\"tag\":\"T\",", 0), 0U) << good.body(1);
     EXPECT_EQ(systemLog(1)[0], "Failed to send notice. webhook: the server answered 500");
 
     ASSERT_EQ(send({{"%SYSLOG_CONTENT%", "quorlogd: Failed to send notice. webhook"}}), 0);
@@ -151,7 +127,11 @@ TEST_F(Delivery, TheCallerNeitherWaitsNorKeepsAnything) {
     settings(mailTo(server.port()));
     int ends[2];
     ASSERT_EQ(pipe(ends), 0);
-    const size_t before = openDescriptors();
+    const auto openDescriptors = [] {
+        const std::filesystem::directory_iterator entries("/proc/self/fd");
+        return std::distance(begin(entries), end(entries));
+    };
+    const auto before = openDescriptors();
     const double seconds = secondsOf([&] {
         for (int i = 0; i < 6; ++i) {
             ASSERT_EQ(send({}), 0);
@@ -165,7 +145,7 @@ TEST_F(Delivery, TheCallerNeitherWaitsNorKeepsAnything) {
     char end = 0;
     EXPECT_LT(secondsOf([&] { EXPECT_EQ(read(ends[0], &end, 1), 0); }), 1.0) << "a worker holds the caller's pipe";
     close(ends[0]);
-    EXPECT_EQ(mailOf(server.received(6)).lines[0], "3") << "deliveries at a time";
+    EXPECT_EQ(server.received(6)[0], "3") << "deliveries at a time";
 }
 
 TEST_F(Delivery, TheTestNoticeTellsTheOutcomeOfEachChannel) {

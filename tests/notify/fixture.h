@@ -15,6 +15,15 @@
 
 namespace quor::test {
 
+inline Strings linesOf(const std::string& text) {
+    Strings lines;
+    std::istringstream stream(text);
+    for (std::string line; std::getline(stream, line);) {
+        lines.push_back(line);
+    }
+    return lines;
+}
+
 // A server of servers.py, with its own folder for what it received.
 class Server {
   public:
@@ -22,24 +31,21 @@ class Server {
         const std::string portFile = folder_.path("port");
         const std::string command = "/usr/bin/python3 " SOURCE_FOLDER "/tests/notify/servers.py " + kindAndMood + " " +
                                     folder_.path() + " " + certificate + " > " + portFile;
-        pipe_ = popen(command.c_str(), "we");
-        Eventually([&] { return ReadFile(portFile).find('\n') != std::string::npos; });
-        port_ = ReadFile(portFile).substr(0, ReadFile(portFile).find('\n'));
+        pipe_.reset(popen(command.c_str(), "we"));
+        Eventually([&] { return !(port_ = ReadFile(portFile)).empty(); });
     }
-    Server(const Server&) = delete;
-    Server& operator=(const Server&) = delete;
-    ~Server() { pclose(pipe_); }
 
     const std::string& port() const { return port_; }
     // What the server recorded of its n-th message; empty when none comes.
-    std::string received(int n) const {
+    Strings received(int n) const {
         const std::string path = folder_.path(std::to_string(n));
-        return Eventually([&] { return access(path.c_str(), F_OK) == 0; }) ? ReadFile(path) : "";
+        return Eventually([&] { return access(path.c_str(), F_OK) == 0; }) ? linesOf(ReadFile(path)) : Strings(9);
     }
+    std::string body(int n) const { return ReadFile(folder_.path(std::to_string(n) + ".body")); }
 
   private:
     TempFolder folder_;
-    FILE* pipe_ = nullptr;
+    std::unique_ptr<FILE, Releaser<pclose>> pipe_;
     std::string port_;
 };
 
@@ -88,14 +94,6 @@ class Notify : public ::testing::Test {
         return taken;
     }
 
-    static Strings linesOf(const std::string& text) {
-        Strings lines;
-        std::istringstream stream(text);
-        for (std::string line; std::getline(stream, line);) {
-            lines.push_back(line);
-        }
-        return lines;
-    }
     // The lines of a file that workers append to, once there are that many.
     static Strings awaitLines(const std::string& path, size_t count) {
         Eventually([&] { return linesOf(ReadFile(path)).size() >= count; });

@@ -77,24 +77,20 @@ TEST_F(Notices, FailWithoutATemplateThatHasASubject) {
 TEST_F(Notices, TheShippedFilesServeEveryTag) {
     texts_ = SOURCE_FOLDER "/texts";
     settings(ReadFile(SOURCE_FOLDER "/etc/quorinfo.conf.example"));
-    std::map<std::string, std::string> values{{"DESKTOP_NOTIFY_CLASSNAME", "App"}};
-    for (const char* name : {"EPS", "SEV", "KEYWORD", "SYSLOG_CONTENT", "SHARED_FOLDER", "DBPATH"}) {
-        values["%" + std::string(name) + "%"] = "<" + std::string(name) + ">";
-    }
-    const std::map<std::string, const char*> tags{{"EPS_EXCEED", "<EPS>"},
-                                                  {"SEV_EXCEED", "<SYSLOG_CONTENT>"},
-                                                  {"KEYWORD_MATCH", "<SYSLOG_CONTENT>"},
-                                                  {"VOL_FULL", "<SHARED_FOLDER>"},
-                                                  {"DB_CORRUPT", "<DBPATH>"},
-                                                  {"ShareRemove", "<SHARED_FOLDER>"},
-                                                  {"ShareRename", "<SHARED_FOLDER>"},
-                                                  {"ShareEncMount", "<SHARED_FOLDER>"},
-                                                  {"ShareEncUnmount", "<SHARED_FOLDER>"}};
-    for (const auto& [tag, value] : tags) {
-        const Json::Value notice = sent(values, "QUORSYSLOG_" + tag, SOURCE_FOLDER "/etc/notify.filter");
-        EXPECT_EQ(notice["class"].asString(), "App");
-        EXPECT_NE(notice["body"].asString().find(value), std::string::npos) << tag;
-        EXPECT_EQ(notice["body"].asString().find("Host"), std::string::npos) << tag;
+    const std::pair<std::string, Strings> tags[] = {
+        {"EPS", {"EPS_EXCEED"}},
+        {"SYSLOG_CONTENT", {"SEV_EXCEED", "KEYWORD_MATCH"}},
+        {"SHARED_FOLDER", {"VOL_FULL", "ShareRemove", "ShareRename", "ShareEncMount", "ShareEncUnmount"}},
+        {"DBPATH", {"DB_CORRUPT"}},
+    };
+    for (const auto& [value, names] : tags) {
+        for (const std::string& name : names) {
+            const Json::Value notice = sent({{"DESKTOP_NOTIFY_CLASSNAME", "App"}, {"%" + value + "%", "<value>"}},
+                                            "QUORSYSLOG_" + name, SOURCE_FOLDER "/etc/notify.filter");
+            EXPECT_EQ(notice["class"].asString(), "App");
+            EXPECT_NE(notice["body"].asString().find("<value>"), std::string::npos) << name;
+            EXPECT_EQ(notice["body"].asString().find("Host"), std::string::npos) << name;
+        }
     }
 }
 
@@ -189,18 +185,20 @@ TEST_F(Notices, TheDesktopSpoolIsTurnedOver) {
 }
 
 TEST_F(Notices, SettingsAreReadWithTheirDefaults) {
-    using Case = std::tuple<const char*, int, int, int, int>;
+    using Case = std::tuple<const char*, int, int, int>;
     QUORMAIL mail;
-    for (const auto& [text, security, port, verify, smsEnabled] :
-         {Case{"sms_enabled=\"yes\"\n", 1, 587, 1, 1}, Case{"smtp_security=\"none\"\n", 0, 25, 1, 0},
-          Case{"smtp_security=tls\nsmtp_tls_verify=no\n", 2, 465, 0, 0},
-          Case{"smtp_security=\"word\"\nsmtp_port=\"70000\"\n", 1, 587, 1, 0}}) {
-        SCOPED_TRACE(text);
+    for (const auto& [text, security, port, verify] :
+         {Case{"", 1, 587, 1}, Case{"smtp_security=\"none\"\n", 0, 25, 1},
+          Case{"smtp_security=tls\nsmtp_tls_verify=no\n", 2, 465, 0},
+          Case{"smtp_security=\"word\"\nsmtp_port=\"70000\"\n", 1, 587, 1}}) {
         settings(text);
         ASSERT_EQ(QUORMailGet(&mail), 0);
-        EXPECT_EQ(std::tie(mail.security, mail.port, mail.verify), std::tuple(security, port, verify));
+        EXPECT_EQ(std::tie(mail.security, mail.port, mail.verify), std::tuple(security, port, verify)) << text;
+    }
+    for (const bool enabled : {false, true}) {
+        settings(enabled ? "sms_enabled=\"yes\"\n" : "");
         const std::unique_ptr<QUORSMSCONF, Releaser<QUORSmsConfFree>> sms(QUORSmsConfGet());
-        EXPECT_EQ(sms->enabled, smsEnabled);
+        EXPECT_EQ(sms->enabled != 0, enabled);
     }
     std::filesystem::remove(paths::kSystemSettings);
     EXPECT_LT(QUORMailGet(&mail), 0);

@@ -1,7 +1,8 @@
 """A mail or web server on loopback: servers.py smtp|smtp-starttls|smtp-tls|http MOOD FOLDER [CERTIFICATE KEY]
 
 MOOD is good, slow (1.5 s before an answer), stuck (never answers) or refuse. Prints its port, ends with its standard
-input, and writes what real parsers made of each message to FOLDER/1, FOLDER/2 ... with the most sessions at a time.
+input, and writes what real parsers made of each message to FOLDER/1, FOLDER/2 ... with the most sessions at a time, its
+body to FOLDER/1.body ...
 """
 import asyncio, email, email.policy, json, os, ssl, sys
 from aiosmtpd.smtp import SMTP, AuthResult
@@ -14,10 +15,10 @@ received = sessions = most = 0
 def keep(*lines, body=b""):
     global received
     received += 1
-    path = f"{folder}/{received}"
-    with open(path + ".part", "wb") as file:
-        file.write("\n".join([*map(str, lines), ""]).encode("utf-8", "surrogateescape") + body)
-    os.rename(path + ".part", path)
+    for name, content in (f"{received}.body", body), (f"{received}", "\n".join(map(str, lines)).encode()):
+        with open(f"{folder}/part", "wb") as file:
+            file.write(content)
+        os.rename(f"{folder}/part", f"{folder}/{name}")
 
 
 async def session_begins():
@@ -83,7 +84,7 @@ async def main():
             options.update(tls_context=context, require_starttls=True)
         server = await loop.create_server(lambda: SMTP(Mails(), loop=loop, **options), "127.0.0.1", 0,
                                           ssl=context if kind == "smtp-tls" else None)
-    print(server.sockets[0].getsockname()[1], flush=True)
+    print(server.sockets[0].getsockname()[1], end="", flush=True)
     await loop.run_in_executor(None, sys.stdin.read)
     os._exit(0)
 
