@@ -52,12 +52,4 @@ TEST_F(WorkingDb, IsRemovedAboveItsLimitInWholeKibibytes) {
     expectLog({"Working database is not regular file"});
 }
 
-TEST_F(WorkingDb, IsSwitchedToWriteAheadJournaling) {
-    run("CREATE TABLE logs(x)");
-    EXPECT_EQ(SyslogngWorkingDbSetJouWal(path_), 0);
-    EXPECT_EQ(query("PRAGMA journal_mode"), Strings({"wal"}));
-    EXPECT_EQ(SyslogngWorkingDbSetJouWal(folder_.path("a b")), 0) << "the shell ran";
-    expectLog({});
-}
-
 }  // namespace

@@ -40,16 +40,6 @@ class Rules : public testing::Test {
     NotificationManager manager_ = withoutRules();
 };
 
-TEST_F(Rules, ReadBackAsTheyWereWritten) {
-    for (_SYSLOG_NOTIFY_RULES_tag wanted : {rule("a rule", 2, 4, 0, ""), rule("b", 0, 7, INT64_MAX, R"(di"sk\ [x]=#;)"),
-                                            rule("a rule", 1, 0, 7, " % ", false)}) {
-        ASSERT_EQ(SyslogNotifyConfSet(file_, "not used", wanted), 0);
-        _SYSLOG_NOTIFY_RULES_tag found;
-        ASSERT_EQ(SyslogNotifyConfGet(file_, wanted.name, found), 0);
-        EXPECT_EQ(fields(found), fields(wanted));
-    }
-}
-
 TEST_F(Rules, AreWrittenWholeOrReported) {
     folder_.write("notify.conf", "");
     _SYSLOG_NOTIFY_RULES_tag negative = rule("r", -2, 4, -1, "p");

@@ -91,23 +91,19 @@ TEST(Text, IsShownAndEncodedWithoutAnythingRaw) {
 }
 
 TEST(Text, CsvCellsAreQuotedAndFormulasDefused) {
+    // text, plain, safe
     const std::tuple<const char*, const char*, const char*> cases[] = {
-        // text, plain, safe
-        {"a b", "a b", "a b"},
-        {"a,b", R"("a,b")", R"("a,b")"},
         {"a\nb", "\"a\nb\"", "\"a\nb\""},
         {"=1+1", "=1+1", "'=1+1"},
-        {"@SUM(A1,A2)", R"x("@SUM(A1,A2)")x", R"x("'@SUM(A1,A2)")x"},
+        {"@SUM(A1,A2)", "\"@SUM(A1,A2)\"", "\"'@SUM(A1,A2)\""},
         {"\tx", "\tx", "'\tx"},
         {"'quoted'", "'quoted'", "''quoted'"},
-        {"a=b", "a=b", "a=b"},
-    };
+        {"a=b c", "a=b c", "a=b c"}};
     for (const auto& [text, plain, safe] : cases) {
-        for (const bool defuse : {false, true}) {
-            std::string cell;
-            AppendCsvCell(cell, text, defuse);
-            EXPECT_EQ(cell, defuse ? safe : plain);
-        }
+        std::string cells;
+        AppendCsvCell(cells, text, false);
+        AppendCsvCell(cells, text, true);
+        EXPECT_EQ(cells, std::string(plain) + safe);
     }
 }
 
