@@ -15,6 +15,8 @@
 
 namespace quor::test {
 
+using Values = std::map<std::string, std::string>;
+
 inline Strings linesOf(const std::string& text) {
     Strings lines;
     std::istringstream stream(text);
@@ -70,14 +72,12 @@ class Notify : public ::testing::Test {
                "\"\nsmtp_recipient=\"one@example.com, two@example.com\"\nsmtp_security=\"none\"\n" + more;
     }
 
-    int send(const std::map<std::string, std::string>& values, const std::string& tag = "T",
-             const std::string& filter = "") {
+    int send(const Values& values, const std::string& tag = "T") {
         StringTable table(QLIBCSzHashAlloc(16));
         for (const auto& [key, value] : values) {
-            QLIBSZHASH* raw = table.get();
-            EXPECT_EQ(QLIBCSzHashSetValue(&raw, key.c_str(), value.c_str()), 0);
+            EXPECT_EQ(QLIBCSzHashSetValue(Adopt(table), key.c_str(), value.c_str()), 0);
         }
-        return QUORSysNotifySendNotificationCustomized(tag.c_str(), texts_.c_str(), filter.c_str(), table.get(), 0);
+        return QUORSysNotifySendNotificationCustomized(tag.c_str(), texts_.c_str(), filter_.c_str(), table.get(), 0);
     }
 
     // The workers' slots that are free, held as long as the result lives.
@@ -108,6 +108,7 @@ class Notify : public ::testing::Test {
 
     TempFolder folder_;
     std::string texts_ = folder_.path();
+    std::string filter_;
 };
 
 }  // namespace quor::test
