@@ -1,7 +1,6 @@
 // The program itself over a real database.
-#include <fcntl.h>
-
 #include "program.h"
+#include "support/child.h"
 
 using namespace quor::test;
 
@@ -175,20 +174,12 @@ TEST_F(Commands, FollowPrintsNewRowsUntilItIsInterrupted) {
     const auto appears = [&](const char* text) {
         return Eventually([&] { return ReadFile(out).find(text) != std::string::npos; });
     };
-    const pid_t child = fork();
-    if (child == 0) {
-        const std::string command = "cd " + folder_.path() + " && exec " QUORLOG +
-                                    " search --follow --limit 1 --format json --host new,nas" + kDb + " >out";
-        execl("/bin/sh", "sh", "-c", command.c_str(), nullptr);
-        _exit(127);
-    }
+    Child child(QUORLOG " search --follow --limit 1 --format json --host new,nas --db '" + folder_.path("the log.db") +
+                "' >" + out);
     EXPECT_TRUE(appears("it's"));
     database("the log.db").run("INSERT INTO logs(host, msg) VALUES('new', 'first'), ('web', 'other')");
     EXPECT_TRUE(appears("first"));
-    kill(child, SIGINT);
-    int status = 0;
-    waitpid(child, &status, 0);
-    EXPECT_TRUE(WIFEXITED(status) && WEXITSTATUS(status) == 0);
+    EXPECT_EQ(child.endOf(SIGINT), 0);
     const std::string text = ReadFile(out);
     EXPECT_EQ(text.substr(text.size() - 3), "}]\n");
     EXPECT_EQ(text.find("sda"), std::string::npos);

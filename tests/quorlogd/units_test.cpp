@@ -63,18 +63,14 @@ TEST(EventText, IsALiteralAndNoMarkup) {
 TEST(NoticeBudget, RefillsOverAMinute) {
     quor::NoticeBudget::Time now{};
     quor::NoticeBudget budget(2, now);
-    const auto taken = [&](int seconds) {
+    for (const auto& [seconds, wanted] : {std::pair(0, 2), {29, 0}, {2, 1}, {3600, 2}}) {
         now += std::chrono::seconds(seconds);
-        int count = 0;
+        int taken = 0;
         while (budget.take(now)) {
-            ++count;
+            ++taken;
         }
-        return count;
-    };
-    EXPECT_EQ(taken(0), 2);
-    EXPECT_EQ(taken(29), 0);
-    EXPECT_EQ(taken(2), 1);
-    EXPECT_EQ(taken(3600), 2);
+        EXPECT_EQ(taken, wanted) << "after " << seconds << " more seconds";
+    }
     EXPECT_FALSE(quor::NoticeBudget(0, now).take(now + std::chrono::hours(1)));
 }
 
