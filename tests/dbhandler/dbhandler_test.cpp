@@ -1,10 +1,15 @@
 #include "dbhandler.h"
 
+#include <syslog.h>
+
 #include "quor/quordb.h"
 #include "support/database.h"
 #include "support/db_spy.h"
+#include "support/notices.h"
+#include "support/services.h"
 
 using namespace quor::test;
+namespace fs = std::filesystem;
 
 namespace {
 
@@ -102,15 +107,11 @@ TEST_F(Handle, ChecksPointsTheLogAndRemovesItsFiles) {
     handle_.DBExecute("DELETE FROM logs WHERE utcsec = 1");
     for (const bool remove : {false, true}) {
         EXPECT_EQ(handle_.DBWalCheckpoint(remove), 0);
-        EXPECT_NE(std::filesystem::exists(path_ + "-wal"), remove);
-        EXPECT_NE(std::filesystem::exists(path_ + "-shm"), remove);
+        EXPECT_NE(fs::exists(path_ + "-wal"), remove);
+        EXPECT_NE(fs::exists(path_ + "-shm"), remove);
     }
     handle_.DBDiscon();
     EXPECT_EQ(count(), "1");
-    SpyOnDb().failing = "wal_checkpoint(FULL);";
-    handle_.DBCon();
-    EXPECT_EQ(handle_.DBWalCheckpoint(true), -1);
-    expectLog({"Fail to force WAL checkpoint(FULL)"});
 }
 
 class Metadata : public DatabaseTest {
@@ -173,6 +174,134 @@ TEST_F(Metadata, TimesComeFromTheLogs) {
     expectLog({});
     EXPECT_EQ(handle_.DBLogStartTimeGet(), 0);
     EXPECT_NE(lastMessage().rfind("Fail to execute SQL command: ", 0), 0U) << "not reported without the table";
+}
+
+class Failure : public DatabaseTest {
+  protected:
+    Failure() {
+        FakeNotices() = {};
+        FakeServices() = {};
+    }
+
+    // The lines that a statement leaves in the system log of a database that others may hold open.
+    std::vector<SystemLogLine> linesOf(const std::string& sql) {
+        DBHandler handle(path_, "");
+        EXPECT_EQ(handle.DBCon(), 0);
+        TakeSystemLog();
+        EXPECT_EQ(handle.DBExecute(sql), -1);
+        handle.DBDiscon();
+        return TakeSystemLog();
+    }
+
+    // So many, the last one with that priority and part of its text.
+    void expectLines(const std::string& sql, size_t count, int priority, const char* text) {
+        const auto lines = linesOf(sql);
+        ASSERT_EQ(lines.size(), count);
+        EXPECT_EQ(lines.back().priority, priority) << lines.back().text;
+        EXPECT_NE(lines.back().text.find(text), std::string::npos) << lines.back().text;
+    }
+
+    void overwrite(std::streamoff at, const std::string& bytes) const {
+        std::fstream file(path_, std::ios::in | std::ios::out | std::ios::binary);
+        file.seekp(at);
+        file << bytes;
+    }
+};
+
+TEST_F(Failure, IsAnErrorOrInformation) {
+    run("CREATE TABLE other(x)");
+    expectLines("SELEC 1", 1, LOG_ERR,
+                "dbhandler:125 Fail to execute SQL command: SELEC 1, error code is : 1, error cause: near \"SELEC\": "
+                "syntax error");
+    run("CREATE TABLE logs(x UNIQUE); INSERT INTO logs VALUES(1)");
+    expectLines("SELECT 1; DROP TABLE logs", 1, LOG_INFO, "error code is : 1, ");
+    expectLines("INSERT INTO logs VALUES(1)", 1, LOG_ERR, "error code is : 19, ");
+    {
+        SqliteFile other(path_);
+        other.run("BEGIN EXCLUSIVE");
+        expectLines("INSERT INTO logs VALUES(2)", 1, LOG_INFO, "error code is : 5, error cause: database is locked");
+    }
+    overwrite(47, "\x09");  // a schema format of the future: every statement fails with code 1, the table check too
+    expectLines("SELECT 1 FROM logs", 3, LOG_ERR, "SELECT 1 FROM logs");
+    folder_.write("log.db", std::string(8192, 'x'));
+    expectLines("SELECT 1 FROM logs", 1, LOG_INFO, "error code is : 26, ");
+    EXPECT_TRUE(FakeNotices().sent.empty());
+    EXPECT_TRUE(fs::exists(path_));
+}
+
+TEST_F(Failure, OfACorruptDatabaseMovesItAsideAfterTheNotice) {
+    run("CREATE TABLE logs(msg); INSERT INTO logs VALUES(zeroblob(100000))");
+    overwrite(4096, std::string(80000, '\x77'));  // every page after the first
+    folder_.write("log.db.corrupt", "older");
+    bool stillThere = false;
+    FakeNotices().onSend = [&] { stillThere = fs::exists(path_) && FakeServices().reloaded.empty(); };
+
+    const auto lines = linesOf("SELECT sum(length(msg)) FROM logs WHERE msg LIKE 'x%'");
+    EXPECT_TRUE(stillThere) << "the notice goes out first";
+    ASSERT_EQ(FakeNotices().sent.size(), 1U);
+    EXPECT_EQ(FakeNotices().sent[0].tag, "QUORSYSLOG_DB_CORRUPT");
+    EXPECT_EQ(FakeNotices().sent[0].values["%DBPATH%"], path_);
+    EXPECT_EQ(FakeServices().reloaded, Strings({"service syslog-ng"}));
+    EXPECT_FALSE(fs::exists(path_));
+    EXPECT_GT(fs::file_size(path_ + ".corrupt"), 80000U);
+    ASSERT_FALSE(lines.empty());
+    EXPECT_NE(lines.back().text.find("error code is : 11, "), std::string::npos) << lines.back().text;
+}
+
+TEST_F(Failure, OfOneStepOfTheRecoveryLeavesTheOthers) {
+    EXPECT_EQ(DBErrorHandle_SQLITE_CORRUPT(nullptr, folder_.path("none.db")), -1);
+    EXPECT_EQ(FakeNotices().sent.size(), 1U);
+    EXPECT_TRUE(FakeServices().reloaded.empty());
+    FakeServices().fail = true;
+    FakeNotices().fail = true;
+    EXPECT_EQ(DBErrorHandle_SQLITE_CORRUPT(nullptr, folder_.write("log.db", "x")), -1);
+    EXPECT_TRUE(fs::exists(path_ + ".corrupt"));
+    EXPECT_EQ(lastMessage(), "dbhandler:88 Fail to send HUP signal to syslog-ng");
+}
+
+class WorkingDb : public DatabaseTest {
+  protected:
+    WorkingDb() {
+        WriteFile(marker_, "");
+        FakeServices() = {};
+    }
+    ~WorkingDb() override { fs::remove(marker_); }
+
+    const std::string marker_ = quor::paths::kPackageEnabled;
+};
+
+TEST_F(WorkingDb, HangsUpTheSyslogNgThatIsInCharge) {
+    for (const std::string name : {"pkg-Orvane-syslog", "syslog-ng"}) {
+        FakeServices() = {};
+        EXPECT_EQ(SyslogngHupSignalSend(), 0);
+        FakeServices().fail = true;
+        EXPECT_EQ(SyslogngHupSignalSend(), -1);
+        const std::string call = (name == "syslog-ng" ? "service " : "job ") + name;
+        EXPECT_EQ(FakeServices().reloaded, Strings({call, call}));
+        expectLog({"Fail to send HUP signal to " + name});
+        fs::remove(marker_);
+    }
+}
+
+TEST_F(WorkingDb, IsRemovedAboveItsLimitInWholeKibibytes) {
+    using Case = std::tuple<uintmax_t, int, bool>;
+    for (const auto& [bytes, limitKB, kept] :
+         {Case{3 * 1024ULL + 1023, 3, true}, Case{4 * 1024ULL, 3, false}, Case{0, 0, true}, Case{0, -1, false},
+          Case{(4ULL << 30U) + 1023, 4194304, true}, Case{5ULL << 40U, 2147483647, false}}) {
+        SCOPED_TRACE(testing::Message() << bytes << " bytes, limit " << limitKB);
+        FakeServices() = {};
+        folder_.write("log.db", "");
+        folder_.write("log.db-wal", "");
+        fs::resize_file(path_, bytes);
+        EXPECT_EQ(SyslogngWorkingDbCheck(path_, limitKB), 0);
+        EXPECT_EQ(fs::exists(path_), kept);
+        EXPECT_EQ(FakeServices().reloaded.size(), kept ? 0U : 1U);
+        EXPECT_TRUE(fs::exists(path_ + "-wal"));
+    }
+    EXPECT_EQ(SyslogngWorkingDbCheck(folder_.path("none"), 0), -1);
+    expectLog({});
+    EXPECT_EQ(SyslogngWorkingDbCheck(folder_.path(), 0), -1);
+    expectLog({"Working database is not regular file"});
 }
 
 }  // namespace

@@ -9,17 +9,19 @@ using Reports = Program;
 
 TEST_F(Reports, StatisticsCountAndRate) {
     setenv("TZ", "UTC", 1);
-    database("acc.db").run("CREATE TABLE histogram(id INTEGER PRIMARY KEY, device TEXT UNIQUE, count INTEGER);"
-                           "CREATE TABLE eps(id INTEGER PRIMARY KEY, stamp INTEGER, device TEXT, eps INTEGER);"
-                           "INSERT INTO histogram VALUES(1, 'O''Neil', 7), (2, 'a', 5), (3, 'b', 9), (4, 'c', 9);"
-                           "INSERT INTO eps VALUES(1, 1767225600, 'a', 6), (2, 1767225604, 'a', 1), "
-                           "(3, 1767225604, 'b', 2), (4, 1767312000, 'a', 1)");
+    database("acc.db").run(
+        "CREATE TABLE histogram(id INTEGER PRIMARY KEY, device TEXT UNIQUE, count INTEGER);"
+        "CREATE TABLE eps(id INTEGER PRIMARY KEY, stamp INTEGER, device TEXT, eps INTEGER);"
+        "INSERT INTO histogram VALUES(1, 'O''Neil', 7), (2, 'a', 5), (3, 'b', 9000000000), (4, 'c', 9);"
+        "INSERT INTO eps VALUES(1, 1767225600, 'a', 6), (2, 1767225604, 'a', 1), "
+        "(3, 1767225604, 'b', 2), (4, 1767312000, 'a', 1)");
     database("empty.db").run("CREATE TABLE histogram(id, device, count)");
     expect({
-        {"stats total --db acc.db", 0, "count  30\n"},
+        {"stats total --db acc.db", 0, "count  9000000021\n"},
         {"stats device --db acc.db \"O'Neil\" --format ndjson", 0, "{\"device\":\"O'Neil\",\"count\":7}\n"},
         {"stats device --db acc.db \"x' OR 'a\"", 1, "device  x' OR 'a\ncount   0\n", "no log was counted"},
-        {"stats top --limit 3 --db acc.db", 0, "COUNT  DEVICE\n    9  b\n    9  c\n    7  O'Neil\n"},
+        {"stats top --limit 3 --db acc.db", 0,
+         "     COUNT  DEVICE\n9000000000  b\n         9  c\n         7  O'Neil\n"},
         {"stats eps --from 2026-01-01 --to 2026-01-01 --format ndjson --db acc.db", 0,
          "{\"stamp\":1767225600,\"logs\":6,\"seconds\":null,\"per_second\":null}\n"
          "{\"stamp\":1767225604,\"logs\":3,\"seconds\":4,\"per_second\":0.75}\n"},

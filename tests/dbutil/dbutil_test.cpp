@@ -1,0 +1,266 @@
+#include "dbutil.h"
+
+#include "common/guards.h"
+#include "support/database.h"
+#include "support/db_spy.h"
+
+using namespace quor::test;
+
+namespace {
+
+using Conditions = std::list<_SYSLOG_SQL_COND_tag>;
+
+// The first row of a table, as a record that held other values before.
+class Record : public DatabaseTest {
+  protected:
+    int convert(const std::string& schema, std::string table, bool trim) {
+        run(schema);
+        const quor::Connection connection(QUORDBConnect(nullptr, nullptr, nullptr, path_.c_str()));
+        quor::Result result;
+        EXPECT_GE(QUORDBExecute(connection.get(), ("SELECT * FROM " + table).c_str(), quor::Adopt(result)), 0);
+        return DBRecToLogInfo(table, result.get(), 0, &record_, trim);
+    }
+
+    // All texts.
+    std::string texts() const {
+        std::string all;
+        for (const std::string* text : {&record_.tag, &record_.host, &record_.ip, &record_.fac, &record_.tzoffset,
+                                        &record_.ldate, &record_.ltime, &record_.prog, &record_.msg, &record_.luser,
+                                        &record_.event, &record_.xferip, &record_.fname, &record_.fsize}) {
+            all += *text + ",";
+        }
+        return all;
+    }
+
+    _SYSLOG_LOG_DATA_tag record_{
+        1, 2, 3, SYSLOG_PRIORITY_CRIT, "A", "B", "C", "D", "E", "F", "G", "H", "I", "J", "K", "L", "M", 4, "N"};
+};
+
+TEST_F(Record, OfTableLogsReadsEveryColumnByName) {
+    ASSERT_EQ(
+        convert("CREATE TABLE logs(prio, msg, id, host, ip, fac, tag, utcsec, tzoffset, ldate, ltime, prog);"
+                "INSERT INTO logs VALUES('err', 'bob: hi: x', '18446744073709551615', 'h', '1.2.3.4', 'kern', 't',"
+                "-3000000000, '+01:00', '2026-01-02', '03:04:05', 'p')",
+                "logs", true),
+        0);
+    EXPECT_EQ(texts(), "t,h,1.2.3.4,kern,+01:00,2026-01-02,03:04:05,p, hi: x,J,K,L,M,N,");
+    EXPECT_EQ(record_.id, 18446744073709551615U);
+    EXPECT_EQ(record_.utcsec, -3000000000);
+    EXPECT_EQ(record_.prio, SYSLOG_PRIORITY_ERR);
+    EXPECT_EQ(record_.xsec, 3);
+    ASSERT_EQ(convert("DROP TABLE logs; CREATE TABLE logs(id, prio, msg); INSERT INTO logs VALUES(NULL, NULL, 'a:b')",
+                      "logs", false),
+              0);
+    EXPECT_EQ(texts(), ",,,,,,,,a:b,J,K,L,M,N,") << "missing and null are empty";
+    EXPECT_EQ(record_.id, 0U);
+    EXPECT_EQ(record_.utcsec, 0);
+    EXPECT_EQ(record_.prio, SYSLOG_PRIORITY_DEBUG);
+}
+
+TEST_F(Record, OfTheOtherTablesHasTheirFieldsAlone) {
+    const std::string log = "(id, host, llevel, prog, ldate, ltime, luser, msg)";
+    const std::string row = " VALUES(9, 'h', 'alert', 'p', 'd', 't', 'u', 'x: y')";
+    for (const std::string table : {"general_log", "connection_log"}) {
+        ASSERT_EQ(convert("CREATE TABLE " + table + log + "; INSERT INTO " + table + row, table, true), 0);
+        EXPECT_EQ(texts(), "A,h,C,D,E,d,t,p,I,u,x: y,L,M,N,") << "the message is the event, whole";
+        EXPECT_EQ(record_.id, 9U);
+        EXPECT_EQ(record_.prio, SYSLOG_PRIORITY_ALERT);
+    }
+    ASSERT_EQ(convert("CREATE TABLE transfer_log(id, host, prog, ldate, ltime, luser, event, fname, isdir, fsize, ip);"
+                      "INSERT INTO transfer_log VALUES(8, 'h', 'p', 'd', 't', 'u', 'e', 'f', 1, '2 KB', '::1')",
+                      "transfer_log", false),
+              0);
+    EXPECT_EQ(texts(), "A,h,C,D,E,d,t,p,I,u,e,::1,f,2 KB,");
+    EXPECT_EQ(record_.isdir, 1U);
+    EXPECT_EQ(convert("CREATE TABLE LOGS(id); INSERT INTO LOGS VALUES(7)", "LOGS", false), -1) << "no other table";
+    EXPECT_EQ(record_.id, 8U);
+    EXPECT_EQ(DBRecToAllLogInfo(nullptr, 0, &record_, false), -1);
+    EXPECT_EQ(DBRecToSysLogInfo(nullptr, 0, &record_), -1);
+    EXPECT_EQ(DBRecToXferLogInfo(nullptr, 0, &record_), -1);
+}
+
+TEST(Names, ThatAreUnknownAreRefused) {
+    EXPECT_STREQ(LogAttriStrGet(SYSLOG_ATTRI_XFERIP), "ip");
+    EXPECT_EQ(LogAttriType("ip"), SYSLOG_ATTRI_IP);
+    EXPECT_EQ(LogAttriType("IP"), SYSLOG_ATTRI_NONE);
+    EXPECT_EQ(PriorTypeToStr(SYSLOG_PRIORITY_DEBUG), "debug");
+    for (const char* unknown : {static_cast<const char*>(nullptr), "", "warn", "ERR"}) {
+        EXPECT_EQ(PriorStrToType(unknown), SYSLOG_PRIORITY_DEBUG);
+    }
+    EXPECT_EQ(PriorTypeToStr(static_cast<_SYSLOG_DB_PRIORITY_tag>(-1)) + LogAttriStrGet(SYSLOG_ATTRI_NONE), "");
+    EXPECT_EQ(TrimUserName("a:b:c") + TrimUserName("none") + TrimUserName("a:"), "b:cnone");
+}
+
+// Collects ids, up to `most`.
+struct Walk {
+    Strings ids;
+    size_t most = 1000;
+
+    static int take(_SYSLOG_LOG_DATA_tag& record, void* context) {
+        auto& walk = *static_cast<Walk*>(context);
+        walk.ids.push_back(std::to_string(record.id));
+        return walk.ids.size() >= walk.most ? 1 : 0;
+    }
+};
+
+// Ids 1 to 10; odd ones are of host "odd".
+class Select : public DatabaseTest {
+  protected:
+    Select() {
+        run("CREATE TABLE logs(id INTEGER PRIMARY KEY, host, msg);"
+            "WITH RECURSIVE n(i) AS (SELECT 1 UNION ALL SELECT i+1 FROM n WHERE i < 10)"
+            "INSERT INTO logs SELECT i, iif(i % 2, 'odd', 'even'), 'm' || i FROM n;"
+            "CREATE TABLE other(id INTEGER PRIMARY KEY); INSERT INTO other VALUES(1)");
+        SpyOnDb() = {};
+    }
+
+    // What happened to the statements that were sent since.
+    static void expectStatements(const Strings& statements) {
+        EXPECT_EQ(std::exchange(SpyOnDb().statements, {}), statements);
+    }
+
+    int select(Conditions conds, _SYSLOG_SQL_LIMIT_tag* limit, _SYSLOG_SQL_ORDER_tag* order) {
+        return SyslogDBSelect(path_, conds, limit, order, Walk::take, &walk_, false);
+    }
+
+    Conditions none_;
+    Conditions all_{{SYSLOG_ATTRI_MSG, 8, "**", {}}};
+    Conditions odd_{{SYSLOG_ATTRI_HOST, 0, "odd", {}}};
+    _SYSLOG_SQL_ORDER_tag newest_{0, SYSLOG_ATTRI_ID};
+    Walk walk_;
+};
+
+TEST_F(Select, PagesUnfilteredTablesByIdWindowAndOthersThroughTheLimitedSelect) {
+    _SYSLOG_SQL_LIMIT_tag page{3, 2};
+    _SYSLOG_SQL_LIMIT_tag large{(1ULL << 32) + 2, (1ULL << 33) + 1};  // the limited select takes the low 32 bits
+    ASSERT_EQ(select(none_, &page, &newest_), 0);
+    EXPECT_EQ(walk_.ids, Strings({"8", "7", "6"}));
+    ASSERT_EQ(select(all_, &large, &newest_), 0);
+    ASSERT_EQ(select(odd_, &large, &newest_), 0);
+    EXPECT_EQ(walk_.ids, Strings({"8", "7", "6", "7", "5"}));
+    const std::string maximum = "SELECT *, (SELECT max(rowid) FROM logs) totalCount FROM logs WHERE ";
+    expectStatements({maximum + "( id > totalCount - 5 AND id <= totalCount - 2) ORDER BY id desc",
+                      maximum + "(msg GLOB '**') AND ( id > totalCount - 12884901891 AND id <= totalCount - "
+                                "8589934593) ORDER BY id desc",
+                      "SELECT * FROM logs WHERE (host = 'odd') ORDER BY id desc [2,1]"});
+}
+
+TEST_F(Select, WithoutAWindowGivesEveryRowThatIsTaken) {
+    _SYSLOG_SQL_LIMIT_tag everything{0, 4};
+    _SYSLOG_SQL_ORDER_tag oldest{7, SYSLOG_ATTRI_HOST};
+    ASSERT_EQ(select(none_, &everything, &oldest), 0);
+    ASSERT_EQ(select(none_, nullptr, nullptr), 0);
+    EXPECT_EQ(walk_.ids.size(), 20U);
+    expectStatements({"SELECT * FROM logs ORDER BY host asc", "SELECT * FROM logs"});
+    EXPECT_EQ(SyslogDBSelect(path_, none_, nullptr, nullptr, nullptr, nullptr, false), 0);
+    std::string other = "other";
+    EXPECT_EQ(SyslogDBSelectByTable(path_, other, none_, nullptr, nullptr, Walk::take, &walk_, false), 0);
+    EXPECT_EQ(walk_.ids.size(), 20U) << "a row of an unknown table was handed over";
+    walk_.most = 21;
+    EXPECT_EQ(select(none_, nullptr, &newest_), 0);
+    EXPECT_EQ(walk_.ids.back(), "10") << "the walk ends when it is asked to";
+}
+
+TEST_F(Select, ReportsWhatFailed) {
+    std::string relative = "log.db";
+    std::string missing = folder_.path("none.db");
+    std::string table = "nowhere";
+    for (std::string* bad : {&relative, &missing}) {
+        EXPECT_EQ(SyslogDBSelect(*bad, none_, nullptr, nullptr, nullptr, nullptr, false), -1);
+        EXPECT_EQ(SyslogDBSelectCount(*bad, none_, nullptr, nullptr), -1);
+        EXPECT_EQ(SyslogDBDelete(*bad, none_), -1);
+    }
+    expectStatements({});
+    EXPECT_EQ(SyslogDBSelectByTable(path_, table, none_, nullptr, nullptr, nullptr, nullptr, false), -1);
+    expectLog({"dbutil:464 Invalid syslog db path!", "dbutil:573 Invalid syslog db path!",
+               "dbutil:653 Invalid syslog db path!", "fail to connect database (" + missing + ")",
+               "fail to execute database command (SELECT * FROM nowhere)"});
+    EXPECT_FALSE(std::filesystem::exists(missing));
+}
+
+TEST_F(Select, CountsByLargestIdUnlessFiltered) {
+    run("DELETE FROM logs WHERE id IN (3, 4, 5)");
+    EXPECT_EQ(SyslogDBSelectCount(path_, none_, nullptr, nullptr), 10);
+    EXPECT_EQ(SyslogDBSelectCount(path_, all_, nullptr, nullptr), 10);
+    EXPECT_EQ(SyslogDBSelectCount(path_, odd_, nullptr, &newest_), 3);
+    expectStatements({"SELECT max(rowid) FROM logs", "SELECT max(rowid) FROM logs WHERE (msg GLOB '**')",
+                      "SELECT COUNT(*) FROM logs WHERE (host = 'odd') ORDER BY id desc"});
+
+    _SYSLOG_SQL_LIMIT_tag beyond{1, 1};
+    EXPECT_EQ(SyslogDBSelectCount(path_, none_, &beyond, nullptr), -1) << "the only row was skipped";
+    run("UPDATE logs SET id = 7000000000 WHERE id = 10");
+    EXPECT_EQ(SyslogDBSelectCount(path_, none_, nullptr, nullptr), -1589934592) << "not the low 32 bits";
+
+    std::string twoRows = "logs GROUP BY host";
+    EXPECT_EQ(SyslogDBSelectCountByTable(path_, twoRows, none_, nullptr, nullptr), -2);
+}
+
+_SYSLOG_SQL_COND_tag cond(_SYSLOG_DB_ATTRI_tag attr, int op, const std::string& value, Conditions orList = {}) {
+    return {attr, op, value, std::move(orList)};
+}
+
+// What is added to a text that is there already.
+std::string rendered(Conditions conditions) {
+    std::string text = "x ";
+    EXPECT_EQ(SqlCondListToStr(conditions, text), 0);
+    return text.substr(2);
+}
+
+TEST(Condition, EscapesTheValueForItsOperator) {
+    using Case = std::tuple<_SYSLOG_DB_ATTRI_tag, int, const char*, const char*>;
+    for (const auto& [attr, op, value, text] : {
+             Case{SYSLOG_ATTRI_HOST, 1, "O'Neil", "(host != 'O''Neil')"},
+             Case{SYSLOG_ATTRI_HOST, 0, R"(a\%_*?[])", R"((host = 'a\%_*?[]'))"},
+             Case{SYSLOG_ATTRI_MSG, 6, "a*b", R"((msg LIKE 'a%b' escape '\'))"},
+             Case{SYSLOG_ATTRI_MSG, 7, R"(50%_*?\')", R"((msg NOT LIKE '50\%\_%_\\''' escape '\'))"},
+             Case{SYSLOG_ATTRI_MSG, 8, "[x]", "(msg GLOB '[[]x[]]')"},
+             Case{SYSLOG_ATTRI_MSG, 9, "*e'r?", "(msg NOT GLOB '*e''r?')"},
+             Case{SYSLOG_ATTRI_ID, 4, "10", "(id > 10)"},
+             Case{SYSLOG_ATTRI_UTCSEC, 6, "1_*", R"((utcsec LIKE 1\_%))"},
+             Case{SYSLOG_ATTRI_ISDIR, 2, "1", "(isdir < '1')"},
+             Case{SYSLOG_ATTRI_XFERIP, 3, "", "(ip <= '')"},
+         }) {
+        EXPECT_EQ(rendered({cond(attr, op, value)}), text);
+    }
+    EXPECT_EQ(CondValueEscape(nullptr), "");
+}
+
+TEST(Condition, JoinsAlternativesOneLevelDeepAndListsWithAnd) {
+    const Conditions never{cond(SYSLOG_ATTRI_HOST, 0, "never")};
+    const Conditions others{cond(SYSLOG_ATTRI_HOST, 0, "b", never), cond(SYSLOG_ATTRI_MSG, 6, "c")};
+    EXPECT_EQ(rendered({cond(SYSLOG_ATTRI_HOST, 0, "a", others), cond(SYSLOG_ATTRI_FAC, 0, "kern")}),
+              "((host = 'a') OR (host = 'b') OR (msg LIKE 'c' escape '\\')) AND (fac = 'kern')");
+    std::string replaced = "replaced";
+    EXPECT_EQ(SqlCondToStr(cond(SYSLOG_ATTRI_FAC, 0, "kern"), replaced), 0);
+    EXPECT_EQ(replaced, "(fac = 'kern')");
+}
+
+TEST(Search, TurnsAFormIntoConditions) {
+    struct Case {
+        std::string hosts, levels, facs, progs, keyword, from, to;
+        const char* where;
+    };
+    for (Case c : {
+             Case{"", "", "", "", "", "0", "", ""},
+             Case{"any", "any", "any", "any", "any", "", "0", "(msg GLOB 'any')"},
+             Case{"a, b", "err,crit", "", "", "", "", "",
+                  "((host = 'a') OR (host = ' b')) AND ((llevel = 'err') OR (llevel = 'crit'))"},
+             Case{",,", "", "kern", "su", "**", "", "",
+                  "((host = '') OR (host = '') OR (host = '')) AND (fac = 'kern') AND (prog = 'su') AND (msg GLOB "
+                  "'**')"},
+             Case{"", "", "", "", "", "2014/01/02", "2014/01/02", "(ldate = '2014/01/02')"},
+             Case{"", "", "", "", "", "2014/01/02", "2014/01/03",
+                  "(ldate >= '2014/01/02') AND (ldate <= '2014/01/03')"},
+             Case{"", "", "", "", "", "0", "2014/01/03", "(ldate <= '2014/01/03')"},
+             Case{"", "", "", "", "", "2014/01/02", "0", "(ldate >= '2014/01/02')"},
+         }) {
+        Conditions conds;
+        LogSearchCondListGen(c.hosts, c.levels, c.facs, c.progs, c.keyword, c.from, c.to, conds);
+        EXPECT_EQ(rendered(conds), c.where);
+    }
+    _SYSLOG_SQL_COND_tag kept = cond(SYSLOG_ATTRI_MSG, 8, "kept");
+    EXPECT_EQ(OneCondListGen(SYSLOG_ATTRI_HOST, "any", kept) + OneCondListGen(SYSLOG_ATTRI_HOST, "", kept), 0);
+    EXPECT_EQ(rendered({kept}), "(msg GLOB 'kept')") << "nothing is asked for";
+}
+
+}  // namespace
