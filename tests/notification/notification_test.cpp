@@ -147,15 +147,12 @@ class Senders : public testing::Test {
 TEST_F(Senders, FillThePlaceholdersOfTheirTemplates) {
     _SYSLOG_LOG_DATA_tag log;
     log.msg = "a\"b\\c\n%HOST%";
-    int failures = manager_.NotificationSendSev("h\"", SYSLOG_PRIORITY_ERR, log);
-    failures += manager_.NotificationSendKeyword("h", "k\"", log);
-    failures += manager_.NotificationSendEps(UINT64_MAX);
-    failures += manager_.NotificationSendVolFull("s\"");
-    failures += SyslogMailSeverityExceeded("m\"", log.msg.c_str()) + SyslogMailKeywordMatched("m", log.msg.c_str());
-    failures += SyslogMailShareRemove("1") + SyslogMailShareRename("2");
-    failures += SyslogMailShareEncMount("3") + SyslogMailShareEncUnmount("4");
-    EXPECT_EQ(failures, 0);
-
+    EXPECT_EQ(manager_.NotificationSendSev("h\"", SYSLOG_PRIORITY_ERR, log) +
+                  manager_.NotificationSendKeyword("h", "k\"", log) + manager_.NotificationSendEps(UINT64_MAX) +
+                  manager_.NotificationSendVolFull("s\"") + SyslogMailSeverityExceeded("m\"", log.msg.c_str()) +
+                  SyslogMailKeywordMatched("m", log.msg.c_str()) + SyslogMailShareRemove("1") +
+                  SyslogMailShareRename("2") + SyslogMailShareEncMount("3") + SyslogMailShareEncUnmount("4"),
+              0);
     const std::pair<const std::string, std::string> escaped{"%SYSLOG_CONTENT%", "a\\\"b\\\\c\n%HOST%"};
     const std::pair<const std::string, std::string> desktop{"DESKTOP_NOTIFY_CLASSNAME", "QUOR.KVX.Orvane.Instance"};
     const std::vector<std::pair<std::string, Values>> wanted{
@@ -187,9 +184,9 @@ TEST_F(Senders, ReportAFailedSendAndRefuseNull) {
               (Strings{"Fail to send notification: QUORSYSLOG_VOL_FULL", "Fail to send notification",
                        "Fail to send notification: QUORSYSLOG_ShareRename"}));
     FakeNotices() = {};
-    EXPECT_EQ(SyslogMailShareRename(nullptr), -1);
-    EXPECT_EQ(SyslogMailSeverityExceeded(nullptr, "x"), -1);
-    EXPECT_EQ(SyslogMailKeywordMatched("k", nullptr), -1);
+    EXPECT_EQ(SyslogMailShareRename(nullptr) + SyslogMailSeverityExceeded(nullptr, "x") +
+                  SyslogMailKeywordMatched("k", nullptr),
+              -3);
     EXPECT_TRUE(FakeNotices().sent.empty());
 }
 

@@ -23,23 +23,21 @@ auto content(const _SYSLOG_LOG_DATA_tag& r) {
 
 // The plain way, on a copy of the text that may be written to.
 int parseInPlace(std::string text, _SYSLOG_LOG_DATA_tag& record) {
+    std::string prio;
+    std::string utcsec;
+    std::string xsec;
     char* rest = nullptr;
-    char* next = text.data();
-    const auto word = [&] { return strtok_r(std::exchange(next, nullptr), " ", &rest); };
-    const auto set = [&](auto& field, auto convert) {
-        const char* const found = word();
-        if (found != nullptr) {
-            field = convert(found);
+    char* begin = text.data();
+    for (std::string* field : {&record.fac, &prio, &record.ldate, &record.ltime, &utcsec, &xsec, &record.tzoffset,
+                               &record.host, &record.ip, &record.prog, &record.tag}) {
+        const char* word = strtok_r(std::exchange(begin, nullptr), " ", &rest);
+        if (word == nullptr) {
+            return -1;
         }
-        return found != nullptr;
-    };
-    const auto asText = [](const char* found) { return std::string(found); };
-    const auto asNumber = [](const char* found) { return strtoll(found, nullptr, 10); };
-    if (!set(record.fac, asText) || !set(record.prio, PriorStrToType) || !set(record.ldate, asText) ||
-        !set(record.ltime, asText) || !set(record.utcsec, asNumber) || !set(record.xsec, asNumber) ||
-        !set(record.tzoffset, asText) || !set(record.host, asText) || !set(record.ip, asText) ||
-        !set(record.prog, asText) || !set(record.tag, asText)) {
-        return -1;
+        *field = word;
+        record.prio = field == &prio ? PriorStrToType(word) : record.prio;
+        record.utcsec = field == &utcsec ? strtoll(word, nullptr, 10) : record.utcsec;
+        record.xsec = field == &xsec ? strtoll(word, nullptr, 10) : record.xsec;
     }
     record.msg = rest;
     return 0;
