@@ -158,16 +158,6 @@ TEST_F(Database, NonsenseFailsAndNeverCrashes) {
     }
 }
 
-TEST_F(Database, StatementWithoutRowsHasAnEmptyResult) {
-    for (const char* sql : {"INSERT INTO t(name) VALUES('d')", "SELECT name FROM t WHERE 0", "CREATE TABLE u(a)"}) {
-        ASSERT_EQ(execute(sql), 0) << sql;
-        EXPECT_EQ(QUORDBNumRows(result_.get()), 0);
-        EXPECT_EQ(QUORDBFetchField(result_.get(), 0, "name"), nullptr);
-    }
-    EXPECT_EQ(QUORDBExecute(connection_.get(), "DELETE FROM t RETURNING id", nullptr), 0);
-    EXPECT_EQ(file_.query("SELECT count(*) FROM t"), Strings{"0"});
-}
-
 TEST_F(Database, ResultOutlivesItsConnectionAndSchema) {
     ASSERT_EQ(execute("SELECT * FROM t"), 0);
     file_.run("DROP TABLE t");
