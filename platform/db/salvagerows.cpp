@@ -18,6 +18,10 @@ constexpr char kFormerLogs[] =
     " llevel TEXT GENERATED ALWAYS AS (prio) VIRTUAL, tag TEXT, utcsec INTEGER, tzoffset TEXT, ldate TEXT, ltime TEXT,"
     " prog TEXT, msg TEXT)";
 
+bool isOfSqlite(const Definition& definition) {
+    return definition.name.rfind("sqlite_", 0) == 0;
+}
+
 }  // namespace
 
 Salvage::Salvage(const PageFile& file, QUORSALVAGEPROGRESS progress, void* context, QUORSALVAGE& report)
@@ -81,31 +85,38 @@ bool Salvage::readLeaf(const Bytes& page, const TreePage& leaf, const Taker& tak
     return true;
 }
 
-// The definitions that stand in the file itself: type, name, table, root page, SQL.
+// The definitions that stand in the file itself: type, name, table, root page, SQL. One that is damaged keeps its root.
 bool Salvage::readSchema() {
     if (file_.encoding() != 1) {
         return false;
     }
-    bool found = false;
-    walk(1, [this, &found](const Row& row) {
+    walk(1, [this](const Row& row) {
         const auto text = [&row](size_t i) {
             return std::string(reinterpret_cast<const char*>(row.values[i].bytes), row.values[i].size);
         };
         if (row.values.size() == 5 && row.values[4].kind == Value::Kind::kText) {
             schema_.push_back({text(0), text(1), static_cast<uint32_t>(row.values[3].integer), text(4)});
-            found = found || (schema_.back().type == "table" && schema_.back().name.rfind("sqlite_", 0) != 0);
         }
         return true;
     });
+    bool found = false;
+    const Database scratch = OpenScratch();
+    for (Definition& definition : schema_) {
+        const bool table = definition.type == "table" && !isOfSqlite(definition);
+        if (table && CanUse(scratch.get(), definition)) {
+            found = true;
+        } else if (table) {
+            definition.sql.clear();
+        }
+    }
     return found;
 }
 
 // How many rows of some pages fit a table of the schema.
 size_t Salvage::sample(const Schema& schema) {
-    sqlite3* raw = nullptr;
-    sqlite3_open(":memory:", &raw);
-    const Database db(raw);
-    const std::vector<TargetTable> tables = CreateTables(raw, schema);
+    const Database db = OpenScratch();
+    std::vector<TargetTable> tables;
+    (void)CreateTables(db.get(), schema, tables);  // a table that cannot be created fits nothing
     size_t fitting = 0;
     Bytes page;
     for (uint32_t number = 2; number <= file_.count(); number += 1 + file_.count() / kSampledPages) {
@@ -153,16 +164,17 @@ bool Salvage::save(TargetTable& table, const Row& row, bool& added) {
     return written;
 }
 
-// A table that was not created (SQLite's own) is walked too, so that its pages are accounted for.
+// SQLite's own tables are walked too, so that their pages are accounted for. The rows of one that could not be created
+// may fit another.
 bool Salvage::saveTree(const Definition& definition) {
     if (definition.type != "table" || definition.root == 0) {
         return true;
     }
     const auto table = std::find_if(tables_.begin(), tables_.end(),
                                     [&definition](auto& each) { return each.name() == definition.name; });
-    return walk(definition.root, [this, table](const Row& row) {
+    return walk(definition.root, [&](const Row& row) {
         bool added = false;
-        return table == tables_.end() || save(*table, row, added);
+        return table != tables_.end() ? save(*table, row, added) : isOfSqlite(definition) || saveStray(row);
     });
 }
 
@@ -218,7 +230,9 @@ bool Salvage::saveStrays() {
 }
 
 bool Salvage::fill(sqlite3* db) {
-    tables_ = CreateTables(db, schema_);
+    if (!CreateTables(db, schema_, tables_)) {
+        return false;
+    }
     const auto saved = [this](const Definition& definition) { return saveTree(definition); };
     if (!std::all_of(schema_.begin(), schema_.end(), saved) || !saveStrays()) {
         return false;
@@ -231,8 +245,7 @@ bool Salvage::fill(sqlite3* db) {
         }
     }
     tables_.clear();  // their statements are open on the database
-    CreateIndexes(db, schema_);
-    return tell(report_.pages);
+    return CreateIndexes(db, schema_) && tell(report_.pages);
 }
 
 }  // namespace quor::salvage

@@ -4,12 +4,24 @@
 #include <cstring>
 #include <fstream>
 #include <iterator>
+#include <new>
 
 namespace quor::salvage {
 namespace {
 
+// Memory that runs out is no fault of a definition or of a row, which could be left out: everything fails.
+int withMemory(int status) {
+    if ((status & 0xff) == SQLITE_NOMEM) {
+        throw std::bad_alloc();
+    }
+    return status;
+}
+
 std::string textOf(sqlite3_stmt* statement, int column) {
     const unsigned char* text = sqlite3_column_text(statement, column);
+    if (text == nullptr) {
+        withMemory(sqlite3_errcode(sqlite3_db_handle(statement)));
+    }
     return text != nullptr ? reinterpret_cast<const char*>(text) : "";
 }
 
@@ -27,21 +39,39 @@ int allowDefinitions(void* /*context*/, int action, const char*, const char*, co
                                                                                                 : SQLITE_OK;
 }
 
-bool define(sqlite3* db, const std::string& sql, const char* kind) {
+Statement prepare(sqlite3* db, const std::string& sql) {
+    Statement statement = PrepareOnly(db, sql.c_str());
+    if (statement == nullptr) {
+        withMemory(sqlite3_errcode(db));
+    }
+    return statement;
+}
+
+bool nextRow(const Statement& query) {
+    return query != nullptr && withMemory(sqlite3_step(query.get())) == SQLITE_ROW;
+}
+
+int define(sqlite3* db, const std::string& sql, const char* kind) {
     if (sqlite3_strnicmp(sql.c_str(), kind, static_cast<int>(strlen(kind))) != 0) {
-        return false;
+        return SQLITE_ERROR;
     }
     sqlite3_set_authorizer(db, allowDefinitions, nullptr);
-    const Statement statement = PrepareOnly(db, sql.c_str());
-    const bool done = statement != nullptr && sqlite3_step(statement.get()) == SQLITE_DONE;
+    const Statement statement = prepare(db, sql);
+    const int status = statement != nullptr ? sqlite3_step(statement.get()) : sqlite3_errcode(db);
     sqlite3_set_authorizer(db, nullptr, nullptr);
-    return done;
+    return withMemory(status);
+}
+
+// The fault lies with the definition, or with rows that are not unique.
+bool isRefusal(int status) {
+    constexpr int kRefusals[] = {SQLITE_ERROR, SQLITE_AUTH, SQLITE_CONSTRAINT, SQLITE_TOOBIG};
+    return std::find(std::begin(kRefusals), std::end(kRefusals), status & 0xff) != std::end(kRefusals);
 }
 
 Schema readSchema(sqlite3* db) {
     Schema schema;
-    const Statement query = PrepareOnly(db, "SELECT type, name, sql FROM sqlite_master WHERE sql IS NOT NULL");
-    while (query != nullptr && sqlite3_step(query.get()) == SQLITE_ROW) {
+    const Statement query = prepare(db, "SELECT type, name, sql FROM sqlite_master WHERE sql IS NOT NULL");
+    while (nextRow(query)) {
         schema.push_back({textOf(query.get(), 0), textOf(query.get(), 1), 0, textOf(query.get(), 2)});
     }
     return schema;
@@ -76,13 +106,13 @@ TargetTable::TargetTable(sqlite3* db, const Definition& definition) : name_(defi
 
 // A virtual generated column stands in no record; a stored one does, but is not written.
 void TargetTable::readColumns(sqlite3* db) {
-    const Statement query = PrepareOnly(db, "SELECT name, type, hidden, pk = 1 AND type = 'INTEGER' COLLATE NOCASE AND "
-                                            "(SELECT max(pk) FROM pragma_table_xinfo(?1)) = 1 "
-                                            "FROM pragma_table_xinfo(?1) WHERE hidden <> 2");
+    const Statement query = prepare(db, "SELECT name, type, hidden, pk = 1 AND type = 'INTEGER' COLLATE NOCASE AND "
+                                        "(SELECT max(pk) FROM pragma_table_xinfo(?1)) = 1 "
+                                        "FROM pragma_table_xinfo(?1) WHERE hidden <> 2");
     sqlite3_bind_text(query.get(), 1, name_.c_str(), -1, SQLITE_STATIC);
     std::string names = "rowid";
     std::string places = "?1";
-    while (sqlite3_step(query.get()) == SQLITE_ROW) {
+    while (nextRow(query)) {
         const std::string type = textOf(query.get(), 1);
         const bool given = sqlite3_column_int(query.get(), 2) == 0;
         const bool alias = sqlite3_column_int(query.get(), 3) != 0;
@@ -93,8 +123,7 @@ void TargetTable::readColumns(sqlite3* db) {
             places += ", ?" + std::to_string(columns_.size() + 1);
         }
     }
-    insert_ = PrepareOnly(
-        db, ("INSERT OR IGNORE INTO " + quoted(name_) + " (" + names + ") VALUES (" + places + ")").c_str());
+    insert_ = prepare(db, "INSERT OR IGNORE INTO " + quoted(name_) + " (" + names + ") VALUES (" + places + ")");
 }
 
 bool TargetTable::fits(const Row& row) const {
@@ -116,7 +145,7 @@ int TargetTable::insert(const Row& row, uint32_t encoding, bool& added) {
     sqlite3_bind_int64(insert_.get(), 1, row.id);
     for (size_t i = 0; i < std::min(columns_.size(), row.values.size()); ++i) {
         if (columns_[i].written) {
-            bind(insert_.get(), static_cast<int>(i) + 2, row.values[i], encoding);
+            withMemory(bind(insert_.get(), static_cast<int>(i) + 2, row.values[i], encoding));
         }
     }
     const int status = sqlite3_step(insert_.get());
@@ -126,14 +155,24 @@ int TargetTable::insert(const Row& row, uint32_t encoding, bool& added) {
     return status;
 }
 
-Schema SchemaOfText(const std::string& sql) {
+Database OpenScratch() {
     sqlite3* raw = nullptr;
     const int status = sqlite3_open(":memory:", &raw);
-    const Database db(raw);
-    if (status != SQLITE_OK || sqlite3_exec(raw, sql.c_str(), nullptr, nullptr, nullptr) != SQLITE_OK) {
-        return {};
-    }
-    return readSchema(raw);
+    Database db(raw);
+    withMemory(status);
+    return db;
+}
+
+bool CanUse(sqlite3* db, const Definition& definition) {
+    return define(db, definition.sql, "CREATE TABLE") == SQLITE_DONE &&
+           prepare(db, "SELECT * FROM " + quoted(definition.name)) != nullptr;
+}
+
+Schema SchemaOfText(const std::string& sql) {
+    const Database db = OpenScratch();
+    return withMemory(sqlite3_exec(db.get(), sql.c_str(), nullptr, nullptr, nullptr)) == SQLITE_OK
+               ? readSchema(db.get())
+               : Schema();
 }
 
 Schema SchemaOfFile(const char* path) {
@@ -141,22 +180,25 @@ Schema SchemaOfFile(const char* path) {
     return SchemaOfText({std::istreambuf_iterator<char>(file), {}});
 }
 
-std::vector<TargetTable> CreateTables(sqlite3* db, const Schema& schema) {
-    std::vector<TargetTable> tables;
+bool CreateTables(sqlite3* db, const Schema& schema, std::vector<TargetTable>& tables) {
     for (const Definition& definition : schema) {
-        if (definition.type == "table" && define(db, definition.sql, "CREATE TABLE")) {
+        const int status = definition.type == "table" ? define(db, definition.sql, "CREATE TABLE") : SQLITE_ERROR;
+        if (status == SQLITE_DONE) {
             tables.emplace_back(db, definition);
+        } else if (!isRefusal(status)) {
+            return false;
         }
     }
-    return tables;
+    return true;
 }
 
-void CreateIndexes(sqlite3* db, const Schema& schema) {
-    for (const Definition& definition : schema) {
-        if (definition.type == "index" && !define(db, definition.sql, "CREATE INDEX")) {
-            (void)define(db, definition.sql, "CREATE UNIQUE INDEX");  // fails when the rows are not unique
-        }
-    }
+bool CreateIndexes(sqlite3* db, const Schema& schema) {
+    return std::all_of(schema.begin(), schema.end(), [db](const Definition& definition) {
+        const bool unique = sqlite3_strnicmp(definition.sql.c_str(), "CREATE UNIQUE", 13) == 0;
+        const char* kind = unique ? "CREATE UNIQUE INDEX" : "CREATE INDEX";
+        const int status = definition.type == "index" ? define(db, definition.sql, kind) : SQLITE_ERROR;
+        return status == SQLITE_DONE || isRefusal(status);
+    });
 }
 
 }  // namespace quor::salvage

@@ -15,7 +15,7 @@
 namespace quor::salvage {
 
 struct DatabaseCloser {
-    void operator()(sqlite3* db) const { sqlite3_close(db); }
+    void operator()(sqlite3* db) const { sqlite3_close_v2(db); }  // tables may still hold statements of theirs
 };
 using Database = std::unique_ptr<sqlite3, DatabaseCloser>;
 
@@ -63,10 +63,17 @@ class TargetTable {
 Schema SchemaOfFile(const char* path);
 Schema SchemaOfText(const std::string& sql);
 
+// A database in memory.
+Database OpenScratch();
+
+// Creates the table in a database without it; false unless it can be read then, as what is left of a definition may
+// not.
+bool CanUse(sqlite3* db, const Definition& definition);
+
 // Creates the tables of a schema (its indexes are left for later) and describes them. A definition that is not a plain
-// table is skipped.
-std::vector<TargetTable> CreateTables(sqlite3* db, const Schema& schema);
-void CreateIndexes(sqlite3* db, const Schema& schema);
+// table, or an index that the rows do not allow, is skipped; false when the database cannot be written.
+bool CreateTables(sqlite3* db, const Schema& schema, std::vector<TargetTable>& tables);
+bool CreateIndexes(sqlite3* db, const Schema& schema);
 
 }  // namespace quor::salvage
 
