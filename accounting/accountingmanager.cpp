@@ -1,5 +1,6 @@
 #include <ctime>
 #include <limits>
+#include <new>
 
 #include "accounting/deviceindex.h"
 #include "common.h"
@@ -27,7 +28,11 @@ AccountingManager::AccountingManager() : index_(std::make_unique<DeviceIndex>())
 }
 
 AccountingManager::~AccountingManager() {
-    (void)AccoutingFlush2DB();  // reports its own failure
+    try {
+        (void)AccoutingFlush2DB();  // reports its own failure
+    } catch (const std::bad_alloc&) {
+        return;  // there was no memory left to report that it failed
+    }
 }
 
 int AccountingManager::ConfigLoad() {

@@ -2,13 +2,14 @@
 #include <sys/stat.h>
 
 #include <algorithm>
+#include <new>
 
 #include "accounting/deviceindex.h"
 #include "common.h"
 #include "common/guards.h"
 #include "common/numbers.h"
 #include "common/paths.h"
-#include "dbhandler.h"
+#include "dbhandler/session.h"
 
 namespace {
 
@@ -21,14 +22,17 @@ constexpr const char* kPurge = "DELETE FROM eps WHERE stamp < strftime('%s', 'no
 
 // Ends the transaction, rolled back or never started as it may be, and the connection.
 struct Session {
-    DBHandler db;
+    quor::DbSession db;
 
     explicit Session(const std::string& path) : db(path, quor::paths::kAccountingSchema) {}
     Session(const Session&) = delete;
     Session& operator=(const Session&) = delete;
     ~Session() {
-        (void)db.DBTranEnd();
-        (void)db.DBDiscon();
+        try {
+            (void)db->DBTranEnd();
+        } catch (const std::bad_alloc&) {
+            return;  // there was no memory left to report that it failed
+        }
     }
 };
 
@@ -98,12 +102,12 @@ int AccountingManager::AccoutingFlush2DB() {
         return 0;
     }
     Session session(dbPath_);
-    if (session.db.DBCon() < 0) {
-        Debuger::MSG(0, "Fail to connect db");
+    if (!session.db.connect()) {
         return -1;
     }
-    (void)session.db.DBTranStart();  // reports its own failure; the statements then stand alone
-    if (!writeSamples(session.db, epsList_) || !writeHistogram(session.db, histogram_) || !purge(session.db, dbPath_)) {
+    DBHandler& db = *session.db.operator->();
+    (void)db.DBTranStart();  // reports its own failure; the statements then stand alone
+    if (!writeSamples(db, epsList_) || !writeHistogram(db, histogram_) || !purge(db, dbPath_)) {
         return -1;
     }
     epsList_.clear();

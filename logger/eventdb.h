@@ -1,4 +1,4 @@
-// The event database for the length of one call.
+// What the parts of the event log share.
 #ifndef LOGGER_EVENTDB_H
 #define LOGGER_EVENTDB_H
 
@@ -6,30 +6,12 @@
 
 #include "common.h"
 #include "common/paths.h"
-#include "dbhandler.h"
+#include "dbhandler/session.h"
 
 namespace quor {
 
-class EventDb {
-  public:
-    explicit EventDb(const std::string& path) : handler_(path, paths::kEventSchema) {}
-    EventDb(const EventDb&) = delete;
-    EventDb& operator=(const EventDb&) = delete;
-    ~EventDb() { handler_.DBDiscon(); }
-
-    // Creates a missing database. Reports a failure.
-    bool connect() {
-        if (handler_.DBCon() < 0) {
-            Debuger::MSG(0, "Fail to connect db");
-            return false;
-        }
-        return true;
-    }
-
-    DBHandler* operator->() { return &handler_; }
-
-  private:
-    DBHandler handler_;
+struct EventDb : DbSession {
+    explicit EventDb(const std::string& path) : DbSession(path, paths::kEventSchema) {}
 };
 
 // The number as the library writes 32-bit values: a negative one becomes the unsigned one of 64 bits.
