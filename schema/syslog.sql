@@ -1,6 +1,8 @@
 -- A log database. The order of the columns is the order in which searches need them: a keyword search reads no further
 -- than msg, other filters little further. Pages of 16 KiB make such a search read a quarter of the pages.
 PRAGMA page_size = 16384;
+-- All or nothing, so that an interrupted creation leaves no half of a database.
+BEGIN;
 
 CREATE TABLE logs (
     id INTEGER PRIMARY KEY AUTOINCREMENT,
@@ -85,3 +87,5 @@ CREATE VIEW tags AS
     SELECT row_number() OVER () AS tag_id, tag AS tag_name FROM (SELECT DISTINCT tag FROM logs);
 CREATE VIEW facs AS
     SELECT row_number() OVER () AS fac_id, fac AS fac_name FROM (SELECT DISTINCT fac FROM logs);
+
+COMMIT;

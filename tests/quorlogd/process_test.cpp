@@ -66,7 +66,10 @@ class QuorlogdProcess : public testing::Test {
     }
 };
 
+// Also with databases that a full volume left empty.
 TEST_F(QuorlogdProcess, AccountsTheInputUpToItsEnd) {
+    WriteFile(paths::kEventDb, "");
+    WriteFile(paths::kAccountingDb, "");
     Quorlogd daemon("--max-line 1024");
     const std::string text = entry("router1", "it's up") + "not an entry\n\n" + entry("router2", "") +
                              entry("router1", std::string(1 << 20, 'x')) + entry("router1", "the last, without an end");

@@ -4,9 +4,10 @@
 #include <syslog.h>
 
 #include "common/paths.h"
-#include "dbhandler.h"
+#include "dbhandler/session.h"
 #include "logger.h"
 #include "notification.h"
+#include "quor/quorcore.h"
 
 namespace quor {
 namespace {
@@ -22,7 +23,34 @@ double usedPercent(const std::string& folder) {
     return usable > 0 ? 100 * used / usable : 0;
 }
 
+// A database that was created on a full volume has no tables, and is not created again because it is there.
+void complete(const char* path, const char* schema, const char* table) {
+    DbSession db(path, schema);
+    if (QLIBCFileExist(path) != 0 && db.connect() && db->DBcheckTableExist(table) == 0) {
+        (void)db->DBCreate();  // reports its own failure, and leaves tables that are there alone
+    }
+}
+
+void completeAll() {
+    complete(paths::kEventDb, paths::kEventSchema, "log");
+    complete(paths::kAccountingDb, paths::kAccountingSchema, "histogram");
+}
+
 }  // namespace
+
+void PrepareDatabases() {
+    completeAll();
+    constexpr int kTries = 3;  // each waits for a lock
+    for (int i = 0; i < kTries && QLIBCFileExist(paths::kAccountingDb) != 0; ++i) {
+        DbSession db(paths::kAccountingDb, paths::kAccountingSchema);
+        if (db.connect() && db->DBExecute("SELECT 1 FROM histogram") == 0) {
+            return;
+        }
+    }
+    if (QLIBCFileExist(paths::kAccountingDb) != 0) {
+        syslog(LOG_WARNING, "%s cannot be read: its counts begin again from zero", paths::kAccountingDb);
+    }
+}
 
 void Housekeeping::checkVolume() {
     const double used = usedPercent(options_.volume);
@@ -41,6 +69,7 @@ void Housekeeping::checkVolume() {
 }
 
 void Housekeeping::check() {
+    completeAll();
     if (options_.volumeFullPercent > 0) {
         checkVolume();
     }

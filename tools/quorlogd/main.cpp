@@ -7,6 +7,7 @@
 
 #include "common/paths.h"
 #include "quorlogd/daemon.h"
+#include "quorlogd/housekeeping.h"
 
 namespace {
 
@@ -58,6 +59,7 @@ int run(int argc, char** argv) {
         return app.exit(error) == 0 ? 0 : 2;
     }
     openlog("quorlogd", LOG_PID | (options.toStandardError ? LOG_PERROR : 0), LOG_DAEMON);
+    quor::PrepareDatabases();
     return quor::Daemon(options, STDIN_FILENO).run();
 }
 
