@@ -3,7 +3,10 @@
 #include <cstdarg>
 #include <cstdio>
 #include <fstream>
+#include <new>
 #include <utility>
+
+#include "common/guards.h"
 
 namespace {
 
@@ -39,17 +42,20 @@ std::vector<std::string> TakeSystemLogTexts() {
 
 }  // namespace quor::test
 
+// Like the real one it never fails: without memory the line is lost.
 extern "C" void syslog(int priority, const char* format, ...) {
     va_list arguments;
     va_start(arguments, format);
-    char* text = nullptr;
-    const int length = vasprintf(&text, format, arguments);
+    char* raw = nullptr;
+    const int length = vasprintf(&raw, format, arguments);
     va_end(arguments);
-    if (length >= 0) {
-        written().push_back({priority, text});
+    const quor::CText text(length >= 0 ? raw : nullptr);
+    try {
+        written().push_back({priority, text != nullptr ? text.get() : format});
         if (!copyPath().empty()) {
-            std::ofstream(copyPath(), std::ios::app) << text << std::endl;
+            std::ofstream(copyPath(), std::ios::app) << text.get() << std::endl;
         }
-        free(text);
+    } catch (const std::bad_alloc&) {
+        return;
     }
 }

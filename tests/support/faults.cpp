@@ -1,0 +1,185 @@
+#include "support/faults.h"
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstdarg>
+#include <cstdio>
+#include <cstdlib>
+#include <new>
+
+#include "support/real.h"
+
+namespace {
+
+using quor::test::Real;
+using quor::test::Resource;
+
+// Plain numbers: allocations happen before anything is constructed.
+bool armed;
+bool lasting;
+bool hit;
+int left;
+Resource failing;
+[[maybe_unused]] int64_t blocks;
+
+// `frees`: a full disk does not keep anyone from it.
+bool fails(Resource resource, bool frees = false) {
+    if (!armed || resource != failing || (frees && lasting) || --left > 0) {
+        return false;
+    }
+    armed = lasting;
+    hit = true;
+    errno = resource == Resource::Memory ? ENOMEM : lasting ? ENOSPC : EIO;
+    return true;
+}
+
+}  // namespace
+
+namespace quor::test {
+
+Fault::Fault(Resource resource, int nth, bool onwards) {
+    failing = resource;
+    left = nth;
+    lasting = onwards;
+    hit = false;
+    armed = true;
+}
+
+Fault::~Fault() {
+    armed = false;
+}
+
+bool Fault::struck() {
+    return hit;
+}
+
+}  // namespace quor::test
+
+// With files of 64 bits these names stand for open64, pwrite64 and so on. The system's own parameters have reserved
+// names. NOLINTBEGIN(readability-inconsistent-declaration-parameter-name)
+
+int open(const char* path, int flags, ...) {
+    va_list arguments;
+    va_start(arguments, flags);
+    const auto mode = va_arg(arguments, mode_t);
+    va_end(arguments);
+    return fails(Resource::Disk) ? -1 : Real(open, "open64")(path, flags, mode);
+}
+
+int mkostemp(char* name, int flags) {
+    return fails(Resource::Disk) ? -1 : Real(mkostemp, "mkostemp64")(name, flags);
+}
+
+FILE* fopen(const char* path, const char* mode) {
+    return fails(Resource::Disk) ? nullptr : Real(fopen, "fopen64")(path, mode);
+}
+
+ssize_t write(int file, const void* data, size_t size) {
+    return fails(Resource::Disk) ? -1 : Real(write, "write")(file, data, size);
+}
+
+ssize_t pwrite(int file, const void* data, size_t size, off_t offset) {
+    return fails(Resource::Disk) ? -1 : Real(pwrite, "pwrite64")(file, data, size, offset);
+}
+
+int ftruncate(int file, off_t size) noexcept {
+    return fails(Resource::Disk) ? -1 : Real(ftruncate, "ftruncate64")(file, size);
+}
+
+int fsync(int /*file*/) {
+    return fails(Resource::Disk) ? -1 : 0;
+}
+
+int fdatasync(int /*file*/) {
+    return fails(Resource::Disk) ? -1 : 0;
+}
+
+int rename(const char* from, const char* to) noexcept {
+    return fails(Resource::Disk) ? -1 : Real(rename, "rename")(from, to);
+}
+
+int unlink(const char* path) noexcept {
+    return fails(Resource::Disk, true) ? -1 : Real(unlink, "unlink")(path);
+}
+
+int mkdir(const char* path, mode_t mode) noexcept {
+    return fails(Resource::Disk) ? -1 : Real(mkdir, "mkdir")(path, mode);
+}
+
+#ifdef __SANITIZE_ADDRESS__
+
+int64_t quor::test::LiveBlocks() {
+    return 0;
+}
+
+void* operator new(size_t size) {
+    void* block = fails(Resource::Memory) ? nullptr : malloc(size);
+    if (block == nullptr) {
+        throw std::bad_alloc();
+    }
+    return block;
+}
+
+void operator delete(void* block) noexcept {
+    free(block);
+}
+
+void operator delete(void* block, size_t /*size*/) noexcept {
+    free(block);
+}
+
+#else
+
+int64_t quor::test::LiveBlocks() {
+    return blocks;
+}
+
+namespace {
+
+void* counted(void* block) {
+    blocks += block != nullptr ? 1 : 0;
+    return block;
+}
+
+}  // namespace
+
+extern "C" {
+
+void* __libc_malloc(size_t size);
+void* __libc_calloc(size_t count, size_t size);
+void* __libc_realloc(void* block, size_t size);
+void* __libc_memalign(size_t alignment, size_t size);
+void __libc_free(void* block);
+
+void* malloc(size_t size) noexcept {
+    return fails(Resource::Memory) ? nullptr : counted(__libc_malloc(size));
+}
+
+void* calloc(size_t count, size_t size) noexcept {
+    return fails(Resource::Memory) ? nullptr : counted(__libc_calloc(count, size));
+}
+
+void* realloc(void* block, size_t size) noexcept {
+    if (fails(Resource::Memory)) {
+        return nullptr;
+    }
+    void* moved = __libc_realloc(block, size);
+    return block == nullptr ? counted(moved) : moved;
+}
+
+void* aligned_alloc(size_t alignment, size_t size) noexcept {
+    return fails(Resource::Memory) ? nullptr : counted(__libc_memalign(alignment, size));
+}
+
+void free(void* block) noexcept {
+    blocks -= block != nullptr ? 1 : 0;
+    __libc_free(block);
+}
+}
+
+#endif
+
+// NOLINTEND(readability-inconsistent-declaration-parameter-name)
