@@ -31,8 +31,8 @@ Selection selectionOf(const DeleteOptions& options) {
     Selection selection{{}, "logs", BuildFilter(options.filters, "logs", time(nullptr))};
     const bool filtered = !selection.filter.conditions.empty();
     if (!selection.filter.literal.empty()) {
-        throw Failure(
-            "--keyword: rows cannot be deleted by a text with * or ?; give --glob, where they match any text");
+        throw Failure("--keyword: rows cannot be deleted by a text with * or ?, or one that is no UTF-8; give --glob, "
+                      "where * and ? match any text");
     }
     if (filtered == options.all) {
         throw Failure(filtered ? "--all deletes every row; leave out the filters or --all"

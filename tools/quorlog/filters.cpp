@@ -87,9 +87,25 @@ bool holdsWildcard(const std::string& text) {
     return text.find_first_of("*?") != std::string::npos;
 }
 
+// The database compares a pattern by characters and takes every byte that belongs to none for U+FFFD, and so the two
+// codes behind it.
+bool comparesExactly(const std::string& text) {
+    for (size_t at = 0; at < text.size();) {
+        const Symbol symbol = NextSymbol(text, at);
+        if (!symbol.valid || (symbol.code >= 0xFFFD && symbol.code <= 0xFFFF)) {
+            return false;
+        }
+        at += symbol.length;
+    }
+    return true;
+}
+
 std::string patternOf(const FilterOptions& options) {
     if (options.keyword.empty()) {
         return options.glob == "**" ? "" : options.glob;  // matches everything, which the library takes for no filter
+    }
+    if (!comparesExactly(options.keyword)) {
+        return "?*";  // the literal decides
     }
     std::string pattern = "*" + options.keyword + "*";
     std::replace(pattern.begin() + 1, pattern.end() - 1, '*', '?');
@@ -109,6 +125,9 @@ void check(const FilterOptions& options, const std::string& table) {
     checkNames("--program", options.program);
     if (std::max(options.keyword.size(), options.glob.size()) > kMaxPattern) {
         throw Failure("the text to search for is too long; give at most " + std::to_string(kMaxPattern) + " bytes");
+    }
+    if (!comparesExactly(options.glob)) {
+        throw Failure("--glob: the pattern holds bytes that are no UTF-8; give --keyword, which takes any");
     }
 }
 
@@ -137,7 +156,8 @@ Filter BuildFilter(const FilterOptions& options, const std::string& table, time_
     Filter filter;
     LogSearchCondListGen(checked.host, checked.level, checked.facility, checked.program, pattern, checked.from,
                          checked.to, filter.conditions);
-    filter.literal = holdsWildcard(options.keyword) ? options.keyword : "";
+    const bool literal = holdsWildcard(options.keyword) || !comparesExactly(options.keyword);
+    filter.literal = literal ? options.keyword : "";
     return filter;
 }
 
