@@ -1,40 +1,27 @@
 // Hostile values through every path that reaches SQL. SQLite's authorizer sees what each statement does.
 #include <dlfcn.h>
-#include <gtest/gtest.h>
-#include <sqlite3.h>
 
-#include <random>
+#include <CLI/CLI.hpp>
+#include <functional>
 
+#include "accounting.h"
+#include "commands.h"
 #include "common/guards.h"
 #include "dbhandler.h"
 #include "dbutil.h"
-#include "support/sqlite_file.h"
-#include "support/system_log.h"
-#include "support/temp_folder.h"
+#include "failure.h"
+#include "injection.h"
+#include "logger.h"
+#include "support/clock.h"
 
-namespace {
-
-// Actions of SQLite beside reading and calling its functions.
-std::vector<int>& actions() {
-    static std::vector<int> seen;
-    return seen;
-}
-
-int watch(void* /*context*/, int action, const char*, const char*, const char*, const char*) {
-    if (action != SQLITE_SELECT && action != SQLITE_READ && action != SQLITE_FUNCTION) {
-        actions().push_back(action);
-    }
-    return SQLITE_OK;
-}
-
-}  // namespace
-
-// Every connection of the library is watched.
+// Every connection of the library is watched, and does not wait for the disk.
 DBConnect_tag* QUORDBConnect(const char* host, const char* user, const char* password, const char* path) {
     static const auto real = reinterpret_cast<decltype(&QUORDBConnect)>(dlsym(RTLD_NEXT, "QUORDBConnect"));
     DBConnect_tag* connection = real(host, user, password, path);
     if (connection != nullptr) {
-        sqlite3_set_authorizer(static_cast<sqlite3*>(QUORDBInternalDBHdlGet(connection)), watch, nullptr);
+        auto* db = static_cast<sqlite3*>(QUORDBInternalDBHdlGet(connection));
+        sqlite3_exec(db, "PRAGMA synchronous=OFF", nullptr, nullptr, nullptr);
+        sqlite3_set_authorizer(db, quor::test::Watch, nullptr);
     }
     return connection;
 }
@@ -42,127 +29,245 @@ DBConnect_tag* QUORDBConnect(const char* host, const char* user, const char* pas
 namespace quor::test {
 namespace {
 
+using Conditions = std::list<_SYSLOG_SQL_COND_tag>;
+
 class Injection : public testing::Test {
   protected:
     Injection() {
         SqliteFile(path_).run(
-            "CREATE TABLE logs(id INTEGER PRIMARY KEY, host TEXT, ip TEXT, fac TEXT, prio TEXT, llevel TEXT GENERATED "
-            "ALWAYS AS (prio) VIRTUAL, tag TEXT, utcsec INTEGER, tzoffset TEXT, ldate TEXT, ltime TEXT, prog TEXT, "
-            "msg TEXT); CREATE TABLE histogram(id INTEGER PRIMARY KEY, device TEXT UNIQUE, count INTEGER);"
+            "CREATE TABLE histogram(id, device, count); CREATE TABLE logs(id INTEGER PRIMARY KEY, msg, prio, llevel "
+            "GENERATED ALWAYS AS (prio), ldate, host, prog, fac, ltime, ip, tag, utcsec, tzoffset);"
             "INSERT INTO logs(id, host, msg) VALUES(1, 'kept', 'kept'), (2, 'other', 'other')");
-        bytes_ = ReadFile(path_);
-    }
-
-    // Pieces that mean something to SQL, and bytes that mean nothing.
-    std::string value() {
-        static const std::vector<std::string> pieces = {"'",
-                                                        "\"",
-                                                        ";",
-                                                        "--",
-                                                        "/*",
-                                                        "*/",
-                                                        "[",
-                                                        "]",
-                                                        "\\",
-                                                        "%",
-                                                        "_",
-                                                        "`",
-                                                        "\xff",
-                                                        "\xc3",
-                                                        " OR ",
-                                                        "1=1",
-                                                        ")",
-                                                        "(",
-                                                        "''",
-                                                        "x",
-                                                        "\x1b[",
-                                                        "\n",
-                                                        "*",
-                                                        "?",
-                                                        "DROP TABLE logs",
-                                                        "DELETE FROM logs",
-                                                        "UNION SELECT"};
-        std::string text;
-        for (auto left = random_() % 8; left > 0; --left) {
-            text += random_() % 12 == 0 ? std::string(1, '\0') : pieces[random_() % pieces.size()];
+        for (const char* path : {paths::kAccountingDb, paths::kEventDb}) {
+            WriteFile(path, "");
+            std::filesystem::remove(path);
         }
-        return text;
+        TakeActions();
     }
-
-    static int count(_SYSLOG_LOG_DATA_tag& /*record*/, void* rows) {
-        ++*static_cast<int*>(rows);
-        return 0;
-    }
+    ~Injection() override { TakeSystemLog(); }
 
     TempFolder folder_;
     std::string path_ = folder_.path("logs.db");
-    std::string bytes_;
-    std::mt19937 random_{2024};
+    Hostile hostile_;
 };
 
-// Values that the library escapes: a text that is nobody's finds nothing, and nothing but reading happens.
-TEST_F(Injection, EscapedValuesOnlyCompare) {
+// An escaped value only compares. One that the library documents as unescaped may read other rows or fail, but its
+// statement stays the only one, and writes nothing that it was not to write.
+TEST_F(Injection, EveryStatementStaysWhatItIs) {
+    const std::string copy = folder_.write("copy.db", ReadFile(path_));
+    DBHandler handle(copy, "");
+    ASSERT_TRUE(handle.DBCon() == 0 && handle.DBTranStart() == 0);
+    std::string hostile;
+    std::string table;
+    std::string logs = "logs";
+    Conditions nobody;
+    Conditions number;
+    Conditions none;
+    std::list<std::string> values;
+    int rows = 0;
+    const auto count = [](auto& /*record*/, void* seen) {
+        ++*static_cast<int*>(seen);
+        return 0;
+    };
+    const auto select = [&](std::string& from, Conditions& conditions) {
+        return SyslogDBSelectByTable(path_, from, conditions, nullptr, nullptr, count, &rows, false);
+    };
+    const auto keep = [](DBResult_tag* result, void* text) {
+        *static_cast<std::string*>(text) = QUORDBFetchField(result, 0, "msg");
+        return 0;
+    };
+    const std::pair<Actions, std::function<bool()>> calls[] = {
+        {{}, [&] { return select(logs, nobody) == 0 && rows == 0; }},
+        {{}, [&] { return SyslogDBSelectCount(path_, nobody, nullptr, nullptr) == 0; }},
+        {{"DELETE logs"}, [&] { return SyslogDBDelete(path_, nobody) == 0; }},
+        {{}, [&] { return select(logs, number) <= 0; }},
+        {{}, [&] { return select(table, none) <= 0; }},
+        {{}, [&] { return SyslogDBHistGetSingle(path_, hostile) == 0; }},
+        {{}, [&] { return SyslogDBAttriValueGet(path_, hostile, nullptr, values) == -1; }},
+        {{"UPDATE logs"}, [&] {
+             std::string stored;
+             return handle.DBExecute("UPDATE logs SET msg='" + handle.DBCmdEscape(hostile) + "' WHERE id=1") == 0 &&
+                    handle.DBExecute("SELECT msg FROM logs WHERE id=1", keep, &stored) == 0 &&
+                    strcmp(stored.c_str(), hostile.c_str()) == 0;
+         }}};
+    TakeActions();
     for (int i = 0; i < 10000; ++i) {
-        const std::string hostile = "nobody" + value();
-        std::list<_SYSLOG_SQL_COND_tag> conditions{{SYSLOG_ATTRI_HOST, 0, hostile, {}}};
-        conditions.front().op = std::vector<int>{0, 6, 8}[static_cast<size_t>(i) % 3];
-        conditions.front().orList.push_back({SYSLOG_ATTRI_MSG, conditions.front().op, hostile, {}});
-        int rows = 0;
-        actions().clear();
-        ASSERT_EQ(SyslogDBSelect(path_, conditions, nullptr, nullptr, count, &rows, false), 0) << hostile;
-        ASSERT_EQ(rows, 0) << hostile;
-        ASSERT_EQ(SyslogDBSelectCount(path_, conditions, nullptr, nullptr), 0) << hostile;
-        ASSERT_TRUE(actions().empty()) << hostile;
-        if (i % 10 == 0) {
-            ASSERT_EQ(SyslogDBDelete(path_, conditions), 0) << hostile;
-            ASSERT_EQ(actions(), std::vector<int>{SQLITE_DELETE}) << hostile;
+        hostile = hostile_.value();
+        table = "logs " + hostile;
+        number = {{SYSLOG_ATTRI_ID, 0, "1 " + hostile, {}}};
+        nobody = {{SYSLOG_ATTRI_HOST, 0, "no" + hostile, {}}};
+        nobody.front().orList = {{SYSLOG_ATTRI_MSG, 6, "no" + hostile, {}}, {SYSLOG_ATTRI_MSG, 8, "no" + hostile, {}}};
+        rows = 0;
+        for (const auto& [allowed, call] : calls) {
+            ASSERT_TRUE(call()) << hostile;
+            ASSERT_EQ(TakeActions(), allowed) << hostile;
         }
     }
-    EXPECT_EQ(SqliteFile(path_).query("SELECT group_concat(host) FROM logs"), std::vector<std::string>{"kept,other"});
+    ASSERT_EQ(handle.DBTranEnd() + handle.DBDiscon(), 0);
+    EXPECT_EQ(SqliteFile(path_).query("SELECT host, msg FROM logs"), (Strings{"kept", "kept", "other", "other"}));
+    EXPECT_EQ(SqliteFile(copy).query("SELECT msg FROM logs WHERE id = 2"), Strings{"other"});
 }
 
-// Values that the library documents as unescaped: the statement may fail or read other rows, but stays the one
-// statement that it was, and writes nothing that it was not to write.
-TEST_F(Injection, UnescapedValuesNeverRunAnotherStatement) {
-    for (int i = 0; i < 10000; ++i) {
-        const std::string hostile = value();
-        std::list<_SYSLOG_SQL_COND_tag> number{{SYSLOG_ATTRI_ID, 0, "1 " + hostile, {}}};
-        std::string table = "logs " + hostile;
-        std::list<_SYSLOG_SQL_COND_tag> none;
-        std::string attribute = hostile;
-        std::list<std::string> values;
-        int rows = 0;
-        actions().clear();
-        (void)SyslogDBSelect(path_, number, nullptr, nullptr, count, &rows, false);
-        (void)SyslogDBSelectByTable(path_, table, none, nullptr, nullptr, count, &rows, false);
-        (void)SyslogDBHistGetSingle(path_, hostile);
-        EXPECT_EQ(SyslogDBAttriValueGet(path_, attribute, nullptr, values), -1) << hostile;
-        ASSERT_TRUE(actions().empty()) << hostile;
+// Events are stored unescaped, each by one INSERT: whole when they hold no apostrophe; otherwise the statement is
+// refused, or touches the table of events alone.
+TEST_F(Injection, EventsTouchNothingButTheirTable) {
+    using Record = int (*)(Logger&, const std::string&);
+    const std::tuple<std::string, std::string, Record> recorders[] = {
+        // what stands before and after the text
+        {"SYSTEM ", "", [](auto& log, auto& text) { return log.LogAdd(paths::kEventDb, 0, "SYSTEM", text); }},
+        {"", " x", [](auto& log, auto& text) { return log.LogAdd(paths::kEventDb, 0, text, "x"); }},
+        {"SYSTEM Event detection: Received log which contains [", "]. Log content: [x]",
+         [](auto& log, auto& text) { return log.LogAddNotifyKw(text, "x"); }},
+        {"SYSTEM ", " was cleared by x", [](auto& log, auto& text) { return log.LogAddLogClear(text, "x"); }}};
+    const Actions possible{"BEGIN", "COMMIT", "INSERT log", "UPDATE log"};
+    Logger log;
+    ASSERT_EQ(log.LogAddVolFull(), 0);
+    SqliteFile file(paths::kEventDb);
+    file.run("CREATE TABLE logs(id INTEGER); INSERT INTO logs VALUES(7)");
+    const std::string newest = "SELECT id, user || ' ' || event FROM log ORDER BY id DESC LIMIT 1";
+    Strings last = file.query(newest);
+    for (size_t i = 0; i < 10000; ++i) {
+        const auto& [before, after, record] = recorders[i % std::size(recorders)];
+        const std::string text = hostile_.value();
+        const bool whole = text.find_first_of(std::string("'\0", 2)) == std::string::npos;
+        const int result = record(log, text);
+        const Strings stored = file.query(newest);
+        ASSERT_EQ(stored != last, result == 0) << text;
+        ASSERT_TRUE(!whole || (result == 0 && stored[1] == std::string(before).append(text).append(after))) << text;
+        const Actions seen = TakeActions();
+        ASSERT_TRUE(std::includes(possible.begin(), possible.end(), seen.begin(), seen.end())) << text;
+        last = stored;
     }
-    EXPECT_EQ(ReadFile(path_), bytes_);
-    TakeSystemLog();
+    EXPECT_EQ(std::to_string(log.LogEnum(paths::kEventDb, 0, 0).size()), last[0]);
+    // What an attacker who knows the statement can make of it.
+    for (const auto& [text, result] : std::map<std::string, int>{
+             {"x'); DELETE FROM log; --", -1},
+             {"x'),(NULL,'2','0','admin','forged", 0},
+             {"x'),(1,'0','0','admin','changed') ON CONFLICT(id) DO UPDATE SET event=excluded.event --", 0}}) {
+        EXPECT_EQ(log.LogAdd(paths::kEventDb, 0, "SYSTEM", text), result) << text;
+    }
+    EXPECT_EQ(file.query("SELECT event FROM log WHERE id = 1 OR event = 'forged'"), (Strings{"changed", "forged"}));
+    EXPECT_EQ(file.query("SELECT id FROM logs"), Strings{"7"});
 }
 
-// Text that is escaped first is stored as it was, up to a zero byte.
-TEST_F(Injection, EscapedTextIsStoredAsItWas) {
-    DBHandler handle(path_, "");
-    ASSERT_EQ(handle.DBCon(), 0);
-    ASSERT_EQ(handle.DBTranStart(), 0);
+TEST_F(Injection, DevicesAreCountedUnderTheirNames) {
+    std::map<std::string, unsigned long long> counts;
+    AccountingManager accounting;
     for (int i = 0; i < 10000; ++i) {
-        const std::string hostile = value();
-        actions().clear();
-        ASSERT_EQ(handle.DBExecute("UPDATE logs SET msg='" + handle.DBCmdEscape(hostile) + "' WHERE id=1"), 0);
-        ASSERT_EQ(actions(), std::vector<int>{SQLITE_UPDATE}) << hostile;
-        const auto compare = [](DBResult_tag* result, void* expected) {
-            EXPECT_STREQ(QUORDBFetchField(result, 0, "msg"), static_cast<std::string*>(expected)->c_str());
-            return 0;
-        };
-        std::string expected = hostile;
-        ASSERT_EQ(handle.DBExecute("SELECT msg FROM logs WHERE id=1", compare, &expected), 0);
+        SetClock(1000 + i / 100);
+        const std::string device = hostile_.argument();
+        EXPECT_EQ(accounting.LogInc(device), 0);
+        ++counts[device];
     }
-    EXPECT_EQ(handle.DBTranEnd(), 0);
-    handle.DBDiscon();
-    EXPECT_EQ(SqliteFile(path_).query("SELECT msg FROM logs WHERE id=2"), std::vector<std::string>{"other"});
+    SetClock(2000);
+    EXPECT_EQ(accounting.CurEpsUpdate(), 0);
+    ResetClock();
+    EXPECT_EQ(accounting.AccoutingFlush2DB(), 0);
+    EXPECT_EQ(TakeActions(), (Actions{"BEGIN", "COMMIT", "INSERT eps", "INSERT histogram"}));
+    std::string path = paths::kAccountingDb;
+    EXPECT_EQ(SyslogDBHistGet(path, 0), counts);
+    EXPECT_EQ(SqliteFile(path).query("SELECT count(*) FROM (SELECT device, sum(eps) FROM eps GROUP BY device EXCEPT "
+                                     "SELECT device, count FROM histogram)"),
+              Strings{"0"});
+}
+
+// quorlog with hostile arguments.
+class InjectionQuorlog : public Injection {
+  protected:
+    using Row = std::array<std::string, 4>;
+
+    // The exit status; the output in `out_`.
+    int quorlog(Strings arguments) {
+        CLI::App app;
+        int status = 0;
+        cli::AddCommands(app, status);
+        std::reverse(arguments.begin(), arguments.end());
+        testing::internal::CaptureStdout();
+        testing::internal::CaptureStderr();
+        try {
+            app.parse(arguments);
+        } catch (const std::runtime_error&) {  // wrong usage, or what the program itself refuses
+            status = 2;
+        }
+        testing::internal::GetCapturedStderr();
+        out_ = testing::internal::GetCapturedStdout();
+        return status;
+    }
+
+    void fill() {
+        SqliteFile file(path_);
+        file.run("BEGIN; DELETE FROM logs");
+        for (int id = 1; id <= 300; ++id) {
+            Row& row = rows_[id];
+            std::generate(row.begin(), row.end(), [this] { return "x" + hostile_.argument(); });
+            char* insert = sqlite3_mprintf("INSERT INTO logs(id, host, prog, fac, msg) VALUES(%d, %Q, %Q, %Q, %Q)", id,
+                                           row[0].c_str(), row[1].c_str(), row[2].c_str(), row[3].c_str());
+            file.run(insert);
+            sqlite3_free(insert);
+        }
+        file.run("COMMIT");
+    }
+
+    // The rows whose field holds the value, or is the value.
+    Strings idsOf(size_t field, const std::string& value) const {
+        Strings ids;
+        for (const auto& [id, row] : rows_) {
+            if (field == 3 ? row[field].find(value) != std::string::npos : row[field] == value) {
+                ids.push_back(std::to_string(id));
+            }
+        }
+        return ids;
+    }
+
+    std::map<int, Row> rows_;
+    std::string out_;
+};
+
+TEST_F(InjectionQuorlog, FiltersFindAndDeleteTheirRowsAlone) {
+    constexpr const char* options[] = {"--host=", "--program=", "--facility=", "--keyword="};
+    for (int i = 0; i < 4000; ++i) {
+        if (rows_.size() < 200) {
+            fill();
+        }
+        const size_t kind = hostile_.number(4);
+        const auto any = std::next(rows_.begin(), static_cast<long>(hostile_.number(rows_.size())));
+        const std::string value = i % 2 == 0 ? any->second[kind] : "x" + hostile_.argument();
+        const Strings ids = idsOf(kind, value);
+        if (i % 7 != 0) {
+            ASSERT_EQ(quorlog({"search", "--format=ndjson", "--db=" + path_, options[kind] + value}), ids.empty());
+            ASSERT_EQ(std::count(out_.begin(), out_.end(), '\n'), static_cast<long>(ids.size())) << value;
+            for (const std::string& id : ids) {
+                ASSERT_NE(out_.find("{\"id\":" + id + ","), std::string::npos) << value;
+            }
+            ASSERT_EQ(TakeActions(), Actions()) << value;
+            continue;
+        }
+        const bool refused = kind == 3 && value.find_first_of("*?\xff\xc3\xef") != std::string::npos;
+        ASSERT_EQ(quorlog({"delete", "--yes", "--db=" + path_, options[kind] + value}), refused ? 2 : ids.empty());
+        ASSERT_EQ(TakeActions(), refused || ids.empty() ? Actions() : Actions{"DELETE logs"}) << value;
+        for (const std::string& id : refused ? Strings() : ids) {
+            rows_.erase(std::stoi(id));
+        }
+        ASSERT_EQ(SqliteFile(path_).query("SELECT id FROM logs ORDER BY id"), idsOf(3, "")) << value;
+    }
+}
+
+// What has to be a number, a name, a pattern or a file is refused before a database is asked.
+TEST_F(InjectionQuorlog, RefusesWhatIsNone) {
+    const std::list<std::string> calls = Tokenize(
+        "search --level=|search --from=|search --to=|search --before=|search --glob=\xff|count --table=|count "
+        "--limit=|count --db=|delete --yes --level=|values |values host --offset=|names |events list --limit=|"
+        "events list --db=|events clear --yes --db=|stats eps --last=|stats top --db=|db info --db=|db wal --db=|"
+        "db limit --yes |db create --db=\"$(",
+        "|");
+    for (const std::string& call : calls) {
+        for (int i = 0; i < 100; ++i) {
+            std::list<std::string> words = Tokenize(call, " ");
+            words.back() += "'" + hostile_.argument();
+            ASSERT_EQ(quorlog({words.begin(), words.end()}), 2) << call << words.back();
+            ASSERT_EQ(TakeActions(), Actions()) << call << words.back();
+        }
+    }
 }
 
 }  // namespace
