@@ -43,8 +43,7 @@ class Hostile {
 
 using Actions = std::set<std::string>;
 
-// What statements did beside reading: "INSERT log", "TRANSACTION BEGIN", or SQLite's number of the action and its
-// object.
+// What statements did beside reading: "INSERT log", "BEGIN", or SQLite's number of any other action with its object.
 inline Actions& Seen() {
     static Actions seen;
     return seen;

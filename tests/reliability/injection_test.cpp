@@ -58,30 +58,29 @@ TEST_F(Injection, EveryStatementStaysWhatItIs) {
     DBHandler handle(copy, "");
     ASSERT_TRUE(handle.DBCon() == 0 && handle.DBTranStart() == 0);
     std::string hostile;
-    std::string table;
-    std::string logs = "logs";
     Conditions nobody;
-    Conditions number;
-    Conditions none;
     std::list<std::string> values;
     int rows = 0;
     const auto count = [](auto& /*record*/, void* seen) {
         ++*static_cast<int*>(seen);
         return 0;
     };
-    const auto select = [&](std::string& from, Conditions& conditions) {
-        return SyslogDBSelectByTable(path_, from, conditions, nullptr, nullptr, count, &rows, false);
+    const auto select = [&](std::string table, Conditions conditions) {
+        return SyslogDBSelectByTable(path_, table, conditions, nullptr, nullptr, count, &rows, false);
     };
     const auto keep = [](DBResult_tag* result, void* text) {
         *static_cast<std::string*>(text) = QUORDBFetchField(result, 0, "msg");
         return 0;
     };
     const std::pair<Actions, std::function<bool()>> calls[] = {
-        {{}, [&] { return select(logs, nobody) == 0 && rows == 0; }},
+        {{}, [&] { return select("logs", nobody) == 0 && rows == 0; }},
         {{}, [&] { return SyslogDBSelectCount(path_, nobody, nullptr, nullptr) == 0; }},
         {{"DELETE logs"}, [&] { return SyslogDBDelete(path_, nobody) == 0; }},
-        {{}, [&] { return select(logs, number) <= 0; }},
-        {{}, [&] { return select(table, none) <= 0; }},
+        {{},
+         [&] {
+             return select("logs", {{SYSLOG_ATTRI_ID, 0, "1 " + hostile, {}}}) <= 0;
+         }},
+        {{}, [&] { return select("logs " + hostile, {}) <= 0; }},
         {{}, [&] { return SyslogDBHistGetSingle(path_, hostile) == 0; }},
         {{}, [&] { return SyslogDBAttriValueGet(path_, hostile, nullptr, values) == -1; }},
         {{"UPDATE logs"}, [&] {
@@ -93,8 +92,6 @@ TEST_F(Injection, EveryStatementStaysWhatItIs) {
     TakeActions();
     for (int i = 0; i < 10000; ++i) {
         hostile = hostile_.value();
-        table = "logs " + hostile;
-        number = {{SYSLOG_ATTRI_ID, 0, "1 " + hostile, {}}};
         nobody = {{SYSLOG_ATTRI_HOST, 0, "no" + hostile, {}}};
         nobody.front().orList = {{SYSLOG_ATTRI_MSG, 6, "no" + hostile, {}}, {SYSLOG_ATTRI_MSG, 8, "no" + hostile, {}}};
         rows = 0;
