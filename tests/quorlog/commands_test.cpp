@@ -18,7 +18,7 @@ class Commands : public Program {
                  "INSERT INTO logs(id, host, ip, fac, prio, tag, utcsec, tzoffset, ldate, ltime, prog, msg) VALUES"
                  "(1,'web','10.0.0.1','auth','err','t',100,'+00:00','2026-01-01','10:00:00','sshd','login? yes'),"
                  "(2,'web','10.0.0.1','kern','info','t',200,'+00:00','2026-01-02','10:00:01','kernel','login, no'),"
-                 "(3,'nas','10.0.0.2','kern','crit','t',300,'+00:00','2026-01-02','10:00:02','kernel','disk [sda]'),"
+                 "(3,'nas','10.0.0.2','kern','emerg','t',300,'+00:00','2026-01-02','10:00:02','kernel','disk [sda]'),"
                  "(5,'nas','10.0.0.2','cron','debug','t',400,'+00:00','2026-01-03','10:00:03','cron','=it''s \"x\"'),"
                  "(6,'O''Neil','10.0.0.3','user','info','t',500,'+00:00','2026-01-04','10:00:04','app',"
                  "'a' || char(10) || char(27) || '[2J' || x'ff');"
@@ -56,7 +56,7 @@ TEST_F(Commands, SearchFindsWhatTheFiltersAskFor) {
         {"--host \"O'Neil\" --host web", "6 2 1"},
         {"--host any --glob '**'", "6 5 3 2 1"},
         {"--level err+", "3 1"},
-        {"--level emerg+,debug", "5"},
+        {"--level emerg+,debug", "5 3"},
         {"--facility kern --program kernel,sshd", "3 2"},
         {"--keyword '[sda]'", "3"},
         {"--keyword 'login?'", "1"},  // not "login,"

@@ -5,21 +5,7 @@
 #include "quorlogd/linesplitter.h"
 #include "quorlogd/noticetext.h"
 
-namespace {
-
 using Texts = std::vector<std::string>;
-
-Texts split(quor::LineSplitter& splitter, const std::string& text, size_t chunk) {
-    Texts lines;
-    const auto keep = [&lines](const std::string& line) { lines.push_back(line); };
-    for (size_t pos = 0; pos < text.size(); pos += chunk) {
-        splitter.feed(std::string_view(text).substr(pos, chunk), keep);
-    }
-    splitter.finish(keep);
-    return lines;
-}
-
-}  // namespace
 
 TEST(LineSplitter, GivesTheSameLinesForAnyChunking) {
     const std::string longest(10, 'x');
@@ -28,7 +14,13 @@ TEST(LineSplitter, GivesTheSameLinesForAnyChunking) {
     const Texts expected{"one", "two" + std::string(1, '\0') + "2", longest, longest, "last"};
     for (const size_t chunk : {size_t{1}, size_t{2}, size_t{7}, size_t{11}, size_t{64}, text.size()}) {
         quor::LineSplitter splitter(longest.size());
-        EXPECT_EQ(split(splitter, text, chunk), expected) << chunk;
+        Texts lines;
+        const auto keep = [&lines](const std::string& line) { lines.push_back(line); };
+        for (size_t pos = 0; pos < text.size(); pos += chunk) {
+            splitter.feed(std::string_view(text).substr(pos, chunk), keep);
+        }
+        splitter.finish(keep);
+        EXPECT_EQ(lines, expected) << chunk;
         EXPECT_EQ(splitter.oversized(), 1U) << chunk;
     }
 }
