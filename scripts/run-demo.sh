@@ -4,11 +4,11 @@
 set -euo pipefail
 cd "$(dirname "$0")/.."
 . scripts/demo/messages.sh
+. scripts/receive.sh
 
 build=$(cd "$1" && pwd)
 root=$build/root
 port=${QUOR_DEMO_PORT:-15514}
-framed_port=$((port + 1))
 smtp_port=$((port + 2))
 db=$root/var/log/quorlog/syslog.db
 rules=$root/etc/quorsyslog/notify.conf
@@ -35,21 +35,9 @@ stop() {
 trap stop EXIT
 trap "exit 0" INT TERM
 
-# Polls a condition for at most 20 seconds.
-await() {
-    local what=$1
-    shift
-    for _ in $(seq 200); do
-        if "$@" > /dev/null 2>&1; then return 0; fi
-        sleep 0.1
-    done
-    fail "$what did not happen within 20 seconds; see $root/syslog-ng.log"
-}
-listening() { (exec 3<> "/dev/tcp/127.0.0.1/$1") 2> /dev/null; }
-
 fresh_root() {
     rm -rf "$root/var/log" "$root/var/spool" "$root/usr/quor/etc" "$root/etc" "$root/run" "$mails"
-    mkdir -p "$root/var/log/quorlog" "$root/etc/quorsyslog" "$root/etc/syslog-ng" "$root/run"
+    mkdir -p "$root/var/log/quorlog" "$root/etc/quorsyslog" "$root/run"
     cp etc/notify.filter "$root/etc/quorsyslog/notify.filter"
     cp scripts/demo/notify.conf "$rules"
     sed -e '/^smtp_mail_enabled=/s/"no"/"yes"/' -e '/^smtp_server=/s/".*"/"127.0.0.1"/' \
@@ -61,23 +49,6 @@ start_mail_server() {
     /usr/bin/python3 -u -m aiosmtpd -n -l "127.0.0.1:$smtp_port" -c aiosmtpd.handlers.Debugging stdout > "$mails" &
     children+=($!)
     await "the start of the mail server on port $smtp_port" listening "$smtp_port"
-}
-
-# The shipped configuration, with the values of this folder.
-start_syslog_ng() {
-    local conf=$root/etc/syslog-ng
-    sed -e "/^@define quor_address /s|\".*\"|\"127.0.0.1\"|" \
-        -e "/^@define quor_port /s|\".*\"|\"$port\"|" \
-        -e "/^@define quor_port_framed /s|\".*\"|\"$framed_port\"|" \
-        -e "/^@define quor_database /s|\".*\"|\"$db\"|" \
-        -e "/^@define quor_receiver /s|\".*\"|\"$receiver\"|" \
-        etc/syslog-ng/quorsyslog.conf > "$conf/quorsyslog.conf"
-    printf '@version: 3.38\n@include "%s"\n' "$conf/quorsyslog.conf" > "$conf/syslog-ng.conf"
-    /usr/sbin/syslog-ng -F --no-caps -f "$conf/syslog-ng.conf" --persist-file "$root/run/syslog-ng.persist" \
-        --control "$root/run/syslog-ng.ctl" --pidfile "$root/run/syslog-ng.pid" > "$root/syslog-ng.log" 2>&1 &
-    children+=($!)
-    echo $! > "$root/run/syslog-ng.pid"
-    await "the start of syslog-ng on port $port" listening "$port"
 }
 
 all_stored() { [ "$("$quorlog" count --format csv | tail -n 1 | tr -d "\r")" -ge "${#sent[@]}" ]; }
@@ -99,7 +70,7 @@ check_found() {
 field() { "$quorlog" "$@" --format csv | tail -n +2 | tr -d '\r'; }
 samples_sum() { field stats eps --last 1d | awk -F, '{ sum += $2 } END { print sum + 0 }'; }
 accounted() {
-    pkill -USR2 -P "$(cat "$root/run/syslog-ng.pid")" quorlogd
+    pkill -USR2 -P "$syslog_ng" quorlogd
     [ "$(field stats total)" = "${#sent[@]}" ] && [ "$(samples_sum)" = "${#sent[@]}" ]
 }
 check_totals() {
@@ -133,7 +104,9 @@ TEXT
 
 fresh_root
 start_mail_server
-start_syslog_ng
+start_syslog_ng "$root/run" "$port" "$db" "$receiver"
+children+=("$syslog_ng")
+echo "$syslog_ng" > "$root/run/syslog-ng.pid"  # where the library looks for it
 say "Sending messages to 127.0.0.1:$port (UDP and TCP, RFC 3164 and RFC 5424) ..."
 send_messages
 await "the arrival of ${#sent[@]} messages" all_stored

@@ -4,30 +4,27 @@
 # Usage: soak-database.sh BUILD_FOLDER [SECONDS [ROWS_KEPT]]
 set -euo pipefail
 cd "$(dirname "$0")/.."
+. scripts/receive.sh
 
 build=$(cd "$1" && pwd)
 seconds=${2:-600}
 port=${QUOR_SOAK_PORT:-15614}
 folder=$(mktemp -d /tmp/quor-soak-XXXXXX)
 db=$folder/syslog.db
-writer=
+syslog_ng=
 
-stop() { [ -z "$writer" ] || { kill "$writer" 2> /dev/null || true; wait "$writer" 2> /dev/null || true; }; writer=; }
+fail() {
+    echo "soak-database.sh: $*" >&2
+    exit 1
+}
+stop() { [ -z "$syslog_ng" ] || { kill "$syslog_ng" 2> /dev/null || true; wait "$syslog_ng" 2> /dev/null || true; }; syslog_ng=; }
 finish() {
     stop
     [ -n "${KEEP:-}" ] || rm -rf "$folder"
 }
 trap finish EXIT
 
-sed -e "/^@define quor_address /s|\".*\"|\"127.0.0.1\"|" -e "/^@define quor_port /s|\".*\"|\"$port\"|" \
-    -e "/^@define quor_port_framed /s|\".*\"|\"$((port + 1))\"|" -e "/^@define quor_database /s|\".*\"|\"$db\"|" \
-    -e "/^@define quor_receiver /s|\".*\"|\"cat > /dev/null\"|" \
-    etc/syslog-ng/quorsyslog.conf > "$folder/quorsyslog.conf"
-printf '@version: 3.38\n@include "%s"\n' "$folder/quorsyslog.conf" > "$folder/syslog-ng.conf"
-/usr/sbin/syslog-ng -F -e --no-caps -f "$folder/syslog-ng.conf" --persist-file "$folder/persist" \
-    --control "$folder/ctl" --pidfile "$folder/pid" > "$folder/syslog-ng.log" 2>&1 &
-writer=$!
-for _ in $(seq 100); do (exec 3<> "/dev/tcp/127.0.0.1/$port") 2> /dev/null && break; sleep 0.1; done
+start_syslog_ng "$folder" "$port" "$db" "cat > /dev/null"
 
 rows() { sqlite3 "$db" 'PRAGMA busy_timeout=5000' "$1" 2> /dev/null | tail -n 1; }
 sent=$((seconds * 1000))
