@@ -48,7 +48,8 @@ void PrepareDatabases() {
         }
     }
     if (QLIBCFileExist(paths::kAccountingDb) != 0) {
-        syslog(LOG_WARNING, "%s cannot be read: its counts begin again from zero", paths::kAccountingDb);
+        syslog(LOG_WARNING, "%s cannot be read: its counts begin again from zero; stop quorlogd to restore it",
+               paths::kAccountingDb);
     }
 }
 
