@@ -8,7 +8,7 @@ cd "$(dirname "$0")/.."
 
 build=$(cd "$1" && pwd)
 seconds=${2:-600}
-port=${QUOR_SOAK_PORT:-15614}
+port=${QUOR_SOAK_PORT:-15644}
 folder=$(mktemp -d /tmp/quor-soak-XXXXXX)
 db=$folder/syslog.db
 syslog_ng=
