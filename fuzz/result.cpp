@@ -38,11 +38,8 @@ void fill(sqlite3* db, int columns, FuzzedDataProvider& data) {
         create += (i > 0 ? ", " : "") + known + (data.ConsumeBool() ? "" : std::to_string(i));
         insert += i > 0 ? ", ?" : "?";
     }
-    sqlite3_exec(db, "DROP TABLE IF EXISTS logs", nullptr, nullptr, nullptr);
-    if (sqlite3_exec(db, (create + ")").c_str(), nullptr, nullptr, nullptr) != SQLITE_OK) {
-        return;  // two columns of one name
-    }
-    sqlite3_stmt* statement = nullptr;
+    sqlite3_exec(db, ("DROP TABLE IF EXISTS logs; BEGIN; " + create + ")").c_str(), nullptr, nullptr, nullptr);
+    sqlite3_stmt* statement = nullptr;  // none for two columns of one name
     sqlite3_prepare_v2(db, (insert + ")").c_str(), -1, &statement, nullptr);
     for (int row = 0; row < 80 && data.remaining_bytes() > 0; ++row) {
         for (int i = 1; i <= columns; ++i) {
@@ -52,6 +49,7 @@ void fill(sqlite3* db, int columns, FuzzedDataProvider& data) {
         sqlite3_reset(statement);
     }
     sqlite3_finalize(statement);
+    sqlite3_exec(db, "COMMIT", nullptr, nullptr, nullptr);
 }
 
 void compare(sqlite3* db, DBResult_tag* result) {

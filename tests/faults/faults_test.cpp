@@ -370,7 +370,7 @@ TEST(FullDisk, IsReportedAndLeavesNothingHalfDone) {
             SCOPED_TRACE(std::string(operation.name) + " with KiB left: " + std::to_string(spare));
             Place place;
             operation.prepare(place);
-            const size_t left = std::filesystem::space(disk).available - spare * 1024;
+            const auto left = static_cast<size_t>(std::filesystem::space(disk).available) - spare * 1024;
             WriteFile(disk + "/ballast", std::string(left, '.'));
             const int result = trial.run(place);
             failures += result < 0 ? 1 : 0;

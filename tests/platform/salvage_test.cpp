@@ -64,8 +64,8 @@ class Salvaging : public testing::TestWithParam<Case> {
     }
 
     // What is asked of the pages of the logs.
-    uint64_t pages(const std::string& what, const std::string& which) {
-        return std::stoull(
+    size_t pages(const std::string& what, const std::string& which) {
+        return std::stoul(
             SqliteFile(path_).query("SELECT " + what + " FROM dbstat WHERE name = 'logs' AND " + which).at(0));
     }
 
