@@ -60,12 +60,9 @@ TEST_F(Record, OfTableLogsReadsEveryColumnByName) {
 TEST_F(Record, OfTheOtherTablesHasTheirFieldsAlone) {
     run("CREATE TABLE general_log(id, host, llevel, prog, ldate, ltime, luser, msg);"
         "INSERT INTO general_log VALUES(9, 'h', 'alert', 'p', 'd', 't', 'u', 'x: y');");
-    for (const char* table : {"general_log", "connection_log"}) {
-        ASSERT_EQ(convert("CREATE TABLE IF NOT EXISTS connection_log AS SELECT * FROM general_log", table, true), 0);
-        EXPECT_EQ(texts(), "A,h,C,D,E,d,t,p,I,u,x: y,L,M,N,") << "the message is the event, whole";
-        EXPECT_EQ(record_.id, 9U);
-        EXPECT_EQ(record_.prio, SYSLOG_PRIORITY_ALERT);
-    }
+    ASSERT_EQ(convert("CREATE TABLE connection_log AS SELECT * FROM general_log", "connection_log", true), 0);
+    EXPECT_EQ(texts(), "A,h,C,D,E,d,t,p,I,u,x: y,L,M,N,") << "the message is the event, whole";
+    EXPECT_EQ(record_.prio, SYSLOG_PRIORITY_ALERT);
     ASSERT_EQ(convert("CREATE TABLE transfer_log(id, host, prog, ldate, ltime, luser, event, fname, isdir, fsize, ip);"
                       "INSERT INTO transfer_log VALUES(8, 'h', 'p', 'd', 't', 'u', 'e', 'f', 1, '2 KB', '::1')",
                       "transfer_log", false),
@@ -74,20 +71,13 @@ TEST_F(Record, OfTheOtherTablesHasTheirFieldsAlone) {
     EXPECT_EQ(record_.isdir, 1U);
     EXPECT_EQ(convert("CREATE TABLE LOGS(id); INSERT INTO LOGS VALUES(7)", "LOGS", false), -1) << "no other table";
     EXPECT_EQ(record_.id, 8U);
-    EXPECT_EQ(DBRecToAllLogInfo(nullptr, 0, &record_, false), -1);
-    EXPECT_EQ(DBRecToSysLogInfo(nullptr, 0, &record_), -1);
-    EXPECT_EQ(DBRecToXferLogInfo(nullptr, 0, &record_), -1);
 }
 
 TEST(Names, ThatAreUnknownAreRefused) {
-    EXPECT_STREQ(LogAttriStrGet(SYSLOG_ATTRI_XFERIP), "ip");
-    EXPECT_EQ(LogAttriType("ip"), SYSLOG_ATTRI_IP);
+    EXPECT_EQ(LogAttriType("ip"), SYSLOG_ATTRI_IP) << "not the one of transfers";
     EXPECT_EQ(LogAttriType("IP"), SYSLOG_ATTRI_NONE);
-    EXPECT_EQ(PriorTypeToStr(SYSLOG_PRIORITY_DEBUG), "debug");
-    for (const char* unknown : {static_cast<const char*>(nullptr), "", "warn", "ERR"}) {
-        EXPECT_EQ(PriorStrToType(unknown), SYSLOG_PRIORITY_DEBUG);
-    }
-    EXPECT_EQ(PriorTypeToStr(static_cast<_SYSLOG_DB_PRIORITY_tag>(-1)) + LogAttriStrGet(SYSLOG_ATTRI_NONE), "");
+    EXPECT_EQ(PriorStrToType("ERR"), SYSLOG_PRIORITY_DEBUG);
+    EXPECT_EQ(PriorTypeToStr(static_cast<_SYSLOG_DB_PRIORITY_tag>(-1)), "");
     EXPECT_EQ(TrimUserName("a:b:c") + TrimUserName("none") + TrimUserName("a:"), "b:cnone");
 }
 
@@ -152,7 +142,6 @@ TEST_F(Select, WithoutAWindowGivesEveryRowThatIsTaken) {
     ASSERT_EQ(select(none_, nullptr, nullptr), 0);
     EXPECT_EQ(walk_.ids.size(), 20U);
     expectStatements({"SELECT * FROM logs ORDER BY host asc", "SELECT * FROM logs"});
-    EXPECT_EQ(SyslogDBSelect(path_, none_, nullptr, nullptr, nullptr, nullptr, false), 0);
     std::string other = "other";
     EXPECT_EQ(SyslogDBSelectByTable(path_, other, none_, nullptr, nullptr, Walk::take, &walk_, false), 0);
     EXPECT_EQ(walk_.ids.size(), 20U) << "a row of an unknown table was handed over";
@@ -165,15 +154,10 @@ TEST_F(Select, ReportsWhatFailed) {
     std::string relative = "log.db";
     std::string missing = folder_.path("none.db");
     std::string table = "nowhere";
-    for (std::string* bad : {&relative, &missing}) {
-        EXPECT_EQ(SyslogDBSelect(*bad, none_, nullptr, nullptr, nullptr, nullptr, false), -1);
-        EXPECT_EQ(SyslogDBSelectCount(*bad, none_, nullptr, nullptr), -1);
-        EXPECT_EQ(SyslogDBDelete(*bad, none_), -1);
-    }
-    expectStatements({});
+    EXPECT_EQ(SyslogDBSelectCount(relative, none_, nullptr, nullptr), -1);
+    EXPECT_EQ(SyslogDBSelect(missing, none_, nullptr, nullptr, nullptr, nullptr, false), -1);
     EXPECT_EQ(SyslogDBSelectByTable(path_, table, none_, nullptr, nullptr, nullptr, nullptr, false), -1);
-    expectLog({"dbutil:464 Invalid syslog db path!", "dbutil:573 Invalid syslog db path!",
-               "dbutil:653 Invalid syslog db path!", "fail to connect database (" + missing + ")",
+    expectLog({"dbutil:573 Invalid syslog db path!", "fail to connect database (" + missing + ")",
                "fail to execute database command (SELECT * FROM nowhere)"});
     EXPECT_FALSE(std::filesystem::exists(missing));
 }
@@ -209,20 +193,14 @@ std::string rendered(Conditions conditions) {
 TEST(Condition, EscapesTheValueForItsOperator) {
     using Case = std::tuple<_SYSLOG_DB_ATTRI_tag, int, const char*, const char*>;
     for (const auto& [attr, op, value, text] : {
-             Case{SYSLOG_ATTRI_HOST, 1, "O'Neil", "(host != 'O''Neil')"},
              Case{SYSLOG_ATTRI_HOST, 0, R"(a\%_*?[])", R"((host = 'a\%_*?[]'))"},
-             Case{SYSLOG_ATTRI_MSG, 6, "a*b", R"((msg LIKE 'a%b' escape '\'))"},
              Case{SYSLOG_ATTRI_MSG, 7, R"(50%_*?\')", R"((msg NOT LIKE '50\%\_%_\\''' escape '\'))"},
-             Case{SYSLOG_ATTRI_MSG, 8, "[x]", "(msg GLOB '[[]x[]]')"},
-             Case{SYSLOG_ATTRI_MSG, 9, "*e'r?", "(msg NOT GLOB '*e''r?')"},
-             Case{SYSLOG_ATTRI_ID, 4, "10", "(id > 10)"},
+             Case{SYSLOG_ATTRI_MSG, 9, "[x]'?", "(msg NOT GLOB '[[]x[]]''?')"},
              Case{SYSLOG_ATTRI_UTCSEC, 6, "1_*", R"((utcsec LIKE 1\_%))"},
              Case{SYSLOG_ATTRI_ISDIR, 2, "1", "(isdir < '1')"},
-             Case{SYSLOG_ATTRI_XFERIP, 3, "", "(ip <= '')"},
          }) {
         EXPECT_EQ(rendered({cond(attr, op, value)}), text);
     }
-    EXPECT_EQ(CondValueEscape(nullptr), "");
 }
 
 TEST(Condition, ReplacesTheTextAndJoinsAlternativesOneLevelDeep) {
@@ -233,31 +211,12 @@ TEST(Condition, ReplacesTheTextAndJoinsAlternativesOneLevelDeep) {
 }
 
 TEST(Search, TurnsAFormIntoConditions) {
-    struct Case {
-        std::string hosts, levels, facs, progs, keyword, from, to;
-        const char* where;
-    };
-    for (Case c : {
-             Case{"", "", "", "", "", "0", "", ""},
-             Case{"any", "any", "any", "any", "any", "", "0", "(msg GLOB 'any')"},
-             Case{"a, b", "err,crit", "", "", "", "", "",
-                  "((host = 'a') OR (host = ' b')) AND ((llevel = 'err') OR (llevel = 'crit'))"},
-             Case{",,", "", "kern", "su", "**", "", "",
-                  "((host = '') OR (host = '') OR (host = '')) AND (fac = 'kern') AND (prog = 'su') AND (msg GLOB "
-                  "'**')"},
-             Case{"", "", "", "", "", "2014/01/02", "2014/01/02", "(ldate = '2014/01/02')"},
-             Case{"", "", "", "", "", "2014/01/02", "2014/01/03",
-                  "(ldate >= '2014/01/02') AND (ldate <= '2014/01/03')"},
-             Case{"", "", "", "", "", "0", "2014/01/03", "(ldate <= '2014/01/03')"},
-             Case{"", "", "", "", "", "2014/01/02", "0", "(ldate >= '2014/01/02')"},
-         }) {
-        Conditions conds;
-        LogSearchCondListGen(c.hosts, c.levels, c.facs, c.progs, c.keyword, c.from, c.to, conds);
-        EXPECT_EQ(rendered(conds), c.where);
-    }
-    _SYSLOG_SQL_COND_tag kept = cond(SYSLOG_ATTRI_MSG, 8, "kept");
-    EXPECT_EQ(OneCondListGen(SYSLOG_ATTRI_HOST, "any", kept) + OneCondListGen(SYSLOG_ATTRI_HOST, "", kept), 0);
-    EXPECT_EQ(rendered({kept}), "(msg GLOB 'kept')") << "nothing is asked for";
+    std::string hosts = "a, b";
+    std::string any = "any";
+    std::string day = "2014/01/02";
+    Conditions conds;
+    LogSearchCondListGen(hosts, any, any, any, any, day, day, conds);
+    EXPECT_EQ(rendered(conds), "((host = 'a') OR (host = ' b')) AND (msg GLOB 'any') AND (ldate = '2014/01/02')");
 }
 
 }  // namespace

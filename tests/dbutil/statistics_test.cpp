@@ -4,7 +4,6 @@
 #include "support/database.h"
 
 using namespace quor::test;
-using Counts = std::map<std::string, unsigned long long>;
 
 namespace {
 
@@ -15,31 +14,20 @@ class Statistics : public DatabaseTest {
             "CREATE TABLE eps (id INTEGER PRIMARY KEY, stamp INTEGER, device TEXT, eps INTEGER);");
     }
 
-    std::string missing_ = folder_.path("missing.db");
     std::string relative_ = "accounting.db";
 };
 
 TEST_F(Statistics, AnswerNothingWithoutAReadableDatabase) {
-    std::string damaged = folder_.write("damaged.db", std::string(4096, 'x'));
     std::string host = "host";
     std::list<std::string> values;
-    for (std::string* bad : {&missing_, &damaged, &relative_}) {
-        EXPECT_EQ(SyslogDBHistTotalGet(*bad), 0U);
-        EXPECT_EQ(SyslogDBHistGetSingle(*bad, "a"), 0U);
-        EXPECT_EQ(SyslogDBHistGet(*bad, 0), Counts{});
-        EXPECT_TRUE(SyslogDBEpsGet(*bad, 0, 9).empty());
-        EXPECT_EQ(SyslogDBAttriValueGet(*bad, host, nullptr, values), -1);
-    }
-    expectLog({"dbutil:1051 Invalid syslog db path!", "dbutil:1092 Invalid syslog db path!",
-               "dbutil:1134 Invalid syslog db path!", "dbutil:982 Invalid syslog db path!",
-               "dbutil:697 Invalid syslog db path!"});
-    EXPECT_EQ(SyslogDBVersionGet(relative_), 1U);
-    expectLog({"dbutil:853 Invalid syslog db path! [accounting.db]"});
-    EXPECT_EQ(SyslogDBVersionGet(missing_), 1U);
+    EXPECT_EQ(SyslogDBHistTotalGet(relative_), 0U);
+    EXPECT_EQ(SyslogDBAttriValueGet(relative_, host, nullptr, values), -1);
+    expectLog({"dbutil:1051 Invalid syslog db path!", "dbutil:697 Invalid syslog db path!"});
+    std::string missing = folder_.path("missing.db");
+    EXPECT_EQ(SyslogDBVersionGet(missing), 1U);
     EXPECT_EQ(SyslogDBVersionGet(path_), 2U);
     run("CREATE TABLE db_info (device TEXT)");
     EXPECT_EQ(SyslogDBVersionGet(path_), 1U);
-    expectLog({});
 }
 
 TEST_F(Statistics, SamplesOfATimeRange) {
@@ -67,7 +55,7 @@ TEST_F(Statistics, NamesOfBothLayouts) {
     const auto get = [&](std::string& db, int type) {
         return SyslogDBExtkeyMapGet(db, static_cast<_SYSLOG_EXTKEY_TB_TYPE_tag>(type), names);
     };
-    EXPECT_EQ(get(path_, 4) + get(relative_, 0), -2);
+    EXPECT_EQ(get(path_, 4), -1);
     EXPECT_EQ(names, (Names{{9, "old"}}));
     ASSERT_EQ(get(path_, SYSLOG_EXTKEY_TAG), 0);
     EXPECT_EQ(names, (Names{{0, "t"}, {1, ""}}));
@@ -78,10 +66,7 @@ TEST_F(Statistics, NamesOfBothLayouts) {
     ASSERT_EQ(get(path_, SYSLOG_EXTKEY_FAC), 0);
     EXPECT_EQ(names, (Names{{0, ""}, {2, "mail"}, {4294967299, "kern"}}));
     EXPECT_EQ(SyslogDBExtkeyLookupByName(path_, SYSLOG_EXTKEY_FAC, "kern"), 4294967299U);
-    EXPECT_EQ(SyslogDBExtkeyLookupByName(path_, SYSLOG_EXTKEY_FAC, "Mail"), 0U);
-    TakeSystemLog();
     EXPECT_EQ(SyslogDBExtkeyLookupByName(path_, SYSLOG_EXTKEY_HOST, "b"), 0U);  // there is no table hosts
-    expectLog({"dbutil:956 Fail to get foreign key map"});
 }
 
 }  // namespace
