@@ -23,12 +23,6 @@ class Commands : public Program {
                  "(6,'O''Neil','10.0.0.3','user','info','t',500,'+00:00','2026-01-04','10:00:04','app',"
                  "'a' || char(10) || char(27) || '[2J' || x'ff');"
                  "CREATE TABLE general_log(id INTEGER PRIMARY KEY, host, llevel, prog, ldate, ltime, luser, msg);"
-                 "CREATE TABLE connection_log AS SELECT * FROM general_log;"
-                 "CREATE TABLE transfer_log(id INTEGER PRIMARY KEY, host, prog, ldate, ltime, luser, event, fname, "
-                 "isdir,"
-                 " fsize, ip);"
-                 "INSERT INTO transfer_log(host, prog, ldate, ltime, luser, event, fname, isdir, fsize, ip) VALUES"
-                 "('nas', 'smb', '2026-01-01', '10:00:00', 'ann', 'read', '/a', 0, '12', '10.0.0.9');"
                  "INSERT INTO general_log(host, llevel, prog, ldate, ltime, luser, msg) VALUES"
                  "('nas', 'warning', 'web', '2026-01-01', '10:00:00', 'ann', 'what?')");
     }
@@ -50,20 +44,14 @@ TEST_F(Commands, SearchFindsWhatTheFiltersAskFor) {
     const std::pair<const char*, const char*> cases[] = {
         {"", "6 5 3 2 1"},
         {"--limit 2 --offset 1", "5 3"},  // a page is full although an id is missing
-        {"--limit 9 --offset 4", "1"},
         {"--before 5 --limit 2", "3 2"},
         {"--oldest --offset 2", "3 5 6"},
-        {"--host \"O'Neil\" --host web", "6 2 1"},
-        {"--host any --glob '**'", "6 5 3 2 1"},
-        {"--level err+", "3 1"},
-        {"--level emerg+,debug", "5 3"},
+        {"--level err+,debug", "5 3 1"},
         {"--facility kern --program kernel,sshd", "3 2"},
-        {"--keyword '[sda]'", "3"},
         {"--keyword 'login?'", "1"},  // not "login,"
         {"--keyword 'login?' --offset 1", ""},
         {"--glob 'login?*'", "2 1"},
         {"--from 2026-01-02 --to 2026-01-03", "5 3 2"},
-        {"--table transfer_log", "1"},
         {"--table general_log --level warning --keyword 'hat?'", "1"},
     };
     for (const auto& [arguments, expected] : cases) {
@@ -77,10 +65,8 @@ TEST_F(Commands, SearchStreamsMoreRowsThanOnePiece) {
              "INSERT INTO logs(id, host, msg) SELECT i + (i > 20000) * 1000000000, 'bulk', 'm?' FROM n");
     EXPECT_EQ(run("count").out + run("count --estimate").out + run("count --keyword 'm?'").out,
               "29996\n1000030000\n29991\n");
-    for (const char* order : {"", " --oldest"}) {
-        const std::string rows = run(std::string("search --format ndjson") + order).out;
-        EXPECT_EQ(std::count(rows.begin(), rows.end(), '\n'), 29996) << order;
-    }
+    const std::string rows = run("search --format ndjson").out;
+    EXPECT_EQ(std::count(rows.begin(), rows.end(), '\n'), 29996);
     EXPECT_EQ(ids("--keyword 'm?' --offset 29990"), "10");
     EXPECT_EQ(ids("--oldest --limit 2 --offset 19995"), "20000 1000020001");
     expect({{"search >/dev/full", 2, "", "No space left"}}, kDb);
@@ -97,26 +83,13 @@ TEST_F(Commands, SearchShowsHostileTextHarmlessly) {
               std::string::npos);
 }
 
-TEST_F(Commands, SalvageReportsWhatItSaved) {
-    std::string damaged = ReadFile(folder_.path("the log.db"));
-    folder_.write("damaged.db", damaged.replace(0, 100, 100, '\0'));
-    const Outcome outcome = Program::run("db salvage damaged.db saved.db --format ndjson");
-    EXPECT_EQ(outcome.status, 0) << outcome.err;
-    EXPECT_NE(outcome.out.find(R"("rows":7,)"), std::string::npos) << outcome.out;
-    EXPECT_EQ(database("saved.db").query("SELECT group_concat(id) FROM logs").at(0), "1,2,3,5,6");
-    EXPECT_EQ(Program::run("db salvage damaged.db saved.db").status, 2) << "the new file exists";
-}
-
 TEST_F(Commands, NothingFoundNamesTheFilterThatExcludedEverything) {
     expect(
         {
             {"search --host web9,x --level err", 1, "", "quorlog: nothing found: no row has --host web9,x\n"},
             {"search --from 2025-01-01 --to 2025-01-01", 1, "", "nothing found: no row is dated 2025-01-01\n"},
             {"search --host web --program cron", 1, "", "nothing found: no row matches all filters together\n"},
-            {"search --keyword nowhere", 1, "", "nothing found: no message matches\n"},
             {"search --host web --offset 2", 1, "", "nothing found: --offset is beyond the last row\n"},
-            {"search --before 1 --host web", 1, "", "nothing found: no row has an id below 1\n"},
-            {"search --table connection_log --host x", 1, "", "nothing found: table connection_log is empty\n"},
         },
         kDb);
 }
@@ -127,30 +100,20 @@ TEST_F(Commands, WrongUsageAndFailuresAreOneLineThatHelps) {
     expect(
         {
             {"nosuch --db x", 2, "", "no such command 'nosuch'; see quorlog --help-all"},
-            {"search --limit 99999999999999999999", 2, "", "--limit"},
             {"search --table transfer_log --keyword x", 2, "", "--keyword: table transfer_log has no column for it"},
-            {"search --table transfer_log --level err", 2, "", "--level: table transfer_log has no column for it"},
-            {"search --table general_log --facility kern", 2, "", "--facility: table general_log has no column for it"},
             {"search --host a --host ''", 2, "", "empty name in 'a,'"},
             {"search --program a,any", 2, "", "'any' stands for every name"},
             {"search --level warn", 2, "", "no such level 'warn'"},
-            {"search --level err --level ''", 2, "", "no such level ''"},
-            {"search --level +", 2, "", "no such level '+'"},
-            {"search --from soon", 2, "", "--from: no such date 'soon'"},
             {"search --from 2026-02-02 --to 2026-02-01", 2, "", "--from 2026-02-02 is after --to 2026-02-01"},
             {"search --glob $(printf '%15001s' | tr ' ' '[')", 2, "", "too long"},
             {"search --db missing.db", 2, "",
              "missing.db; start syslog-ng, give another --db, or run quorlog db create"},
-            {"search --db .", 2, "", "is not a file"},
             {"search --db text.db", 2, "", "run quorlog db check"},
             {"search --db bare.db --level err", 2, "", "no such column: llevel; choose another --table or --db"},
-            {"search >&-", 2, "", "standard output is closed"},
-            {"delete --yes", 2, "", "--all"},
             {"delete --all --host web --yes", 2, "", "--all"},
             {"delete --keyword 'a*' --yes", 2, "", "--glob"},
             {"delete --host web", 2, "", "--yes"},
             {"db create --db '$(id).db'", 2, "", "cannot be used"},
-            {"db create --db text.db", 2, "", "exists already"},
         },
         kDb);
     EXPECT_EQ(run("count").out, "5\n");
@@ -159,7 +122,6 @@ TEST_F(Commands, WrongUsageAndFailuresAreOneLineThatHelps) {
 TEST_F(Commands, DeleteAsksAndDeletesWhatMatches) {
     const std::string info = run("db info --format json").out;
     EXPECT_NE(info.find("\"logs\":5"), std::string::npos) << info;
-    EXPECT_NE(info.find("\"oldest\":\"1970-01-01\""), std::string::npos) << info;
     EXPECT_EQ(run("delete --host web", "n\n").status, 1);
     EXPECT_EQ(run("count").out, "5\n");
     EXPECT_EQ(run("delete --host web", "y\n").out, "deleted 2 rows\n");
