@@ -1,4 +1,7 @@
 // quorlogd as a process: fed, signalled and read like the real one.
+#include <chrono>
+#include <random>
+
 #include "dbutil.h"
 #include "support/child.h"
 
@@ -126,6 +129,31 @@ TEST_F(QuorlogdProcess, KeepsWhatADatabaseDoesNotTake) {
     }
     EXPECT_TRUE(writes(daemon, "router1", 7));
     EXPECT_EQ(SqliteFile(paths::kAccountingDb).query("SELECT sum(eps) FROM eps"), Strings{"7"});
+}
+
+TEST_F(QuorlogdProcess, LeavesSoundDatabasesWhenKilled) {
+    std::random_device random;
+    WriteFile(paths::kNotifyRules, keywordRule("up"));
+    for (int i = 0; i < 5; ++i) {
+        Quorlogd daemon("--max-notices 10");
+        ASSERT_TRUE(daemon.started());
+        const auto end = std::chrono::steady_clock::now() + std::chrono::microseconds(random() % 300000);
+        while (std::chrono::steady_clock::now() < end) {
+            daemon.send(entries("router" + std::to_string(random() % 100), 20));
+            daemon.signal(SIGUSR2);
+        }
+        EXPECT_EQ(daemon.endOf(SIGKILL), -1);
+        for (const char* path : {paths::kAccountingDb, paths::kEventDb}) {
+            EXPECT_TRUE(!std::filesystem::exists(path) ||
+                        SqliteFile(path).query("PRAGMA integrity_check") == Strings{"ok"})
+                << path;
+        }
+    }
+    const unsigned long long before = countOf("last");
+    Quorlogd daemon;
+    daemon.send(entries("last", 3));
+    EXPECT_EQ(daemon.endOfInput(), 0);
+    EXPECT_EQ(countOf("last"), before + 3);
 }
 
 TEST_F(QuorlogdProcess, RaisesAFullVolumeOnce) {
