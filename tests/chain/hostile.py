@@ -97,13 +97,16 @@ with open(rules, "w") as file:
 definitions = "SELECT name || ifnull(sql, '') FROM sqlite_schema UNION ALL SELECT idx || stat FROM sqlite_stat1"
 daemon = start()
 try:
-    sender = eventually(lambda: socket.create_connection(("127.0.0.1", port + 1)))
+    framed, plain = (eventually(lambda: socket.create_connection(("127.0.0.1", each))) for each in (port + 1, port))
     messages = {}
     for number in range(5000):
         fields = value(), value(), b"<%05d>" % number + value()
         frame = b"<13>1 2026-11-21T10:00:00.%05d+00:00 %s %s - - - %s" % (number, *fields)
+        if number % 2 and not set(frame) & set(b"\n\0\r"):  # each may end a message here
+            plain.sendall(frame + b"\n")
+        else:
+            framed.sendall(b"%d %s" % (len(frame), frame))
         messages[number] = frame, *fields
-        sender.sendall(b"%d %s" % (len(frame), frame))
         if number == 0:
             before = eventually(lambda: query("SELECT 1 FROM logs") and query(definitions))
     eventually(lambda: query("SELECT count(*) FROM logs") == [(len(messages),)])
