@@ -7,7 +7,7 @@
 using Texts = std::vector<std::string>;
 
 TEST(LineSplitter, KeepsZeroBytesAndTheLongestLineThatIsAllowed) {
-    for (const size_t chunk : {1, 2, 7, 100}) {
+    for (const size_t chunk : {1U, 2U, 7U, 100U}) {
         const std::string text("a\n\n\nb\0c\n12345\n123456789\nlast", 28);
         quor::LineSplitter splitter(5);
         Texts lines;
