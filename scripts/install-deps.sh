@@ -13,7 +13,7 @@ packages_of() {
     powerpc) echo g++-powerpc-linux-gnu qemu-user dpkg-dev make tcl ;;
     package) echo dpkg-dev file debootstrap ;;
     docs) echo doxygen mandoc ;;
-    check) echo clang-14 clang-format-14 clang-tidy-14 git ;;
+    check) echo clang-14 clang-format-14 clang-tidy-14 libclang-rt-14-dev git ;;
     *) echo "install-deps.sh: unknown set '$1'; use build, run, test, bench, powerpc, package, docs or check" >&2; return 1 ;;
     esac
 }
