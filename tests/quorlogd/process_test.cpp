@@ -55,6 +55,7 @@ class QuorlogdProcess : public testing::Test {
             std::filesystem::create_directories(std::filesystem::path(path).parent_path());
         }
         WriteFile(paths::kNotifyRules, "");
+        std::filesystem::remove(paths::kNotifyFilter);
     }
 
     // Until the database holds what a write that is asked for leaves there.
