@@ -20,7 +20,7 @@ sent=0
 
 fail() {
     echo "try-full-disk.sh: $*" >&2
-    tail -n 5 "$run/syslog-ng.log" >&2
+    tail -n 5 "$syslog_ng_log" >&2
     exit 1
 }
 finish() {

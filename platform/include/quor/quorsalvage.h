@@ -17,12 +17,13 @@ typedef struct QUORSALVAGETABLE_tag {
 } QUORSALVAGETABLE;
 
 typedef struct QUORSALVAGE_tag {
-    unsigned long long pages;      /* of the damaged database, its write-ahead log included */
-    unsigned long long badPages;   /* pages of a table that are missing or hold something else */
-    unsigned long long badRows;    /* rows on readable pages that are broken themselves */
-    unsigned long long strayRows;  /* saved rows from pages that nothing refers to: deleted ones may be among them */
+    unsigned long long pages;     /* of the damaged database, its write-ahead log included */
+    unsigned long long badPages;  /* pages of a table that are missing or hold something else */
+    unsigned long long badRows;   /* rows on readable pages that are broken themselves */
+    unsigned long long strayRows; /* saved rows from pages that nothing refers to, deleted ones maybe among them, and of
+                                     tables whose definition is damaged: the table that they fit got them */
     unsigned long long duplicates; /* rows left out because a row with their id, or a unique value, was there already */
-    unsigned long long unknownRows; /* rows on pages that nothing refers to which fit no table */
+    unsigned long long unknownRows; /* rows of the same kinds that fit no table */
     int schemaRead;                 /* 1: the tables are those of the damaged file; 0: those of a schema */
     int tableCount;
     QUORSALVAGETABLE tables[16]; /* the first tables of the new database and their rows */
