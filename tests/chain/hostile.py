@@ -119,8 +119,8 @@ rows = query("SELECT host, prog, msg FROM logs ORDER BY id")
 for row in rows:
     check(messages, *row)
 assert not messages and query(definitions) == before and query("PRAGMA integrity_check") == [(b"ok",)]
-expected = [(event(text),) for _, _, text in rows if b"<00" in text][:NOTICES]
-assert query(f"SELECT event FROM log ORDER BY id LIMIT 1, {NOTICES}", events) == expected
+recorded = query(f"SELECT event FROM log ORDER BY id LIMIT 1, {NOTICES}", events)
+assert len(recorded) == NOTICES and set(recorded) <= {(event(text),) for _, _, text in rows if b"<00" in text}
 for host, program, text in random.sample(rows, 60):
     names = {b"--host=": host, b"--program=": program}  # a comma would separate two of them
     filters = [option + name for option, name in names.items() if name and b"," not in name]
