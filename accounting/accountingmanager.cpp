@@ -3,8 +3,8 @@
 #include <new>
 
 #include "accounting/deviceindex.h"
+#include "base/paths.h"
 #include "common.h"
-#include "common/paths.h"
 #include "logger.h"
 
 AccountingManager::DeviceIndex::Entry&

@@ -5,35 +5,37 @@
 #include <new>
 
 #include "accounting/deviceindex.h"
+#include "base/guards.h"
+#include "base/numbers.h"
+#include "base/paths.h"
 #include "common.h"
-#include "common/guards.h"
-#include "common/numbers.h"
-#include "common/paths.h"
 #include "dbhandler/session.h"
 
 namespace {
 
 using Samples = std::list<SYSLOG_LOG_EPS>;
 using Histogram = std::list<QUORLOG_LOG_DEVICE_STATISTIC>;
-using SqlText = std::unique_ptr<char, quor::Releaser<sqlite3_free>>;
+using SqlText = quor::Guard<char, sqlite3_free>;
 
 constexpr off_t kPurgeAboveBytes = off_t{5} * 1024 * 1024;
 constexpr const char* kPurge = "DELETE FROM eps WHERE stamp < strftime('%s', 'now') - 24*60*60;";
 
-// Ends the transaction, rolled back or never started as it may be, and the connection.
-struct Session {
-    quor::DbSession db;
-
-    explicit Session(const std::string& path) : db(path, quor::paths::kAccountingSchema) {}
-    Session(const Session&) = delete;
-    Session& operator=(const Session&) = delete;
-    ~Session() {
+// Ends the transaction, rolled back or never started as it may be.
+class EndOfTransaction {
+  public:
+    explicit EndOfTransaction(DBHandler& db) : db_(db) {}
+    EndOfTransaction(const EndOfTransaction&) = delete;
+    EndOfTransaction& operator=(const EndOfTransaction&) = delete;
+    ~EndOfTransaction() {
         try {
-            (void)db->DBTranEnd();
+            (void)db_.DBTranEnd();
         } catch (const std::bad_alloc&) {
             return;  // there was no memory left to report that it failed
         }
     }
+
+  private:
+    DBHandler& db_;
 };
 
 template <typename... Texts>
@@ -47,9 +49,9 @@ void reportStatement(const std::string& sql) {
 }
 
 bool writeSample(DBHandler& db, const SYSLOG_LOG_EPS& sample) {
-    const std::string stamp = ullNumberToString(static_cast<unsigned long long>(sample.stamp));
+    const std::string stamp = quor::WrappedDecimal(sample.stamp);
     for (const auto& [device, count] : sample.devices) {
-        const std::string logs = ullNumberToString(static_cast<unsigned long long>(count));
+        const std::string logs = quor::WrappedDecimal(count);
         const std::string sql = toSql("INSERT INTO eps VALUES(NULL, '%q', '%q', '%q');", stamp, device, logs);
         if (db.DBExecute(sql) < 0) {
             reportStatement(sql);
@@ -101,11 +103,12 @@ int AccountingManager::AccoutingFlush2DB() {
     if (epsList_.empty()) {
         return 0;
     }
-    Session session(dbPath_);
-    if (!session.db.connect()) {
+    quor::DbSession session(dbPath_, quor::paths::kAccountingSchema);
+    DBHandler& db = session.handler();
+    const EndOfTransaction end(db);
+    if (!session.connect()) {
         return -1;
     }
-    DBHandler& db = *session.db.operator->();
     (void)db.DBTranStart();  // reports its own failure; the statements then stand alone
     if (!writeSamples(db, epsList_) || !writeHistogram(db, histogram_) || !purge(db, dbPath_)) {
         return -1;

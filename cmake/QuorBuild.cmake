@@ -3,8 +3,10 @@ add_library(quor_build INTERFACE)
 target_compile_features(quor_build INTERFACE cxx_std_17)
 target_compile_options(quor_build INTERFACE
     -Wall -Wextra -Wpedantic -Wshadow -Wconversion -Werror)
-target_compile_definitions(quor_build INTERFACE QUOR_ROOT="${QUOR_ROOT}" _FILE_OFFSET_BITS=64)
-target_include_directories(quor_build INTERFACE ${PROJECT_SOURCE_DIR})
+target_compile_definitions(quor_build INTERFACE _FILE_OFFSET_BITS=64)
+# A header, not a definition: another root compiles anew only what knows a fixed path.
+file(CONFIGURE OUTPUT ${PROJECT_BINARY_DIR}/generated/quor_root.h CONTENT "#define QUOR_ROOT \"@QUOR_ROOT@\"\n" @ONLY)
+target_include_directories(quor_build INTERFACE ${PROJECT_SOURCE_DIR} ${PROJECT_BINARY_DIR}/generated)
 target_link_options(quor_build INTERFACE -Wl,--as-needed)
 
 set(CMAKE_CXX_EXTENSIONS OFF)
@@ -44,6 +46,8 @@ list(JOIN CMAKE_CROSSCOMPILING_EMULATOR " " QUOR_EMULATOR)
 
 # quor_add_test(NAME SOURCES... [LIBS libraries...] [ROOT]): one GoogleTest executable. ROOT marks tests that use the
 # fixed paths below QUOR_ROOT, so that they do not run at the same time.
+set(CMAKE_LINK_DEPENDS_NO_SHARED ON)  # a program stays as it is when only the inside of a library has changed
+
 function(quor_add_test name)
     cmake_parse_arguments(TEST "ROOT" "" "LIBS" ${ARGN})
     add_executable(${name} ${TEST_UNPARSED_ARGUMENTS})

@@ -2,6 +2,8 @@
 #include <json/value.h>
 #include <syslog.h>
 
+#include <string>
+
 #include "common.h"
 
 namespace {
@@ -27,10 +29,16 @@ std::list<std::string> splitObjects(const std::string& input) {
 #pragma GCC diagnostic ignored "-Wdeprecated-declarations"
 bool parseObject(const std::string& piece, Json::Value& value) {
     Json::Reader reader;
-    if (reader.parse(piece, value)) {
-        return true;
+    std::string reason;
+    try {
+        if (reader.parse(piece, value)) {
+            return true;
+        }
+        reason = reader.getFormattedErrorMessages();
+    } catch (const Json::Exception& refused) {
+        reason = refused.what();  // a text nested too deep is not reported, but thrown
     }
-    syslog(LOG_ERR, "Error: parsing error, reason = %s\n", reader.getFormattedErrorMessages().c_str());
+    syslog(LOG_ERR, "Error: parsing error, reason = %s\n", reason.c_str());
     return false;
 }
 #pragma GCC diagnostic pop

@@ -5,7 +5,7 @@
 #include <utility>
 
 #include "common.h"
-#include "common/guards.h"
+#include "common/handles.h"
 #include "dbhandler/readers.h"
 
 DBHandler::DBHandler() = default;
@@ -36,7 +36,9 @@ int DBHandler::DBCon() {
 }
 
 int DBHandler::DBDiscon() {
-    QUORDBClose(std::exchange(connection_, nullptr));
+    if (isConnected()) {
+        QUORDBClose(std::exchange(connection_, nullptr));
+    }
     return 0;
 }
 

@@ -1,7 +1,8 @@
-#include <sqlite3.h>
 #include <syslog.h>
 
 #include "common.h"
+#include "common/errorcode.h"
+#include "common/logplaces.h"
 #include "dbhandler.h"
 #include "dbhandler/readers.h"
 #include "quor/quordb.h"
@@ -26,7 +27,7 @@ int DBHandler::DBcheckTableExist(std::string table) {
 
 void DBHandler::DBErrorHandle(std::string sql) {
     constexpr const char* kLogs = "logs";
-    const int code = sqlite3_errcode(static_cast<sqlite3*>(QUORDBInternalDBHdlGet(connection_)));
+    const int code = quor::ErrorCode(connection_);
     const std::string cause = QUORDBErrorGet(connection_);  // before the table check replaces it
     int priority = LOG_ERR;
     switch (code) {
@@ -47,6 +48,6 @@ void DBHandler::DBErrorHandle(std::string sql) {
     default:
         break;
     }
-    syslog(priority, "%s:%d Fail to execute SQL command: %s, error code is : %d, error cause: %s", "dbhandler", 125,
-           sql.c_str(), code, cause.c_str());
+    syslog(priority, "%s:%d Fail to execute SQL command: %s, error code is : %d, error cause: %s", "dbhandler",
+           quor::place::kStatementFailed, sql.c_str(), code, cause.c_str());
 }

@@ -1,30 +1,13 @@
 #include "dbhandler/readers.h"
 
-#include "common/numbers.h"
+#include "common/handles.h"
 #include "dbhandler.h"
-#include "quor/quordb.h"
 
 namespace quor {
-namespace {
-
-// The first row, or nothing.
-class FirstRow {
-  public:
-    explicit FirstRow(DBResult_tag* result) : result_(result), found_(QUORDBFetchRow(result, &row_) >= 0) {}
-    explicit operator bool() const { return found_; }
-    const char* operator[](const char* column) const { return OrEmpty(QUORDBFetchField(result_, row_, column)); }
-
-  private:
-    DBResult_tag* result_;
-    unsigned int row_ = 0;
-    bool found_;
-};
-
-}  // namespace
 
 int ReadTime(DBResult_tag* result, void* info) {
-    const FirstRow row(result);
-    if (!row) {
+    Row row(result);
+    if (!row.next()) {
         return -1;
     }
     static_cast<_ARCH_DB_INFO_tag*>(info)->start_time = ToInt32(row["utcsec"]);
@@ -32,8 +15,8 @@ int ReadTime(DBResult_tag* result, void* info) {
 }
 
 int ReadCount(DBResult_tag* result, void* info) {
-    const FirstRow row(result);
-    if (!row) {
+    Row row(result);
+    if (!row.next()) {
         return -1;
     }
     const int64_t count = ToInt32(row["count_result"]);
@@ -42,8 +25,8 @@ int ReadCount(DBResult_tag* result, void* info) {
 }
 
 int ReadInfo(DBResult_tag* result, void* info) {
-    const FirstRow row(result);
-    if (!row) {
+    Row row(result);
+    if (!row.next()) {
         return -1;
     }
     auto& target = *static_cast<_ARCH_DB_INFO_tag*>(info);

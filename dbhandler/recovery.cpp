@@ -2,7 +2,8 @@
 
 #include <cstdio>
 
-#include "common/guards.h"
+#include "common/handles.h"
+#include "common/logplaces.h"
 #include "dbhandler.h"
 #include "notification.h"
 #include "quor/quorservice.h"
@@ -22,7 +23,7 @@ int DBErrorHandle_SQLITE_CORRUPT(DBConnect_tag* /*connection*/, std::string dbPa
         return -1;
     }
     if (QLIBServiceReload("syslog-ng") < 0) {
-        syslog(LOG_ERR, "%s:%d Fail to send HUP signal to syslog-ng", "dbhandler", 88);
+        syslog(LOG_ERR, "%s:%d Fail to send HUP signal to syslog-ng", "dbhandler", quor::place::kReloadFailed);
         return -1;
     }
     return 0;

@@ -25,6 +25,7 @@ class DbSession {
         return true;
     }
 
+    DBHandler& handler() { return handler_; }
     DBHandler* operator->() { return &handler_; }
 
   private:

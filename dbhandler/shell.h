@@ -4,7 +4,7 @@
 
 #include <string>
 
-#include "common/paths.h"
+#include "base/paths.h"
 #include "quor/quorcore.h"
 
 namespace quor {

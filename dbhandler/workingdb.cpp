@@ -2,7 +2,7 @@
 #include <syslog.h>
 #include <unistd.h>
 
-#include "common/paths.h"
+#include "base/paths.h"
 #include "dbhandler.h"
 #include "dbhandler/shell.h"
 #include "quor/quorservice.h"

@@ -1,51 +1,50 @@
+#include <algorithm>
 #include <cstring>
+#include <new>
+#include <optional>
 
 #include "dbutil.h"
 #include "quor/quordb.h"
 
 namespace {
 
-enum Operator : int { kLike = 6, kNotLike = 7, kGlob = 8, kNotGlob = 9 };
-
 bool isLike(int op) {
-    return op == kLike || op == kNotLike;
+    return op == SYSLOG_OP_LIKE || op == SYSLOG_OP_NOT_LIKE;
 }
 
 bool isGlob(int op) {
-    return op == kGlob || op == kNotGlob;
+    return op == SYSLOG_OP_GLOB || op == SYSLOG_OP_NOT_GLOB;
 }
 
 bool isNumeric(_SYSLOG_DB_ATTRI_tag attr) {
     return attr == SYSLOG_ATTRI_ID || attr == SYSLOG_ATTRI_UTCSEC;
 }
 
-// Runs one of the wrapper's escapes into a buffer of twice the text plus one, which always suffices. Empty on failure.
+// Runs one of the wrapper's escapes into a buffer of twice the text plus one, which always suffices. Nothing when it
+// fails.
 template <typename Escape>
-std::string escaped(const std::string& text, Escape escape) {
+std::optional<std::string> escaped(const std::string& text, Escape escape) {
     std::string buffer(2 * text.size() + 1, '\0');
     if (escape(buffer.data(), static_cast<unsigned int>(buffer.size())) < 0) {
-        return {};
+        return std::nullopt;
     }
     buffer.resize(strlen(buffer.c_str()));
     return buffer;
 }
 
-std::string quoteEscaped(const std::string& text) {
+std::optional<std::string> quoteEscaped(const std::string& text) {
     return escaped(text, [&](char* out, unsigned int size) {
         return QUORDBEscapeStringEX2(nullptr, out, size, text.c_str(), static_cast<unsigned int>(text.size()));
     });
 }
 
 // "*" and "?" become LIKE's wildcards after its own were escaped.
-std::string likePattern(const std::string& text) {
-    std::string pattern = escaped(
+std::optional<std::string> likePattern(const std::string& text) {
+    std::optional<std::string> pattern = escaped(
         text, [&](char* out, unsigned int size) { return QUORDBEscapeBackslashEX2(nullptr, out, size, text.c_str()); });
-    for (char& c : pattern) {
-        if (c == '*') {
-            c = '%';
-        } else if (c == '?') {
-            c = '_';
-        }
+    if (pattern) {
+        std::replace(pattern->begin(), pattern->end(), '*', '%');
+        std::replace(pattern->begin(), pattern->end(), '?', '_');
     }
     return pattern;
 }
@@ -81,15 +80,17 @@ void appendComparison(const _SYSLOG_SQL_COND_tag& cond, std::string& out) {
 
 }  // namespace
 
-std::string CondValueEscape(const _SYSLOG_SQL_COND_tag* cond) {
-    if (cond == nullptr) {
-        return {};
+// A value that cannot be escaped, for want of memory too, becomes the empty one: the condition still renders.
+std::string CondValueEscape(const _SYSLOG_SQL_COND_tag* cond) try {
+    std::optional<std::string> value = cond != nullptr ? quoteEscaped(cond->value) : std::nullopt;
+    if (value && isLike(cond->op)) {
+        value = likePattern(*value);
+    } else if (value && isGlob(cond->op)) {
+        value = globPattern(*value);
     }
-    std::string value = quoteEscaped(cond->value);
-    if (isLike(cond->op)) {
-        return likePattern(value);
-    }
-    return isGlob(cond->op) ? globPattern(value) : value;
+    return value.value_or("");
+} catch (const std::bad_alloc&) {
+    return {};
 }
 
 int SqlCondToStr(const _SYSLOG_SQL_COND_tag& cond, std::string& out) {

@@ -28,7 +28,7 @@ int SyslogDBExtkeyMapGet(std::string& dbPath, _SYSLOG_EXTKEY_TB_TYPE_tag type,
                          std::map<unsigned long long, std::string>& map) {
     const bool keyTables = SyslogDBVersionGet(dbPath) == 1;
     quor::Query query;
-    if (!quor::CheckDbPath(dbPath, 887) || static_cast<uint32_t>(type) >= kNameSources.size() ||
+    if (!quor::CheckDbPath(dbPath, quor::place::kNamesPath) || static_cast<uint32_t>(type) >= kNameSources.size() ||
         !query.connect(dbPath)) {
         return -1;
     }
@@ -39,9 +39,9 @@ int SyslogDBExtkeyMapGet(std::string& dbPath, _SYSLOG_EXTKEY_TB_TYPE_tag type,
         return -1;
     }
     map.clear();
-    const bool complete = query.eachRow([&](unsigned int row) {
-        const unsigned long long key = keyTables ? quor::ToUint64(query.text(row, source.idColumn)) : map.size();
-        map.emplace(key, query.text(row, keyTables ? source.nameColumn : source.logColumn));
+    const bool complete = query.eachRow([&](const quor::Row& row) {
+        const unsigned long long key = keyTables ? quor::ToUint64(row[source.idColumn]) : map.size();
+        map.emplace(key, row[keyTables ? source.nameColumn : source.logColumn]);
     });
     return complete ? 0 : -1;
 }
@@ -49,7 +49,7 @@ int SyslogDBExtkeyMapGet(std::string& dbPath, _SYSLOG_EXTKEY_TB_TYPE_tag type,
 unsigned long long SyslogDBExtkeyLookupByName(std::string& dbPath, _SYSLOG_EXTKEY_TB_TYPE_tag type, std::string name) {
     std::map<unsigned long long, std::string> map;
     if (SyslogDBExtkeyMapGet(dbPath, type, map) < 0) {
-        syslog(LOG_ERR, "%s:%d Fail to get foreign key map", "dbutil", 956);
+        syslog(LOG_ERR, "%s:%d Fail to get foreign key map", "dbutil", quor::place::kLookupMap);
         return 0;
     }
     for (const auto& [key, value] : map) {
@@ -62,11 +62,11 @@ unsigned long long SyslogDBExtkeyLookupByName(std::string& dbPath, _SYSLOG_EXTKE
 
 int SyslogDBAttriValueGet(std::string& dbPath, std::string& attrName, _SYSLOG_SQL_LIMIT_tag* limit,
                           std::list<std::string>& values) {
-    if (!quor::CheckDbPath(dbPath, 697)) {
+    if (!quor::CheckDbPath(dbPath, quor::place::kValuesPath)) {
         return -1;
     }
     if (LogAttriType(attrName) == SYSLOG_ATTRI_NONE) {
-        syslog(LOG_ERR, "%s:%d Log attribute type is incorrect!", "dbutil", 702);
+        syslog(LOG_ERR, "%s:%d Log attribute type is incorrect!", "dbutil", quor::place::kValuesAttribute);
         return -1;
     }
     const std::string sql = "SELECT " + attrName + " FROM logs GROUP BY " + attrName + " ORDER BY " + attrName + " asc";
@@ -74,7 +74,6 @@ int SyslogDBAttriValueGet(std::string& dbPath, std::string& attrName, _SYSLOG_SQ
     if (!query.connect(dbPath) || query.execute(sql, limit) < 0) {
         return -1;
     }
-    const bool complete =
-        query.eachRow([&](unsigned int row) { values.emplace_back(query.text(row, attrName.c_str())); });
+    const bool complete = query.eachRow([&](const quor::Row& row) { values.emplace_back(row[attrName.c_str()]); });
     return complete ? 0 : -1;
 }

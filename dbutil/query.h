@@ -6,8 +6,8 @@
 
 #include <string>
 
-#include "common/guards.h"
-#include "common/numbers.h"
+#include "common/handles.h"
+#include "common/logplaces.h"
 #include "dbutil.h"
 
 namespace quor {
@@ -17,10 +17,10 @@ inline bool IsValidDbPath(const std::string& path) {
     return !path.empty() && path.front() == '/';
 }
 
-// The same with a report; `line` is the place that a reader of the system log knows the function by.
-inline bool CheckDbPath(const std::string& path, int line) {
+// The same with a report; `place` is one of common/logplaces.h.
+inline bool CheckDbPath(const std::string& path, int place) {
     if (!IsValidDbPath(path)) {
-        syslog(LOG_ERR, "%s:%d Invalid syslog db path!", "dbutil", line);
+        syslog(LOG_ERR, "%s:%d Invalid syslog db path!", "dbutil", place);
         return false;
     }
     return true;
@@ -53,21 +53,16 @@ struct Query {
                                  static_cast<uint32_t>(limit->offset), Adopt(result));
     }
 
-    // NULL reads as the empty text.
-    const char* text(unsigned int row, const char* column) const {
-        return OrEmpty(QUORDBFetchField(result.get(), row, column));
-    }
-
-    // Hands every row number to `visit`; false as soon as a counted row cannot be fetched.
+    // Hands every row to `visit`; false as soon as a counted row cannot be fetched.
     template <typename Visit>
     bool eachRow(Visit visit) const {
         const int count = QUORDBNumRows(result.get());
+        Row row(result.get());
         for (int i = 0; i < count; ++i) {
-            unsigned int row = 0;
-            if (QUORDBFetchRow(result.get(), &row) < 0) {
+            if (!row.next()) {
                 return false;
             }
-            visit(row);
+            visit(static_cast<const Row&>(row));
         }
         return true;
     }

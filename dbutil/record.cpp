@@ -1,9 +1,8 @@
 #include <array>
 #include <cstring>
 
-#include "common/numbers.h"
+#include "common/handles.h"
 #include "dbutil.h"
-#include "quor/quordb.h"
 
 const char* const g_MappingSyslogPrior[8] = {"emerg", "alert", "crit", "err", "warning", "notice", "info", "debug"};
 
@@ -14,14 +13,6 @@ namespace {
 constexpr std::array<const char*, SYSLOG_ATTRI_NONE> kAttributeNames = {
     "id",    "host", "ip",  "fac",   "prio",  "llevel", "tag",   "utcsec", "tzoffset", "ldate",
     "ltime", "prog", "msg", "luser", "event", "isdir",  "fname", "fsize",  "ip"};
-
-// The fields of one row by column name; NULL and missing columns read as the empty text.
-struct Row {
-    DBResult_tag* result;
-    unsigned int number;
-
-    const char* operator[](const char* column) const { return quor::OrEmpty(QUORDBFetchField(result, number, column)); }
-};
 
 }  // namespace
 
@@ -73,7 +64,7 @@ int DBRecToAllLogInfo(DBResult_tag* result, unsigned int row, _SYSLOG_LOG_DATA_t
     if (result == nullptr || rec == nullptr) {
         return -1;
     }
-    const Row fields{result, row};
+    const quor::Row fields(result, row);
     rec->id = quor::ToUint64(fields["id"]);
     rec->host = fields["host"];
     rec->ip = fields["ip"];
@@ -96,7 +87,7 @@ int DBRecToSysLogInfo(DBResult_tag* result, unsigned int row, _SYSLOG_LOG_DATA_t
     if (result == nullptr || rec == nullptr) {
         return -1;
     }
-    const Row fields{result, row};
+    const quor::Row fields(result, row);
     rec->id = quor::ToUint64(fields["id"]);
     rec->host = fields["host"];
     rec->prio = PriorStrToType(fields["llevel"]);
@@ -112,7 +103,7 @@ int DBRecToXferLogInfo(DBResult_tag* result, unsigned int row, _SYSLOG_LOG_DATA_
     if (result == nullptr || rec == nullptr) {
         return -1;
     }
-    const Row fields{result, row};
+    const quor::Row fields(result, row);
     rec->id = quor::ToUint64(fields["id"]);
     rec->host = fields["host"];
     rec->prog = fields["prog"];

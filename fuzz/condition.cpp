@@ -6,7 +6,7 @@
 #include <set>
 
 #include "dbutil.h"
-#include "fuzz.h"
+#include "fuzz/fuzz.h"
 
 using quor::fuzz::Require;
 

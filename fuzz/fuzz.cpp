@@ -1,4 +1,4 @@
-#include "fuzz.h"
+#include "fuzz/fuzz.h"
 
 #include <unistd.h>
 

@@ -4,7 +4,7 @@
 #include <cstdlib>
 #include <cstring>
 
-#include "fuzz.h"
+#include "fuzz/fuzz.h"
 
 using quor::fuzz::Require;
 

@@ -1,9 +1,9 @@
 // Any schema and any rows: the wrapper's result holds what SQLite holds.
 #include <sqlite3.h>
 
-#include "common/guards.h"
+#include "common/handles.h"
 #include "dbutil.h"
-#include "fuzz.h"
+#include "fuzz/fuzz.h"
 
 using quor::fuzz::Require;
 

@@ -4,7 +4,7 @@
 #include <sqlite3.h>
 #include <unistd.h>
 
-#include "fuzz.h"
+#include "fuzz/fuzz.h"
 
 using quor::fuzz::Require;
 

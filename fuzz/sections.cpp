@@ -1,6 +1,6 @@
 // Section files of any content are read and written without harm; what was written is read back.
-#include "common/guards.h"
-#include "fuzz.h"
+#include "common/handles.h"
+#include "fuzz/fuzz.h"
 #include "notification.h"
 
 using quor::fuzz::Require;

@@ -4,7 +4,7 @@
 #include <algorithm>
 #include <memory>
 
-#include "fuzz.h"
+#include "fuzz/fuzz.h"
 #include "platform/notify/notify.h"
 
 using quor::fuzz::Require;

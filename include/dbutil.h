@@ -52,7 +52,19 @@ enum _SYSLOG_DB_PRIORITY_tag : int32_t {
 
 // Names of the severities, by value.
 extern const char* const g_MappingSyslogPrior[8];
-// SQL operators: 0 =, 1 !=, 2 <, 3 <=, 4 >, 5 >=, 6 LIKE, 7 NOT LIKE, 8 GLOB, 9 NOT GLOB.
+// SQL operators, by number.
+enum _SYSLOG_SQL_OP_tag : int {
+    SYSLOG_OP_EQUAL = 0,
+    SYSLOG_OP_NOT_EQUAL = 1,
+    SYSLOG_OP_BELOW = 2,
+    SYSLOG_OP_AT_MOST = 3,
+    SYSLOG_OP_ABOVE = 4,
+    SYSLOG_OP_AT_LEAST = 5,
+    SYSLOG_OP_LIKE = 6,
+    SYSLOG_OP_NOT_LIKE = 7,
+    SYSLOG_OP_GLOB = 8,
+    SYSLOG_OP_NOT_GLOB = 9,
+};
 extern const char* const g_MappingSyslogOP[10];
 
 // One log, of any table. Each converter fills the fields of its table and leaves the others alone.
@@ -78,11 +90,11 @@ struct _SYSLOG_LOG_DATA_tag {
     std::string fsize;
 };
 
-// One condition: attribute, operator (index into g_MappingSyslogOP), value as the user gave it, and alternatives that
-// are joined with OR. The alternatives of an alternative are ignored.
+// One condition: attribute, operator (SYSLOG_OP_..., an index into g_MappingSyslogOP), value as the user gave it, and
+// alternatives that are joined with OR. The alternatives of an alternative are ignored.
 struct _SYSLOG_SQL_COND_tag {
     _SYSLOG_DB_ATTRI_tag attr = SYSLOG_ATTRI_ID;
-    int op = 0;
+    int op = SYSLOG_OP_EQUAL;
     std::string value;
     std::list<_SYSLOG_SQL_COND_tag> orList;
 };

@@ -2,11 +2,11 @@
 #include <array>
 #include <cstdio>
 
-#include "catalogue.h"
+#include "base/paths.h"
 #include "common.h"
-#include "common/guards.h"
-#include "common/paths.h"
+#include "common/handles.h"
 #include "logger.h"
+#include "logger/catalogue.h"
 
 namespace {
 

@@ -4,7 +4,7 @@
 #include <cstdio>
 #include <ctime>
 
-#include "common/guards.h"
+#include "common/handles.h"
 #include "logger.h"
 
 namespace {

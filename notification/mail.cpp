@@ -1,7 +1,7 @@
 #include <syslog.h>
 
-#include "notice.h"
 #include "notification.h"
+#include "notification/notice.h"
 
 namespace {
 
@@ -21,7 +21,7 @@ int sendLogNotice(const char* tag, const quor::NoticeValue& match, const char* c
     if (match.value == nullptr || content == nullptr) {
         return -1;
     }
-    quor::NoticeContent escaped;
+    quor::EscapedContent escaped;
     quor::StringTable table(QLIBCSzHashAlloc(quor::kNoticeTableSize));
     if (table == nullptr || !escaped.escape(content)) {
         return -1;

@@ -1,8 +1,8 @@
 #include <algorithm>
 #include <array>
 
-#include "notice.h"
 #include "notification.h"
+#include "notification/notice.h"
 
 namespace {
 
@@ -43,7 +43,7 @@ int sendContent(NotificationManager& manager, const char* tag, const std::string
     if (table == nullptr) {
         return -1;
     }
-    quor::NoticeContent escaped;
+    quor::EscapedContent escaped;
     if (!escaped.escape(content.c_str())) {
         Debuger::MSG(0, "Not enough memory");
         return -1;

@@ -5,9 +5,9 @@
 #include <array>
 #include <initializer_list>
 
+#include "base/paths.h"
 #include "common.h"
-#include "common/guards.h"
-#include "common/paths.h"
+#include "common/handles.h"
 #include "quor/quornotify.h"
 
 namespace quor {
@@ -27,7 +27,7 @@ inline void FillNotice(StringTable& table, std::initializer_list<NoticeValue> va
 }
 
 // The content of a log, escaped for a JSON string, within 2,048 bytes with its terminator.
-struct NoticeContent {
+struct EscapedContent {
     std::array<char, 2048> text{};
 
     bool escape(const char* content) { return EncodeJson(content, text.data(), static_cast<int>(text.size())) >= 0; }

@@ -1,8 +1,8 @@
-#include <algorithm>
 #include <string_view>
 
+#include "base/numbers.h"
+#include "base/words.h"
 #include "common.h"
-#include "common/numbers.h"
 #include "parser.h"
 
 namespace {
@@ -84,11 +84,7 @@ int LogParser::ParseSingleEntry(const std::string& entry, _SYSLOG_LOG_DATA_tag& 
 
 std::list<std::string> LogParser::Tokenize(const std::string& text, const std::string& delimiters) {
     std::list<std::string> pieces;
-    for (size_t end = 0, start = text.find_first_not_of(delimiters); start != std::string::npos;
-         start = text.find_first_not_of(delimiters, end)) {
-        end = std::min(text.find_first_of(delimiters, start), text.size());
-        pieces.emplace_back(text, start, end - start);
-    }
+    quor::EachWord(text, delimiters, [&pieces](std::string_view piece) { pieces.emplace_back(piece); });
     return pieces;
 }
 

@@ -1,5 +1,5 @@
 #!/bin/sh
-# Builds what the PowerPC build links, from Debian's source packages: SQLite, JsonCpp and GoogleTest, and copies the
+# Builds what the PowerPC build links, from Debian's source packages: SQLite, JsonCpp, utf8proc and GoogleTest, and copies the
 # headers of CLI11. The sources come from where this machine gets its packages.
 # Usage: build-powerpc-deps.sh FOLDER       result: FOLDER/prefix; nothing is done when it is complete
 set -eu
@@ -65,10 +65,11 @@ build_with_cmake() {
 }
 
 write_sources
-fetch sqlite3 libjsoncpp
+fetch sqlite3 libjsoncpp utf8proc
 (build_sqlite)
 build_with_cmake "$(echo "$folder"/src/libjsoncpp-*/)" -DBUILD_SHARED_LIBS=ON -DBUILD_STATIC_LIBS=OFF \
     -DBUILD_OBJECT_LIBS=OFF -DJSONCPP_WITH_TESTS=OFF -DJSONCPP_WITH_POST_BUILD_UNITTEST=OFF
+build_with_cmake "$(echo "$folder"/src/utf8proc-*/)" -DBUILD_SHARED_LIBS=ON
 build_with_cmake /usr/src/googletest
 mkdir -p "$prefix/share/cmake"
 cp -R /usr/include/CLI "$prefix/include/"

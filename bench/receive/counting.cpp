@@ -4,8 +4,8 @@
 #include <vector>
 
 #include "accounting.h"
-#include "common/paths.h"
-#include "measure.h"
+#include "base/paths.h"
+#include "bench/receive/measure.h"
 
 namespace {
 

@@ -1,7 +1,7 @@
 #include <cstdlib>
 #include <cstring>
 
-#include "measure.h"
+#include "bench/receive/measure.h"
 #include "parser.h"
 
 namespace quor::bench {

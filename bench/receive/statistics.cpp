@@ -5,9 +5,9 @@
 #include <iterator>
 #include <memory>
 
-#include "common/paths.h"
+#include "base/paths.h"
+#include "bench/receive/measure.h"
 #include "dbutil.h"
-#include "measure.h"
 
 namespace quor::bench {
 namespace {

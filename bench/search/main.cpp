@@ -5,8 +5,8 @@
 #include <cstdlib>
 #include <exception>
 
-#include "search.h"
-#include "tables.h"
+#include "bench/search/operations.h"
+#include "bench/search/tables.h"
 
 int main(int argc, char** argv) try {
     const char* rows = getenv("QUOR_BENCH_ROWS");

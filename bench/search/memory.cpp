@@ -6,9 +6,9 @@
 #include <cstdio>
 #include <functional>
 
-#include "common/guards.h"
-#include "search.h"
-#include "tables.h"
+#include "bench/search/operations.h"
+#include "bench/search/tables.h"
+#include "common/handles.h"
 
 namespace quor::bench {
 namespace {

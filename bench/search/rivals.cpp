@@ -1,4 +1,4 @@
-#include "rivals.h"
+#include "bench/search/rivals.h"
 
 #include <sqlite3.h>
 

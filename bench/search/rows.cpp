@@ -1,4 +1,4 @@
-#include "rows.h"
+#include "bench/search/rows.h"
 
 #include <algorithm>
 #include <cstdio>

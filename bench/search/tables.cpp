@@ -1,4 +1,4 @@
-#include "tables.h"
+#include "bench/search/tables.h"
 
 #include <sqlite3.h>
 
@@ -9,7 +9,7 @@
 #include <memory>
 #include <stdexcept>
 
-#include "rows.h"
+#include "bench/search/rows.h"
 
 namespace quor::bench {
 namespace {

@@ -3,11 +3,11 @@
 #include <cstring>
 #include <unordered_set>
 
-#include "platform/guarded.h"
+#include "base/guarded.h"
+#include "platform/core/sections.h"
+#include "platform/core/sectionwrite.h"
+#include "platform/core/textfile.h"
 #include "quor/quorcore.h"
-#include "sections.h"
-#include "sectionwrite.h"
-#include "textfile.h"
 
 namespace {
 

@@ -1,4 +1,4 @@
-#include "sections.h"
+#include "platform/core/sections.h"
 
 namespace quor {
 namespace {

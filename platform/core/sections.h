@@ -7,7 +7,7 @@
 #include <string_view>
 #include <vector>
 
-#include "table.h"
+#include "platform/core/table.h"
 
 namespace quor {
 

@@ -1,9 +1,9 @@
-#include "sectionwrite.h"
+#include "platform/core/sectionwrite.h"
 
 #include <algorithm>
 #include <unordered_set>
 
-#include "sections.h"
+#include "platform/core/sections.h"
 
 namespace quor {
 namespace {

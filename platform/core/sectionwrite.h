@@ -6,7 +6,7 @@
 #include <string>
 #include <string_view>
 
-#include "table.h"
+#include "platform/core/table.h"
 
 namespace quor {
 

@@ -1,6 +1,6 @@
-#include "table.h"
+#include "platform/core/table.h"
 
-#include "platform/guarded.h"
+#include "base/guarded.h"
 
 QLIBSZHASH* QLIBCSzHashAlloc(int size) {
     return quor::Guarded<QLIBSZHASH*>(nullptr, [size] { return size < 1 ? nullptr : new QLIBSZHASH; });

@@ -1,4 +1,4 @@
-#include "textfile.h"
+#include "platform/core/textfile.h"
 
 #include <fcntl.h>
 #include <sys/stat.h>
@@ -8,7 +8,7 @@
 #include <cstdio>
 #include <filesystem>
 
-#include "common/guards.h"
+#include "base/guards.h"
 
 namespace quor {
 namespace {

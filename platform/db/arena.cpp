@@ -1,4 +1,4 @@
-#include "arena.h"
+#include "platform/db/arena.h"
 
 #include <sys/mman.h>
 #include <unistd.h>

@@ -6,7 +6,7 @@
 #include <cstdint>
 #include <vector>
 
-#include "spill.h"
+#include "platform/db/spill.h"
 
 namespace quor {
 

@@ -1,5 +1,5 @@
 // Opening and closing a database file, and its errors.
-#include "connection.h"
+#include "platform/db/connection.h"
 
 #include <sys/stat.h>
 

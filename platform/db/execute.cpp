@@ -2,9 +2,9 @@
 #include <memory>
 #include <new>
 
-#include "connection.h"
-#include "result.h"
-#include "statement.h"
+#include "platform/db/connection.h"
+#include "platform/db/result.h"
+#include "platform/db/statement.h"
 
 namespace {
 

@@ -1,6 +1,6 @@
 // A record is its size, the offset of each text (0 for NULL) and the texts, each with a terminating zero byte. Numbers
 // have 16 bits, or 32 after a zero in place of the size when the record is too long for that. Nothing is aligned.
-#include "result.h"
+#include "platform/db/result.h"
 
 #include <charconv>
 #include <climits>
@@ -100,28 +100,28 @@ void DBResult_tag::setColumns(sqlite3_stmt* statement) {
     columns_.reserve(count);
     for (size_t i = 0; i < count; ++i) {
         const char* name = sqlite3_column_name(statement, static_cast<int>(i));
-        columns_.push_back({name != nullptr ? name : "", (i + 1) % count});
+        columns_.push_back({name != nullptr ? name : "", i, (i + 1) % count});
+        columns_[i].first = find(columns_[i].name.c_str());
     }
 }
 
-// Writes the row as the arena's next record. The size is 0 when the row needs wider offsets.
+// Writes the row as the arena's next record of `size` bytes.
 template <typename Offset>
-bool DBResult_tag::write(sqlite3_stmt* statement, size_t& size) {
+DBResult_tag::Written DBResult_tag::write(sqlite3_stmt* statement, size_t& size) {
     char digits[kDecimalDigits];
     const auto count = static_cast<int>(columns_.size());
-    size = 0;
     size_t used = kOffsets<Offset> + columns_.size() * sizeof(Offset);
     if (!arena_.reserve(0, used)) {
-        return false;
+        return Written::NoRoom;
     }
     for (int i = 0; i < count; ++i) {
         const Field field = readField(sqlite3_column_value(statement, i), digits);
         const size_t end = field.text != nullptr ? used + field.size + 1 : used;
         if (end > std::numeric_limits<Offset>::max()) {
-            return sizeof(Offset) == sizeof(uint16_t);
+            return Written::TooLong;
         }
         if (!arena_.reserve(used, end)) {
-            return false;
+            return Written::NoRoom;
         }
         char* record = arena_.record();
         store<Offset>(record + kOffsets<Offset> + static_cast<size_t>(i) * sizeof(Offset), end > used ? used : 0);
@@ -132,22 +132,24 @@ bool DBResult_tag::write(sqlite3_stmt* statement, size_t& size) {
         used = end;
     }
     size = used;
-    return true;
+    return Written::Done;
 }
 
 bool DBResult_tag::append(sqlite3_stmt* statement) {
-    size_t size = 0;
-    if (rows_ == INT_MAX || !write<uint16_t>(statement, size)) {
+    if (rows_ == INT_MAX) {
         return false;
     }
-    if (size != 0) {
+    size_t size = 0;
+    Written written = write<uint16_t>(statement, size);
+    if (written == Written::Done) {
         store<uint16_t>(arena_.record(), size);
-    } else {
-        if (!write<uint32_t>(statement, size)) {
-            return false;
-        }
+    } else if (written == Written::TooLong) {
+        written = write<uint32_t>(statement, size);
         store<uint16_t>(arena_.record(), 0);
         store<uint32_t>(arena_.record() + sizeof(uint16_t), size);
+    }
+    if (written != Written::Done) {
+        return false;
     }
     const Position position = arena_.commit(size);
     if (rows_ % kStride == 0) {
@@ -174,24 +176,25 @@ const char* DBResult_tag::field(uint32_t row, const char* name) {
         return nullptr;
     }
     // Callers ask for the same columns in the same order for every row.
-    if (!same(columns_[expected_].name, name) && !find(name)) {
-        return nullptr;
+    if (!same(columns_[expected_].name, name)) {
+        const size_t found = find(name);
+        if (found == columns_.size()) {
+            return nullptr;
+        }
+        expected_ = columns_[last_].successor = found;  // now, and after the last one
     }
-    const size_t found = expected_;
-    last_ = found;
-    expected_ = columns_[found].successor;
-    return fieldOf(record_, found);
+    last_ = columns_[expected_].first;
+    expected_ = columns_[last_].successor;
+    return fieldOf(record_, last_);
 }
 
-// Expects the column of that name, now and after the last one.
-bool DBResult_tag::find(const char* name) {
-    for (size_t i = 0; i < columns_.size(); ++i) {
-        if (same(columns_[i].name, name)) {
-            expected_ = columns_[last_].successor = i;
-            return true;
-        }
+// The first column of that name; their number when there is none.
+size_t DBResult_tag::find(const char* name) const {
+    size_t i = 0;
+    while (i < columns_.size() && !same(columns_[i].name, name)) {
+        ++i;
     }
-    return false;
+    return i;
 }
 
 // A walk goes on from the row before; any other row is found from the mark before it.

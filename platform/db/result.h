@@ -8,7 +8,7 @@
 #include <string>
 #include <vector>
 
-#include "arena.h"
+#include "platform/db/arena.h"
 #include "quor/quordb.h"
 
 struct DBResult_tag {
@@ -29,12 +29,14 @@ struct DBResult_tag {
 
     struct Column {
         std::string name;
+        size_t first;      // the first column of this name, which answers for all of them
         size_t successor;  // the column that was asked for after this one
     };
+    enum class Written { Done, TooLong, NoRoom };  // too long for the width of its offsets
 
     template <typename Offset>
-    bool write(sqlite3_stmt* statement, size_t& size);
-    bool find(const char* name);
+    Written write(sqlite3_stmt* statement, size_t& size);
+    size_t find(const char* name) const;
     bool seek(uint32_t row);
     void moveTo(Position position);
 

@@ -1,4 +1,4 @@
-#include "spill.h"
+#include "platform/db/spill.h"
 
 #include <fcntl.h>
 #include <stdlib.h>
@@ -11,47 +11,41 @@
 namespace quor {
 namespace {
 
-int openNameless(const std::string& folder) {
-    const int file = open(folder.c_str(), O_TMPFILE | O_RDWR | O_CLOEXEC, 0600);
-    if (file >= 0) {
+Descriptor openNameless(const std::string& folder) {
+    Descriptor file(open(folder.c_str(), O_TMPFILE | O_RDWR | O_CLOEXEC, 0600));
+    if (file) {
         return file;
     }
     std::string name = folder + "/quordb-XXXXXX";  // a file system without nameless files
-    const int named = mkostemp(name.data(), O_CLOEXEC);
-    if (named >= 0) {
+    Descriptor named(mkostemp(name.data(), O_CLOEXEC));
+    if (named) {
         unlink(name.c_str());
     }
     return named;
 }
 
-int openTemporary() {
-    const char* chosen = getenv("TMPDIR");
-    for (const char* folder : {chosen, "/var/tmp", "/tmp"}) {
-        const int file = folder != nullptr && *folder != '\0' ? openNameless(folder) : -1;
-        if (file >= 0) {
+Descriptor openTemporary() {
+    for (const char* folder : {static_cast<const char*>(getenv("TMPDIR")), "/var/tmp", "/tmp"}) {
+        Descriptor file = folder != nullptr && *folder != '\0' ? openNameless(folder) : Descriptor();
+        if (file) {
             return file;
         }
     }
-    return -1;
+    return Descriptor();
 }
 
 }  // namespace
 
-SpillFile::~SpillFile() {
-    if (map_ != nullptr) {
-        munmap(map_, static_cast<size_t>(size_));
-    }
-    if (file_ >= 0) {
-        close(file_);
-    }
+void SpillFile::Unmap::operator()(char* memory) const {
+    (void)munmap(memory, size);
 }
 
 bool SpillFile::write(const char* data, size_t size) {
-    if (file_ < 0) {
+    if (!file_) {
         file_ = openTemporary();
     }
     while (size > 0) {
-        const ssize_t written = ::write(file_, data, size);
+        const ssize_t written = ::write(file_.get(), data, size);
         if (written < 0 && errno != EINTR) {
             return false;
         }
@@ -67,9 +61,10 @@ char* SpillFile::map() {
     if (size_ == 0 || size_ > SIZE_MAX) {
         return nullptr;
     }
-    void* memory = mmap(nullptr, static_cast<size_t>(size_), PROT_READ, MAP_SHARED, file_, 0);
-    map_ = memory != MAP_FAILED ? static_cast<char*>(memory) : nullptr;
-    return map_;
+    const auto size = static_cast<size_t>(size_);
+    void* memory = mmap(nullptr, size, PROT_READ, MAP_SHARED, file_.get(), 0);
+    map_ = {memory != MAP_FAILED ? static_cast<char*>(memory) : nullptr, Unmap{size}};
+    return map_.get();
 }
 
 void SpillFile::drop(const char* data, size_t size) const {
@@ -86,8 +81,9 @@ void SpillFile::fetch(const char* data, size_t size) const {
 
 void SpillFile::advise(const char* data, size_t size, int advice) const {
     const auto page = static_cast<size_t>(sysconf(_SC_PAGESIZE));
-    const size_t begin = static_cast<size_t>(data - map_) / page * page;
-    (void)madvise(map_ + begin, static_cast<size_t>(data - map_) + size - begin, advice);
+    const auto offset = static_cast<size_t>(data - map_.get());
+    const size_t begin = offset / page * page;
+    (void)madvise(map_.get() + begin, offset + size - begin, advice);
 }
 
 }  // namespace quor

@@ -4,16 +4,14 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <memory>
+
+#include "base/guards.h"
 
 namespace quor {
 
 class SpillFile {
   public:
-    SpillFile() = default;
-    SpillFile(const SpillFile&) = delete;
-    SpillFile& operator=(const SpillFile&) = delete;
-    ~SpillFile();
-
     // Appends, creating the file when it is first needed. False when there is no room for it.
     bool write(const char* data, size_t size);
     // The whole file in memory, read page by page when it is touched; null when it does not fit the address space.
@@ -27,9 +25,14 @@ class SpillFile {
   private:
     void advise(const char* data, size_t size, int advice) const;
 
-    int file_ = -1;
+    struct Unmap {
+        size_t size;
+        void operator()(char* memory) const;
+    };
+
+    Descriptor file_;
     uint64_t size_ = 0;
-    char* map_ = nullptr;
+    std::unique_ptr<char, Unmap> map_{nullptr, Unmap{0}};
 };
 
 }  // namespace quor

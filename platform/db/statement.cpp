@@ -1,4 +1,4 @@
-#include "statement.h"
+#include "platform/db/statement.h"
 
 #include <cstring>
 
@@ -66,21 +66,19 @@ void fail(sqlite3_context* context, int /*count*/, sqlite3_value** values) {
 // SQLite sets the error of a handle only by failing, so a function of our own fails with it.
 void SetError(sqlite3* db, int code, const char* text) {
     sqlite3_create_function_v2(db, "quordb_fail", 2, SQLITE_UTF8, nullptr, fail, nullptr, nullptr, nullptr);
-    sqlite3_stmt* raw = nullptr;
-    sqlite3_prepare_v2(db, "SELECT quordb_fail(?1, ?2)", -1, &raw, nullptr);
-    const Statement statement(raw);
-    sqlite3_bind_int(raw, 1, code);
-    sqlite3_bind_text(raw, 2, text, -1, SQLITE_STATIC);
-    sqlite3_step(raw);
+    Statement statement;
+    sqlite3_prepare_v2(db, "SELECT quordb_fail(?1, ?2)", -1, Adopt(statement), nullptr);
+    sqlite3_bind_int(statement.get(), 1, code);
+    sqlite3_bind_text(statement.get(), 2, text, -1, SQLITE_STATIC);
+    sqlite3_step(statement.get());
 }
 
 Statement PrepareOnly(sqlite3* db, const char* sql) {
-    sqlite3_stmt* raw = nullptr;
+    Statement statement;
     const char* tail = sql;
-    if (sqlite3_prepare_v2(db, sql, -1, &raw, &tail) != SQLITE_OK) {
+    if (sqlite3_prepare_v2(db, sql, -1, Adopt(statement), &tail) != SQLITE_OK) {
         return nullptr;
     }
-    Statement statement(raw);
     if (statement == nullptr) {
         SetError(db, SQLITE_EMPTY, "empty statement");
     } else if (!nothingFollows(tail)) {

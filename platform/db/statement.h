@@ -5,15 +5,13 @@
 #include <sqlite3.h>
 
 #include <cstdint>
-#include <memory>
 #include <string>
+
+#include "base/guards.h"
 
 namespace quor {
 
-struct Finalizer {
-    void operator()(sqlite3_stmt* statement) const { sqlite3_finalize(statement); }
-};
-using Statement = std::unique_ptr<sqlite3_stmt, Finalizer>;
+using Statement = Guard<sqlite3_stmt, sqlite3_finalize>;
 
 // The only statement of the text. Null, with the error on the handle, when it is wrong, absent or followed by more.
 Statement PrepareOnly(sqlite3* db, const char* sql);

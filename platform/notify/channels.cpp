@@ -2,7 +2,7 @@
 
 #include <cstring>
 
-#include "common/numbers.h"
+#include "base/numbers.h"
 #include "platform/notify/notify.h"
 
 namespace quor::notify {

@@ -6,7 +6,7 @@
 #include <cerrno>
 #include <cstring>
 
-#include "common/paths.h"
+#include "base/paths.h"
 #include "platform/notify/notify.h"
 
 namespace quor::notify {

@@ -4,7 +4,8 @@
 #include <algorithm>
 #include <cstring>
 
-#include "common/numbers.h"
+#include "base/numbers.h"
+#include "platform/core/table.h"
 #include "platform/notify/notify.h"
 
 namespace quor::notify {
@@ -17,14 +18,15 @@ constexpr size_t kMostRecords = 512;
 
 FilterRule LoadFilterRule(const char* filterFile, const std::string& tag) {
     FilterRule rule;
-    StringTable section(QLIBCSzHashAlloc(16));
-    if (filterFile == nullptr || QLIBCFileGetSection(filterFile, tag.c_str(), Adopt(section)) < 0) {
+    QLIBSZHASH section;
+    QLIBSZHASH* handle = &section;
+    if (filterFile == nullptr || QLIBCFileGetSection(filterFile, tag.c_str(), &handle) < 0) {
         return rule;
     }
-    if (const char* names = QLIBCSzHashGetValue(section.get(), "channels")) {
-        rule.channels = ChannelsNamed(names);
+    if (const QLIBSZHASH::Entry* names = section.find("channels")) {
+        rule.channels = ChannelsNamed(names->value);
     }
-    rule.interval = ToInt32(QLIBCSzHashGetValue(section.get(), "interval"));
+    rule.interval = ToInt32(QLIBCSzHashGetValue(handle, "interval"));
     return rule;
 }
 

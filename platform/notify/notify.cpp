@@ -2,8 +2,8 @@
 
 #include <ctime>
 
-#include "common/numbers.h"
-#include "platform/guarded.h"
+#include "base/guarded.h"
+#include "base/numbers.h"
 
 namespace quor::notify {
 namespace {

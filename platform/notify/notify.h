@@ -11,7 +11,7 @@
 #include <string_view>
 #include <vector>
 
-#include "common/guards.h"
+#include "base/guards.h"
 #include "quor/quornotify.h"
 
 namespace quor::notify {

@@ -2,11 +2,11 @@
 #include <array>
 #include <cstring>
 
-#include "common/numbers.h"
-#include "common/paths.h"
+#include "base/guarded.h"
+#include "base/numbers.h"
+#include "base/paths.h"
 #include "platform/core/sections.h"
 #include "platform/core/textfile.h"
-#include "platform/guarded.h"
 #include "platform/notify/notify.h"
 
 namespace quor::notify {

@@ -8,8 +8,8 @@
 #include <cstring>
 #include <filesystem>
 
-#include "common/numbers.h"
-#include "common/paths.h"
+#include "base/numbers.h"
+#include "base/paths.h"
 #include "platform/notify/notify.h"
 #include "quor/quorfs.h"
 

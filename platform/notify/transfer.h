@@ -7,7 +7,7 @@
 #include <array>
 #include <string>
 
-#include "common/guards.h"
+#include "base/guards.h"
 
 namespace quor::notify {
 

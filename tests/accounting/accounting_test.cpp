@@ -1,8 +1,8 @@
 #include "accounting.h"
 
-#include "support/clock.h"
-#include "support/notices.h"
-#include "support/testing.h"
+#include "tests/support/clock.h"
+#include "tests/support/notices.h"
+#include "tests/support/testing.h"
 
 using namespace quor::test;
 

@@ -5,9 +5,9 @@
 
 #include <sstream>
 
-#include "common/guards.h"
-#include "common/numbers.h"
-#include "support/testing.h"
+#include "base/numbers.h"
+#include "common/handles.h"
+#include "tests/support/testing.h"
 
 namespace {
 

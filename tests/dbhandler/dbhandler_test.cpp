@@ -3,10 +3,10 @@
 #include <syslog.h>
 
 #include "quor/quordb.h"
-#include "support/database.h"
-#include "support/db_spy.h"
-#include "support/notices.h"
-#include "support/services.h"
+#include "tests/support/database.h"
+#include "tests/support/db_spy.h"
+#include "tests/support/notices.h"
+#include "tests/support/services.h"
 
 using namespace quor::test;
 namespace fs = std::filesystem;

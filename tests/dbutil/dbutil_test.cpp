@@ -1,8 +1,8 @@
 #include "dbutil.h"
 
-#include "common/guards.h"
-#include "support/database.h"
-#include "support/db_spy.h"
+#include "common/handles.h"
+#include "tests/support/database.h"
+#include "tests/support/db_spy.h"
 
 using namespace quor::test;
 

@@ -1,7 +1,7 @@
 #include <limits>
 
 #include "dbutil.h"
-#include "support/database.h"
+#include "tests/support/database.h"
 
 using namespace quor::test;
 

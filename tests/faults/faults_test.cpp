@@ -8,7 +8,7 @@
 #include <set>
 
 #include "accounting.h"
-#include "common/guards.h"
+#include "common/handles.h"
 #include "dbhandler.h"
 #include "logger.h"
 #include "logger/eventdb.h"
@@ -16,11 +16,11 @@
 #include "platform/notify/notify.h"
 #include "quor/quorfs.h"
 #include "quor/quorsalvage.h"
-#include "support/clock.h"
-#include "support/faults.h"
-#include "support/notices.h"
-#include "support/services.h"
-#include "support/testing.h"
+#include "tests/support/clock.h"
+#include "tests/support/faults.h"
+#include "tests/support/notices.h"
+#include "tests/support/services.h"
+#include "tests/support/testing.h"
 
 namespace quor::test {
 namespace {

@@ -1,7 +1,7 @@
 #include "logger.h"
 
-#include "support/clock.h"
-#include "support/database.h"
+#include "tests/support/clock.h"
+#include "tests/support/database.h"
 
 using namespace quor::test;
 

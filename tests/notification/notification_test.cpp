@@ -1,9 +1,9 @@
 #include <tuple>
 
-#include "common/numbers.h"
+#include "base/numbers.h"
 #include "notification.h"
-#include "support/notices.h"
-#include "support/testing.h"
+#include "tests/support/notices.h"
+#include "tests/support/testing.h"
 
 using namespace quor::test;
 

@@ -2,7 +2,7 @@
 
 #include <chrono>
 
-#include "notify/fixture.h"
+#include "tests/notify/fixture.h"
 
 namespace quor::test {
 namespace {

@@ -8,10 +8,10 @@
 #include <map>
 #include <sstream>
 
-#include "common/guards.h"
+#include "common/handles.h"
 #include "quor/quornotify.h"
-#include "support/clock.h"
-#include "support/testing.h"
+#include "tests/support/clock.h"
+#include "tests/support/testing.h"
 
 namespace quor::test {
 

@@ -2,7 +2,7 @@
 #include <json/value.h>
 #include <sys/wait.h>
 
-#include "notify/fixture.h"
+#include "tests/notify/fixture.h"
 
 namespace quor::test {
 namespace {

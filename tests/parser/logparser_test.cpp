@@ -2,7 +2,7 @@
 
 #include <gtest/gtest.h>
 
-#include "support/system_log.h"
+#include "tests/support/system_log.h"
 
 namespace {
 

@@ -4,11 +4,11 @@
 #include <csignal>
 #include <map>
 
-#include "common/guards.h"
+#include "common/handles.h"
 #include "quor/quorcore.h"
 #include "quor/quorfs.h"
 #include "quor/quorservice.h"
-#include "support/testing.h"
+#include "tests/support/testing.h"
 
 using namespace quor::test;
 

@@ -4,8 +4,8 @@
 #include <cstring>
 #include <thread>
 
-#include "common/guards.h"
-#include "support/testing.h"
+#include "common/handles.h"
+#include "tests/support/testing.h"
 
 using namespace quor::test;
 using quor::Adopt;

@@ -3,8 +3,8 @@
 #include <random>
 
 #include "quor/quorsalvage.h"
-#include "support/sqlite_file.h"
-#include "support/temp_folder.h"
+#include "tests/support/sqlite_file.h"
+#include "tests/support/temp_folder.h"
 
 namespace quor::test {
 namespace {

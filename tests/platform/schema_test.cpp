@@ -1,7 +1,7 @@
 // The log schema against SQLite's planner: a search that stops using an index takes a hundred times longer.
 #include <algorithm>
 
-#include "support/testing.h"
+#include "tests/support/testing.h"
 
 using namespace quor::test;
 

@@ -1,6 +1,6 @@
 // The program itself over a real database.
-#include "program.h"
-#include "support/child.h"
+#include "tests/quorlog/program.h"
+#include "tests/support/child.h"
 
 using namespace quor::test;
 

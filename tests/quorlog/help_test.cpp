@@ -5,8 +5,8 @@
 #include <set>
 #include <sstream>
 
-#include "commands.h"
-#include "support/temp_folder.h"
+#include "tests/support/temp_folder.h"
+#include "tools/quorlog/commands/commands.h"
 
 namespace {
 

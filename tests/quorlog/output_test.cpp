@@ -1,15 +1,16 @@
-#include "output.h"
+#include "tools/quorlog/output.h"
 
 #include <gtest/gtest.h>
 #include <unistd.h>
 
 #include <map>
 
-#include "dates.h"
-#include "failure.h"
-#include "text.h"
+#include "store/dates.h"
+#include "store/failure.h"
+#include "tools/quorlog/display.h"
 
 using namespace quor::cli;
+using namespace quor::store;
 
 namespace {
 
@@ -84,7 +85,7 @@ TEST(Text, IsShownAndEncodedWithoutAnythingRaw) {
         EXPECT_EQ(AppendVisible(visible, text), width);
         EXPECT_EQ(visible, shown);
         std::string json;
-        AppendJsonString(json, text);
+        AppendVisibleJson(json, text);
         EXPECT_EQ(json, encoded);
     }
 }

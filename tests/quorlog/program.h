@@ -6,7 +6,7 @@
 
 #include <algorithm>
 
-#include "support/testing.h"
+#include "tests/support/testing.h"
 
 namespace quor::test {
 

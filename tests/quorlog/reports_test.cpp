@@ -1,5 +1,5 @@
 // The commands that report, and those that keep rules and databases in order.
-#include "program.h"
+#include "tests/quorlog/program.h"
 
 using namespace quor::test;
 
@@ -115,7 +115,7 @@ TEST_F(Reports, EntriesAreParsedAndBadLinesNamed) {
                            "0,2026-01-01,10:00:00,0,+00:00,h,ip,kern,debug,t,p,\" m\"\r\n");
     EXPECT_EQ(outcome.status, 2);
     EXPECT_EQ(outcome.err, "quorlog: line 1: fewer than twelve fields\n"
-                           "quorlog: 1 of 2 lines were no entries; see the template that writes them\n");
+                           "quorlog: 1 of 2 lines were not entries; see the template that writes them\n");
 }
 
 }  // namespace

@@ -3,7 +3,7 @@
 #include <random>
 
 #include "dbutil.h"
-#include "support/child.h"
+#include "tests/support/child.h"
 
 using namespace quor::test;
 namespace paths = quor::paths;

@@ -1,8 +1,8 @@
 #include <gtest/gtest.h>
 
-#include "quorlogd/bounds.h"
-#include "quorlogd/linesplitter.h"
-#include "quorlogd/noticetext.h"
+#include "tools/quorlogd/bounds.h"
+#include "tools/quorlogd/linesplitter.h"
+#include "tools/quorlogd/noticetext.h"
 
 using Texts = std::vector<std::string>;
 
@@ -20,16 +20,16 @@ TEST(LineSplitter, KeepsZeroBytesAndTheLongestLineThatIsAllowed) {
     }
 }
 
-TEST(NoticeContent, FitsTheNoticeWhateverNeedsEscaping) {
-    EXPECT_EQ(quor::NoticeContent(std::string(2047, 'a')), std::string(2047, 'a'));
-    EXPECT_EQ(quor::NoticeContent(std::string(2048, 'a')), std::string(2041, 'a') + " [...]");
-    EXPECT_EQ(quor::NoticeContent(std::string(1024, '"')), std::string(1020, '"') + " [...]");
+TEST(FitForNotice, FitsTheNoticeWhateverNeedsEscaping) {
+    EXPECT_EQ(quor::FitForNotice(std::string(2047, 'a')), std::string(2047, 'a'));
+    EXPECT_EQ(quor::FitForNotice(std::string(2048, 'a')), std::string(2041, 'a') + " [...]");
+    EXPECT_EQ(quor::FitForNotice(std::string(1024, '"')), std::string(1020, '"') + " [...]");
     for (size_t before = 0; before < 3; ++before) {
         std::string message(before, '-');
         for (int i = 0; i < 700; ++i) {
             message += "\u20ac";
         }
-        const std::string content = quor::NoticeContent(message);
+        const std::string content = quor::FitForNotice(message);
         const size_t kept = content.size() - 6;
         EXPECT_EQ(content, message.substr(0, kept) + " [...]");
         EXPECT_EQ((kept - before) % 3, 0U) << "cut inside a character";

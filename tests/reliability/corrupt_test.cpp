@@ -3,14 +3,14 @@
 
 #include <random>
 
-#include "common/guards.h"
+#include "common/handles.h"
 #include "dbhandler.h"
 #include "dbutil.h"
-#include "support/notices.h"
-#include "support/services.h"
-#include "support/sqlite_file.h"
-#include "support/system_log.h"
-#include "support/temp_folder.h"
+#include "tests/support/notices.h"
+#include "tests/support/services.h"
+#include "tests/support/sqlite_file.h"
+#include "tests/support/system_log.h"
+#include "tests/support/temp_folder.h"
 
 namespace quor::test {
 namespace {

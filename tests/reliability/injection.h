@@ -5,10 +5,10 @@
 #include <random>
 #include <set>
 
+#include "base/numbers.h"
 #include "common.h"
-#include "common/numbers.h"
 #include "quor/quordb.h"
-#include "support/testing.h"
+#include "tests/support/testing.h"
 
 namespace quor::test {
 

@@ -5,14 +5,14 @@
 #include <functional>
 
 #include "accounting.h"
-#include "commands.h"
-#include "common/guards.h"
+#include "common/handles.h"
 #include "dbhandler.h"
 #include "dbutil.h"
-#include "failure.h"
-#include "injection.h"
 #include "logger.h"
-#include "support/clock.h"
+#include "store/failure.h"
+#include "tests/reliability/injection.h"
+#include "tests/support/clock.h"
+#include "tools/quorlog/commands/commands.h"
 
 // Every connection of the library is watched, and does not wait for the disk.
 DBConnect_tag* QUORDBConnect(const char* host, const char* user, const char* password, const char* path) {

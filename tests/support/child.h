@@ -7,7 +7,7 @@
 #include <csignal>
 #include <string_view>
 
-#include "support/testing.h"
+#include "tests/support/testing.h"
 
 namespace quor::test {
 

@@ -1,4 +1,4 @@
-#include "support/clock.h"
+#include "tests/support/clock.h"
 
 #include <ctime>
 #include <optional>

@@ -2,7 +2,7 @@
 #ifndef TESTS_SUPPORT_DATABASE_H
 #define TESTS_SUPPORT_DATABASE_H
 
-#include "support/testing.h"
+#include "tests/support/testing.h"
 
 namespace quor::test {
 

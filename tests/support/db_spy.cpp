@@ -1,7 +1,7 @@
-#include "support/db_spy.h"
+#include "tests/support/db_spy.h"
 
 #include "quor/quordb.h"
-#include "support/real.h"
+#include "tests/support/real.h"
 
 namespace quor::test {
 

@@ -1,4 +1,4 @@
-#include "support/faults.h"
+#include "tests/support/faults.h"
 
 #include <fcntl.h>
 #include <sys/stat.h>
@@ -10,7 +10,7 @@
 #include <cstdlib>
 #include <new>
 
-#include "support/real.h"
+#include "tests/support/real.h"
 
 namespace {
 

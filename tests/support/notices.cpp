@@ -1,4 +1,4 @@
-#include "support/notices.h"
+#include "tests/support/notices.h"
 
 namespace quor::test {
 

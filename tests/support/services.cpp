@@ -1,4 +1,4 @@
-#include "support/services.h"
+#include "tests/support/services.h"
 
 #include "quor/quorservice.h"
 

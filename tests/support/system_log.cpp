@@ -1,4 +1,4 @@
-#include "support/system_log.h"
+#include "tests/support/system_log.h"
 
 #include <cstdarg>
 #include <cstdio>
@@ -6,7 +6,7 @@
 #include <new>
 #include <utility>
 
-#include "common/guards.h"
+#include "common/handles.h"
 
 namespace {
 

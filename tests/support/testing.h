@@ -6,10 +6,10 @@
 #include <stdlib.h>
 #include <unistd.h>
 
-#include "common/paths.h"
-#include "support/sqlite_file.h"
-#include "support/system_log.h"
-#include "support/temp_folder.h"
+#include "base/paths.h"
+#include "tests/support/sqlite_file.h"
+#include "tests/support/system_log.h"
+#include "tests/support/temp_folder.h"
 
 namespace quor::test {
 

@@ -1,15 +1,15 @@
-#include "eventpage.h"
+#include "tools/quorlog/eventpage.h"
 
 #include <fcntl.h>
-#include <unistd.h>
 
 #include <cerrno>
 #include <cstring>
 
-#include "dates.h"
-#include "failure.h"
-#include "output.h"
-#include "text.h"
+#include "base/guards.h"
+#include "store/dates.h"
+#include "store/failure.h"
+#include "tools/quorlog/display.h"
+#include "tools/quorlog/output.h"
 
 namespace quor::cli {
 namespace {
@@ -18,22 +18,14 @@ constexpr char kHead[] = "<!DOCTYPE html>\n<html><head>\n<meta charset=\"utf-8\"
                          "</head>\n<body>\n<center><h2> Syslog Server Log </h2></center>\n<table border=1 width=95%>\n"
                          "<tr>\n<th>Type</th><th>Time</th><th>User</th><th>Event</th></tr>\n";
 
-class OpenFile {
-  public:
-    explicit OpenFile(const std::string& path)
-        : fd_(open(path.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC, 0666)) {
-        if (fd_ < 0) {
-            throw Failure("cannot write " + Visible(path) + ": " + strerror(errno) + "; give another file");
-        }
+Descriptor openPage(const std::string& path) {
+    Descriptor page(open(path.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC, 0666));
+    if (!page) {
+        throw store::Failure("cannot write " + path + ": " + strerror(errno) + "; give another file",
+                             store::Cause::Denied);
     }
-    OpenFile(const OpenFile&) = delete;
-    OpenFile& operator=(const OpenFile&) = delete;
-    ~OpenFile() { close(fd_); }
-    int get() const { return fd_; }
-
-  private:
-    int fd_;
-};
+    return page;
+}
 
 void appendCell(std::string& out, const std::string& text) {
     out += "<td>";
@@ -58,16 +50,17 @@ void appendCell(std::string& out, const std::string& text) {
 }  // namespace
 
 void RequireWritable(const std::string& path) {
-    const OpenFile file(path);
+    (void)openPage(path);
 }
 
 void WriteEventPage(const std::list<_SSYSLOG_LOG_LOG_tag>& events, const std::string& path) {
-    const OpenFile file(path);
+    const Descriptor file = openPage(path);
     Output out(file.get());
     out.buffer() = kHead;
     for (const _SSYSLOG_LOG_LOG_tag& event : events) {
         out.buffer() += "<tr>";
-        for (const std::string& text : {strLevelGet(event.level), LocalTime(event.time), event.user, event.event}) {
+        for (const std::string& text :
+             {strLevelGet(event.level), store::LocalTime(event.time), event.user, event.event}) {
             appendCell(out.buffer(), text);
         }
         out.buffer() += "</tr>\n";

@@ -6,16 +6,16 @@
 #include <cstdio>
 #include <iostream>
 
-#include "commands.h"
-#include "failure.h"
-#include "text.h"
+#include "store/failure.h"
+#include "tools/quorlog/commands/commands.h"
+#include "tools/quorlog/messages.h"
 
 namespace {
 
 using quor::cli::kFailed;
 
 int fail(const std::string& text) {
-    std::cerr << "quorlog: " << text << '\n';
+    quor::cli::Complain(text);
     return kFailed;
 }
 
@@ -27,7 +27,7 @@ int parseFailed(const CLI::App& app, const CLI::ParseError& error) {
     }
     const bool unknown = app.get_subcommands().empty() && app.remaining_size() != 0;
     const std::string cause = unknown ? "no such command '" + app.remaining().front() + "'" : error.what();
-    return fail(quor::cli::Visible(cause) + "; see quorlog --help-all");
+    return fail(cause + "; see quorlog --help-all");
 }
 
 int run(int argc, char** argv) {
@@ -40,7 +40,7 @@ int run(int argc, char** argv) {
         return status;
     } catch (const CLI::ParseError& error) {
         return parseFailed(app, error);
-    } catch (const quor::cli::Failure& failure) {
+    } catch (const quor::store::Failure& failure) {
         return fail(failure.what());
     }
 }

@@ -1,24 +1,23 @@
-#include "options.h"
+#include "tools/quorlog/options.h"
 
 #include <algorithm>
 #include <charconv>
 #include <cstdlib>
-#include <map>
 
-#include "common/paths.h"
-#include "records.h"
-#include "text.h"
+#include "base/paths.h"
+#include "store/columns.h"
 
 namespace quor::cli {
 namespace {
-
-const std::map<std::string, Format> kFormats = {
-    {"table", Format::Table}, {"json", Format::Json}, {"csv", Format::Csv}, {"ndjson", Format::Ndjson}};
 
 bool wantsColor() {
     const char* noColor = getenv("NO_COLOR");
     const char* terminal = getenv("TERM");
     return (noColor == nullptr || *noColor == '\0') && terminal != nullptr && std::string(terminal) != "dumb";
+}
+
+CLI::IsMember namesOf(const std::array<const char*, 4>& names) {
+    return CLI::IsMember(std::vector<std::string>(names.begin(), names.end()));
 }
 
 // An option that may be given several times; its values are joined like a list.
@@ -35,7 +34,8 @@ CLI::Option* addFilter(CLI::App& command, const std::string& name, std::string& 
 
 Style OutputOptions::style() const {
     Style style;
-    style.format = kFormats.at(format);
+    const auto* const known = std::find(kFormatNames.begin(), kFormatNames.end(), format);
+    style.format = static_cast<Format>(known - kFormatNames.begin());
     style.safeCsv = safeCsv;
     style.terminal = isatty(STDOUT_FILENO) == 1;
     style.color = style.terminal && wantsColor();
@@ -50,10 +50,10 @@ void AddTableOption(CLI::App& command, std::string& table) {
     command.add_option("--table", table, "Table to read")
         ->type_name("NAME")
         ->capture_default_str()
-        ->check(CLI::IsMember(std::vector<std::string>(kLogTables.begin(), kLogTables.end())));
+        ->check(namesOf(store::kLogTables));
 }
 
-void AddFilterOptions(CLI::App& command, FilterOptions& filters) {
+void AddFilterOptions(CLI::App& command, store::FilterOptions& filters) {
     addList(command, "--host", filters.host, "Sending hosts");
     addList(command, "--level", filters.level, "Levels: err, crit; err+ is err and worse");
     addList(command, "--facility", filters.facility, "Facilities: kern, auth");
@@ -69,7 +69,7 @@ void AddOutputOptions(CLI::App& command, OutputOptions& output) {
     command.add_option("--format", output.format, "Form of the output: table, json, csv, ndjson")
         ->type_name("NAME")
         ->capture_default_str()
-        ->check(CLI::IsMember({"table", "json", "csv", "ndjson"}));
+        ->check(namesOf(kFormatNames));
     command.add_flag("--safe-csv", output.safeCsv, "csv: put ' before cells that a spreadsheet takes for a formula");
 }
 
@@ -82,7 +82,7 @@ CLI::Option* AddNumberOption(CLI::App& command, const std::string& name, uint64_
         const std::string& text = given.back();
         const auto result = std::from_chars(text.data(), text.data() + text.size(), value);
         if (result.ec != std::errc() || result.ptr != text.data() + text.size()) {
-            throw Failure(name + ": not a number: '" + Visible(text) + "'; give digits only");
+            throw Failure(name + ": not a number: '" + text + "'; give digits only");
         }
         return true;
     };

@@ -9,11 +9,13 @@
 #include <memory>
 #include <string>
 
-#include "failure.h"
-#include "filters.h"
-#include "output.h"
+#include "store/failure.h"
+#include "store/filter.h"
+#include "tools/quorlog/output.h"
 
 namespace quor::cli {
+
+using store::Failure;
 
 struct OutputOptions {
     std::string format = "table";
@@ -25,7 +27,7 @@ struct OutputOptions {
 
 void AddDatabaseOption(CLI::App& command, std::string& db);
 void AddTableOption(CLI::App& command, std::string& table);
-void AddFilterOptions(CLI::App& command, FilterOptions& filters);
+void AddFilterOptions(CLI::App& command, store::FilterOptions& filters);
 void AddOutputOptions(CLI::App& command, OutputOptions& output);
 void AddYesOption(CLI::App& command, bool& yes);
 

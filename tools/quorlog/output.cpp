@@ -1,4 +1,4 @@
-#include "output.h"
+#include "tools/quorlog/output.h"
 
 #include <unistd.h>
 
@@ -6,8 +6,8 @@
 #include <cerrno>
 #include <cstring>
 
-#include "failure.h"
-#include "text.h"
+#include "store/failure.h"
+#include "tools/quorlog/display.h"
 
 namespace quor::cli {
 namespace {
@@ -24,7 +24,7 @@ void appendObject(std::string& out, const Columns& columns, const Cells& cells) 
         if (columns[i].kind == Kind::Number) {
             out += cells[i].empty() ? "null" : cells[i];
         } else {
-            AppendJsonString(out, cells[i]);
+            AppendVisibleJson(out, cells[i]);
         }
     }
     out += '}';
@@ -120,7 +120,9 @@ void Output::flush() {
         if (written < 0) {
             const std::string cause = strerror(errno);
             buffer_.clear();
-            throw Failure("cannot write the output: " + cause + "; see that its reader runs and its disk has room");
+            throw store::Failure("cannot write the output: " + cause +
+                                     "; see that its reader runs and its disk has room",
+                                 store::Cause::Other);
         }
         rest.remove_prefix(static_cast<size_t>(written));
     }
@@ -154,12 +156,6 @@ void WriteRecord(const Style& style, const std::vector<Value>& values, Output& o
     const auto sink = MakeSink(style, std::move(columns), out);
     sink->row(cells);
     sink->finish();
-}
-
-void WriteLine(const std::string& line) {
-    Output out(STDOUT_FILENO);
-    out.buffer() = line + '\n';
-    out.flush();
 }
 
 }  // namespace quor::cli

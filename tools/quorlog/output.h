@@ -2,10 +2,13 @@
 #ifndef QUORLOG_OUTPUT_H
 #define QUORLOG_OUTPUT_H
 
+#include <array>
 #include <memory>
 #include <string>
 #include <string_view>
 #include <vector>
+
+#include "store/columns.h"
 
 namespace quor::cli {
 
@@ -34,6 +37,7 @@ class Output {
 };
 
 enum class Format { Table, Json, Csv, Ndjson };
+constexpr std::array<const char*, 4> kFormatNames = {"table", "json", "csv", "ndjson"};  // by Format
 
 struct Style {
     Format format = Format::Table;
@@ -42,11 +46,7 @@ struct Style {
     bool color = false;
 };
 
-enum class Kind {
-    Text,
-    Number,  // cells are valid JSON numbers, or empty
-    Level,   // a severity's name
-};
+using store::Kind;
 
 struct Column {
     const char* name;
@@ -87,9 +87,6 @@ struct Value {
     Kind kind = Kind::Text;
 };
 void WriteRecord(const Style& style, const std::vector<Value>& values, Output& out);
-
-// One line for a person.
-void WriteLine(const std::string& line);
 
 }  // namespace quor::cli
 

@@ -1,29 +1,15 @@
-// Log records as rows: which columns each table has.
+// Log records as rows of the output.
 #ifndef QUORLOG_RECORDS_H
 #define QUORLOG_RECORDS_H
 
-#include <array>
 #include <memory>
 #include <string>
+#include <vector>
 
-#include "dbutil.h"
-#include "output.h"
+#include "store/columns.h"
+#include "tools/quorlog/output.h"
 
 namespace quor::cli {
-
-constexpr std::array<const char*, 4> kLogTables = {"logs", "general_log", "connection_log", "transfer_log"};
-
-bool HasColumn(const std::string& table, _SYSLOG_DB_ATTRI_tag attribute);
-
-// Text of a number, kept until the row is written.
-using Digits = std::array<char, 24>;
-
-// One column of a table and how a record fills it.
-struct Field {
-    Column column;
-    bool brief;  // stands in the table for people
-    std::string_view (*read)(const _SYSLOG_LOG_DATA_tag& record, Digits& digits);
-};
 
 // Writes log records; the names of the columns are those of the database.
 class RecordSink {
@@ -35,8 +21,8 @@ class RecordSink {
     void finish() { sink_->finish(); }
 
   private:
-    std::vector<Field> fields_;
-    std::vector<Digits> digits_;
+    std::vector<store::Column> fields_;
+    std::vector<store::Digits> digits_;
     Cells cells_;
     std::unique_ptr<RowSink> sink_;
 };

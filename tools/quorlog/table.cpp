@@ -4,8 +4,8 @@
 #include <array>
 
 #include "dbutil.h"
-#include "output.h"
-#include "text.h"
+#include "tools/quorlog/display.h"
+#include "tools/quorlog/output.h"
 
 namespace quor::cli {
 namespace {

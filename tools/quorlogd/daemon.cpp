@@ -1,4 +1,4 @@
-#include "quorlogd/daemon.h"
+#include "tools/quorlogd/daemon.h"
 
 #include <poll.h>
 #include <sys/signalfd.h>
@@ -20,7 +20,7 @@ constexpr seconds kRetryFlush{60};  // each failed one may have waited for a loc
 constexpr char kEventText[] = "quorlogd " QUORLOGD_VERSION;
 
 // A descriptor that reads the signals; nothing runs in a handler.
-int openSignals() {
+Descriptor openSignals() {
     (void)signal(SIGPIPE, SIG_IGN);
     (void)signal(SIGXFSZ, SIG_IGN);  // a full database is not the end
     sigset_t answered;
@@ -29,8 +29,8 @@ int openSignals() {
         sigaddset(&answered, number);
     }
     sigprocmask(SIG_BLOCK, &answered, nullptr);
-    const int descriptor = signalfd(-1, &answered, SFD_CLOEXEC | SFD_NONBLOCK);
-    if (descriptor < 0) {
+    Descriptor descriptor(signalfd(-1, &answered, SFD_CLOEXEC | SFD_NONBLOCK));
+    if (!descriptor) {
         throw std::runtime_error("cannot receive signals");
     }
     return descriptor;
@@ -42,10 +42,6 @@ Daemon::Daemon(const Options& options, int input)
     : options_(options), input_(input), signals_(openSignals()), receiver_(options), housekeeping_(options) {
     nextTick_ = nextCheck_ = Clock::now();
     nextFlush_ = nextTick_ + seconds(options.flushSeconds);
-}
-
-Daemon::~Daemon() {
-    close(signals_);
 }
 
 int Daemon::run() {
@@ -64,7 +60,7 @@ int Daemon::run() {
 
 // For input, a signal or the next timer.
 void Daemon::wait() {
-    pollfd sources[] = {{signals_, POLLIN, 0}, {input_, POLLIN, 0}};
+    pollfd sources[] = {{signals_.get(), POLLIN, 0}, {input_, POLLIN, 0}};
     constexpr int kTickMs = 1000;
     if (poll(sources, 2, kTickMs) <= 0) {
         return;
@@ -96,7 +92,7 @@ void Daemon::drain() {
 
 void Daemon::answerSignal() {
     signalfd_siginfo info{};
-    if (::read(signals_, &info, sizeof(info)) != sizeof(info)) {
+    if (::read(signals_.get(), &info, sizeof(info)) != sizeof(info)) {
         return;
     }
     switch (info.ssi_signo) {

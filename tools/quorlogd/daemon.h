@@ -5,9 +5,10 @@
 #include <array>
 #include <chrono>
 
-#include "quorlogd/housekeeping.h"
-#include "quorlogd/options.h"
-#include "quorlogd/receiver.h"
+#include "base/guards.h"
+#include "tools/quorlogd/housekeeping.h"
+#include "tools/quorlogd/options.h"
+#include "tools/quorlogd/receiver.h"
 
 namespace quor {
 
@@ -17,7 +18,6 @@ class Daemon {
     Daemon(const Options& options, int input);
     Daemon(const Daemon&) = delete;
     Daemon& operator=(const Daemon&) = delete;
-    ~Daemon();
 
     // Until the end of input or SIGTERM or SIGINT. The exit status.
     int run();
@@ -33,7 +33,7 @@ class Daemon {
 
     const Options& options_;
     int input_;
-    int signals_;
+    Descriptor signals_;
     bool stopping_ = false;
     Receiver receiver_;
     Housekeeping housekeeping_;

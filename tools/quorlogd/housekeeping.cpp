@@ -1,9 +1,9 @@
-#include "quorlogd/housekeeping.h"
+#include "tools/quorlogd/housekeeping.h"
 
 #include <sys/statvfs.h>
 #include <syslog.h>
 
-#include "common/paths.h"
+#include "base/paths.h"
 #include "dbhandler/session.h"
 #include "logger.h"
 #include "notification.h"

@@ -2,7 +2,7 @@
 #ifndef QUORLOGD_HOUSEKEEPING_H
 #define QUORLOGD_HOUSEKEEPING_H
 
-#include "quorlogd/options.h"
+#include "tools/quorlogd/options.h"
 
 namespace quor {
 

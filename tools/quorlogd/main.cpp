@@ -5,9 +5,9 @@
 #include <cstdio>
 #include <filesystem>
 
-#include "common/paths.h"
-#include "quorlogd/daemon.h"
-#include "quorlogd/housekeeping.h"
+#include "base/paths.h"
+#include "tools/quorlogd/daemon.h"
+#include "tools/quorlogd/housekeeping.h"
 
 namespace {
 

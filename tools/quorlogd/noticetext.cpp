@@ -1,4 +1,4 @@
-#include "quorlogd/noticetext.h"
+#include "tools/quorlogd/noticetext.h"
 
 namespace {
 
@@ -38,7 +38,7 @@ size_t characterStart(const std::string& text, size_t pos) {
 
 namespace quor {
 
-std::string NoticeContent(const std::string& message) {
+std::string FitForNotice(const std::string& message) {
     if (fitting(message, kNoticeBytes) == message.size()) {
         return message;
     }

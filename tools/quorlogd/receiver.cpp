@@ -1,4 +1,4 @@
-#include "quorlogd/receiver.h"
+#include "tools/quorlogd/receiver.h"
 
 #include <sys/statvfs.h>
 #include <syslog.h>
@@ -7,9 +7,9 @@
 #include <filesystem>
 #include <thread>
 
-#include "common/paths.h"
+#include "base/paths.h"
 #include "logger.h"
-#include "quorlogd/noticetext.h"
+#include "tools/quorlogd/noticetext.h"
 
 namespace quor {
 namespace {
@@ -62,7 +62,7 @@ void Receiver::checkRules(const _SYSLOG_LOG_DATA_tag& record) {
         return;
     }
     // The calls report their own failures.
-    const std::string content = NoticeContent(record.msg);
+    const std::string content = FitForNotice(record.msg);
     if (severe && mayNotify()) {
         (void)rules_.NotificationSendSev(record.host, PriorTypeToStr(record.prio), content);
         (void)Logger().LogAddNotifySev(record.prio, EventText(content));

@@ -8,9 +8,9 @@
 #include "accounting.h"
 #include "notification.h"
 #include "parser.h"
-#include "quorlogd/bounds.h"
-#include "quorlogd/linesplitter.h"
-#include "quorlogd/options.h"
+#include "tools/quorlogd/bounds.h"
+#include "tools/quorlogd/linesplitter.h"
+#include "tools/quorlogd/options.h"
 
 namespace quor {
 

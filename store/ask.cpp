@@ -1,0 +1,69 @@
+#include "store/ask.h"
+
+#include "common/errorcode.h"
+#include "common/handles.h"
+#include "store/failure.h"
+
+namespace quor::store {
+namespace {
+
+// A statement of ours is wrong only for a database that lacks what it names.
+Cause causeOf(int code) {
+    switch (code) {
+    case SQLITE_ERROR:
+        return Cause::Missing;
+    case SQLITE_BUSY:
+    case SQLITE_LOCKED:
+        return Cause::Busy;
+    case SQLITE_CORRUPT:
+    case SQLITE_NOTADB:
+        return Cause::Damaged;
+    case SQLITE_PERM:
+    case SQLITE_AUTH:
+    case SQLITE_READONLY:
+    case SQLITE_CANTOPEN:
+        return Cause::Denied;
+    default:
+        return Cause::Other;
+    }
+}
+
+const char* adviceFor(Cause cause) {
+    switch (cause) {
+    case Cause::Missing:
+        return "choose another --table or --db";
+    case Cause::Damaged:
+        return "run quorlog db check on it";
+    case Cause::Busy:
+        return "try again, another program holds it";
+    case Cause::Denied:
+        return "see that you may read and write it and its folder";
+    default:
+        return "see the system log";
+    }
+}
+
+}  // namespace
+
+std::vector<std::string> Ask(const std::string& db, const std::string& sql, const char* column) {
+    const Connection connection(QUORDBConnect(nullptr, nullptr, nullptr, db.c_str()));
+    if (connection == nullptr) {
+        throw Failure("cannot open " + db + "; see that it is a database that you may read", Cause::Denied);
+    }
+    Result result;
+    if (QUORDBExecute(connection.get(), sql.c_str(), Adopt(result)) < 0) {
+        const Cause cause = causeOf(ErrorCode(connection.get()));
+        throw Failure(db + ": " + QUORDBErrorGet(connection.get()) + "; " + adviceFor(cause), cause);
+    }
+    std::vector<std::string> texts;
+    for (Row row(result.get()); row.next();) {
+        texts.emplace_back(row[column]);
+    }
+    return texts;
+}
+
+void RequireTable(const std::string& db, const std::string& table) {
+    (void)Ask(db, "SELECT 1 FROM " + table + " LIMIT 1", "1");
+}
+
+}  // namespace quor::store

@@ -1,0 +1,39 @@
+// The columns of the log tables: what a filter can ask for, and what a record shows of itself.
+#ifndef STORE_COLUMNS_H
+#define STORE_COLUMNS_H
+
+#include <array>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "dbutil.h"
+
+namespace quor::store {
+
+constexpr std::array<const char*, 4> kLogTables = {"logs", "general_log", "connection_log", "transfer_log"};
+
+enum class Kind {
+    Text,
+    Number,  // valid JSON numbers, or empty
+    Level,   // a severity's name
+};
+
+// The text of a number, kept by the caller until it is written.
+using Digits = std::array<char, 24>;
+
+// One column of a table and how a record fills it.
+struct Column {
+    const char* name;
+    Kind kind;
+    bool brief;  // shown where there is little room
+    std::string_view (*read)(const _SYSLOG_LOG_DATA_tag& record, Digits& digits);
+};
+
+std::vector<Column> ColumnsOf(const std::string& table);
+
+bool HasColumn(const std::string& table, _SYSLOG_DB_ATTRI_tag attribute);
+
+}  // namespace quor::store
+
+#endif

@@ -1,0 +1,53 @@
+// The filters that every program shares, checked and turned into search conditions.
+#ifndef STORE_FILTER_H
+#define STORE_FILTER_H
+
+#include <ctime>
+#include <list>
+#include <string>
+#include <vector>
+
+#include "dbutil.h"
+
+namespace quor::store {
+
+using Conditions = std::list<_SYSLOG_SQL_COND_tag>;
+
+// As a person gives them; an empty one leaves that filter out. Lists are separated by commas.
+struct FilterOptions {
+    std::string host;
+    std::string level;
+    std::string facility;
+    std::string program;
+    std::string keyword;
+    std::string glob;
+    std::string from;
+    std::string to;
+};
+
+struct Filter {
+    Conditions conditions;
+    // The conditions take "*" and "?" of a keyword for any one character, because a pattern cannot quote them. A
+    // message counts only when it contains this text; empty when the conditions are exact.
+    std::string literal;
+
+    bool accepts(const _SYSLOG_LOG_DATA_tag& record) const;
+};
+
+// Failure for a filter that the table cannot answer, and for a value that would silently match nothing or everything.
+// Failures name the filters as options of a command line.
+Filter BuildFilter(const FilterOptions& options, const std::string& table, time_t now);
+
+// Each filter that can be told apart cheaply, alone, with the words for "no row ...".
+struct Probe {
+    std::string words;
+    Conditions conditions;
+};
+std::vector<Probe> BuildProbes(const FilterOptions& options, const std::string& table, time_t now);
+
+// A condition on the id; `op` is one of SYSLOG_OP_....
+_SYSLOG_SQL_COND_tag IdCondition(int op, uint64_t id);
+
+}  // namespace quor::store
+
+#endif

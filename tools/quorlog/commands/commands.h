@@ -1,0 +1,32 @@
+// Every command adds itself to the program; the chosen one runs while the command line is parsed.
+#ifndef QUORLOG_COMMANDS_COMMANDS_H
+#define QUORLOG_COMMANDS_COMMANDS_H
+
+namespace CLI {
+class App;
+}
+
+namespace quor::cli {
+
+void AddSearch(CLI::App& app, int& status);
+void AddCount(CLI::App& app, int& status);
+void AddDelete(CLI::App& app, int& status);
+void AddValues(CLI::App& app, int& status);
+void AddNames(CLI::App& app, int& status);
+void AddStats(CLI::App& app, int& status);
+void AddEvents(CLI::App& app, int& status);
+void AddRules(CLI::App& app, int& status);
+void AddNotify(CLI::App& app, int& status);
+void AddDb(CLI::App& app, int& status);
+void AddParse(CLI::App& app, int& status);
+
+// Below db.
+void AddDbCheck(CLI::App& db, int& status);
+void AddDbSalvage(CLI::App& db, int& status);
+
+// All of them.
+void AddCommands(CLI::App& app, int& status);
+
+}  // namespace quor::cli
+
+#endif

@@ -1,0 +1,107 @@
+// db create, info, checkpoint.
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include "base/paths.h"
+#include "dbhandler.h"
+#include "dbhandler/session.h"
+#include "store/databasefile.h"
+#include "store/selection.h"
+#include "tools/quorlog/commands/commands.h"
+#include "tools/quorlog/messages.h"
+#include "tools/quorlog/options.h"
+#include "tools/quorlog/shellpath.h"
+
+namespace quor::cli {
+namespace {
+
+struct DbOptions {
+    std::string db = paths::kWorkingDb;
+    OutputOptions output;
+};
+
+void setup(CLI::App& command, DbOptions& options) {
+    AddDatabaseOption(command, options.db);
+}
+
+void setupInfo(CLI::App& command, DbOptions& options) {
+    setup(command, options);
+    AddOutputOptions(command, options.output);
+}
+
+void connect(DbSession& session, const std::string& path) {
+    if (!session.connect()) {
+        throw Failure("cannot open " + path + "; see that you may read and write it and its folder",
+                      store::Cause::Denied);
+    }
+}
+
+uint64_t sizeOf(const std::string& path) {
+    struct stat status = {};
+    return stat(path.c_str(), &status) == 0 ? static_cast<uint64_t>(status.st_size) : 0;
+}
+
+int runCreate(const DbOptions& options) {
+    const std::string db = store::AbsolutePath(options.db);
+    RequirePlainPath(db, Quoting::Double);
+    struct stat status = {};
+    if (lstat(db.c_str(), &status) == 0) {
+        throw Failure(db + " exists already; move it away or give another --db");
+    }
+    if (access(paths::kLogSchema, R_OK) != 0 || access(paths::kSqliteShell, X_OK) != 0) {
+        throw Failure(std::string("needs ") + paths::kLogSchema + " and " + paths::kSqliteShell + "; install them");
+    }
+    DbSession session(db, paths::kLogSchema);
+    connect(session, db);
+    if (session->DBcheckTableExist("logs") != 1) {
+        throw Failure("could not create the tables of " + db + "; see the system log");
+    }
+    WriteLine("created " + db);
+    return kDone;
+}
+
+int runInfo(const DbOptions& options) {
+    const auto source = store::OpenSource(options.db);
+    const std::string& db = source->name();
+    const uint64_t rows = store::Count(*source, {});
+    DbSession handle(db, paths::kLogSchema);
+    connect(handle, db);
+    _ARCH_DB_INFO_tag info;
+    const bool described = handle->DBcheckTableExist("db_info") == 1 && handle->DBInfoGet(info) == 0;
+    Output out(STDOUT_FILENO);
+    WriteRecord(options.output.style(),
+                {{"path", db},
+                 {"bytes", std::to_string(sizeOf(db)), Kind::Number},
+                 {"wal_bytes", std::to_string(sizeOf(db + "-wal")), Kind::Number},
+                 {"device", described ? info.device : ""},
+                 {"logs", std::to_string(rows), Kind::Number},
+                 {"oldest", rows == 0 ? "" : handle->DBInfoStartStrGet()},
+                 {"newest", rows == 0 ? "" : handle->DBInfoEndStrGet()}},
+                out);
+    return kDone;
+}
+
+int runCheckpoint(const DbOptions& options) {
+    const std::string db = store::RequireLogDatabase(options.db);
+    DbSession session(db, paths::kLogSchema);
+    connect(session, db);
+    if (session->DBWalCheckpoint(false) != 0) {
+        throw Failure("cannot move the write-ahead log into " + db + "; try again when no program reads it");
+    }
+    WriteLine("moved the write-ahead log into " + db);
+    return kDone;
+}
+
+}  // namespace
+
+void AddDb(CLI::App& app, int& status) {
+    CLI::App& db = *app.add_subcommand("db", "Create and look after log databases");
+    db.require_subcommand(1);
+    AddCommand<DbOptions>(db, "create", "Create an empty log database", status, setup, runCreate);
+    AddCommand<DbOptions>(db, "info", "Size, rows and dates of a log database", status, setupInfo, runInfo);
+    AddCommand<DbOptions>(db, "checkpoint", "Move the write-ahead log into the database", status, setup, runCheckpoint);
+    AddDbSalvage(db, status);
+    AddDbCheck(db, status);
+}
+
+}  // namespace quor::cli

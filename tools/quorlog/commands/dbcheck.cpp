@@ -1,0 +1,107 @@
+// db check, wal, limit: looking after the working database.
+#include <filesystem>
+
+#include "base/paths.h"
+#include "dbhandler.h"
+#include "store/ask.h"
+#include "store/databasefile.h"
+#include "tools/quorlog/commands/commands.h"
+#include "tools/quorlog/messages.h"
+#include "tools/quorlog/options.h"
+#include "tools/quorlog/shellpath.h"
+
+namespace quor::cli {
+namespace {
+
+struct CareOptions {
+    std::string db = paths::kWorkingDb;
+    uint64_t kilobytes = 0;
+    bool full = false;
+    bool yes = false;
+};
+
+void setupCheck(CLI::App& command, CareOptions& options) {
+    AddDatabaseOption(command, options.db);
+    command.add_flag("--full", options.full, "Compare indexes with their tables, too: much slower");
+}
+
+void setupWal(CLI::App& command, CareOptions& options) {
+    AddDatabaseOption(command, options.db);
+}
+
+void setupLimit(CLI::App& command, CareOptions& options) {
+    AddNumberOption(command, "kilobytes", options.kilobytes, "The size that is allowed")->required();
+    AddDatabaseOption(command, options.db);
+    AddYesOption(command, options.yes);
+}
+
+[[noreturn]] void failDamaged(const std::string& db) {
+    throw Failure(db + " is damaged; stop syslog-ng, move the file away with its -wal and -shm, start "
+                       "syslog-ng, and save its rows with quorlog db salvage",
+                  store::Cause::Damaged);
+}
+
+std::vector<std::string> findings(const std::string& db, bool full) {
+    const char* check = full ? "integrity_check" : "quick_check";
+    try {
+        return store::Ask(db, std::string("PRAGMA ") + check, check);
+    } catch (const Failure& failure) {
+        if (failure.cause() != store::Cause::Damaged) {
+            throw;
+        }
+        failDamaged(db);
+    }
+}
+
+int runCheck(const CareOptions& options) {
+    const std::string db = store::RequireLogDatabase(options.db);
+    const std::vector<std::string> found = findings(db, options.full);
+    if (found == std::vector<std::string>{"ok"}) {
+        WriteLine(db + " is sound");
+        return kDone;
+    }
+    for (const std::string& finding : found) {
+        WriteLine(finding);
+    }
+    failDamaged(db);
+}
+
+int runWal(const CareOptions& options) {
+    const std::string db = store::RequireLogDatabase(options.db);
+    RequirePlainPath(db, Quoting::None);
+    const bool ran = SyslogngWorkingDbSetJouWal(db) == 0;
+    if (!ran || store::Ask(db, "PRAGMA journal_mode", "journal_mode") != std::vector<std::string>{"wal"}) {
+        throw Failure("cannot switch " + db + " to write-ahead journaling; try again when no program uses it");
+    }
+    WriteLine(db + " journals ahead");
+    return kDone;
+}
+
+int runLimit(const CareOptions& options) {
+    const std::string db = store::RequireLogDatabase(options.db);
+    const uint64_t kilobytes = std::filesystem::file_size(db) / 1024;
+    const std::string size = db + " has " + std::to_string(kilobytes) + " KiB";
+    if (options.kilobytes > INT32_MAX || kilobytes <= options.kilobytes) {
+        WriteLine(size + ", which is allowed");
+        return kDone;
+    }
+    if (!options.yes && !Confirm(size + ". Remove it with all its rows, and have syslog-ng begin a new one?")) {
+        Complain("nothing removed");
+        return kNothing;
+    }
+    if (SyslogngWorkingDbCheck(db, static_cast<int>(options.kilobytes)) < 0) {
+        throw Failure("cannot remove " + db + "; see the system log");
+    }
+    WriteLine("removed " + db);
+    return kDone;
+}
+
+}  // namespace
+
+void AddDbCheck(CLI::App& db, int& status) {
+    AddCommand<CareOptions>(db, "check", "Look for damage in a database", status, setupCheck, runCheck);
+    AddCommand<CareOptions>(db, "wal", "Switch a database to write-ahead journaling", status, setupWal, runWal);
+    AddCommand<CareOptions>(db, "limit", "Remove a database that has grown too large", status, setupLimit, runLimit);
+}
+
+}  // namespace quor::cli

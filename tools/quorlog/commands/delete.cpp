@@ -1,0 +1,65 @@
+// delete.
+#include <ctime>
+
+#include "base/paths.h"
+#include "store/selection.h"
+#include "tools/quorlog/commands/commands.h"
+#include "tools/quorlog/messages.h"
+#include "tools/quorlog/options.h"
+
+namespace quor::cli {
+namespace {
+
+struct DeleteOptions {
+    std::string db = paths::kWorkingDb;
+    store::FilterOptions filters;
+    bool all = false;
+    bool yes = false;
+};
+
+void setup(CLI::App& command, DeleteOptions& options) {
+    AddDatabaseOption(command, options.db);
+    AddFilterOptions(command, options.filters);
+    command.add_flag("--all", options.all, "Delete every row: needed when there is no filter");
+    AddYesOption(command, options.yes);
+}
+
+// A deletion has to say what it means: an empty filter is a slip more often than a wish.
+store::Filter filterOf(const DeleteOptions& options) {
+    store::Filter filter = BuildFilter(options.filters, "logs", time(nullptr));
+    const bool filtered = !filter.conditions.empty();
+    if (!filter.literal.empty()) {
+        throw Failure("--keyword: rows cannot be deleted by a text with * or ?, or one that is not UTF-8; give --glob, "
+                      "where * and ? match any text");
+    }
+    if (filtered == options.all) {
+        throw Failure(filtered ? "--all deletes every row; leave out the filters or --all"
+                               : "no filter was given; give one, or --all to delete every row");
+    }
+    return filter;
+}
+
+int run(const DeleteOptions& options) {
+    store::Selection selection;
+    selection.filter = filterOf(options);
+    const auto source = store::OpenSource(options.db);
+    const std::string count = std::to_string(Count(*source, selection));
+    if (count == "0") {
+        return ReportNothing("no row matches");
+    }
+    if (!options.yes && !Confirm("Delete " + count + " rows from " + source->name() + "?")) {
+        Complain("nothing deleted");
+        return kNothing;
+    }
+    source->remove(selection.filter.conditions);
+    WriteLine("deleted " + count + " rows");
+    return kDone;
+}
+
+}  // namespace
+
+void AddDelete(CLI::App& app, int& status) {
+    AddCommand<DeleteOptions>(app, "delete", "Delete rows of table logs", status, setup, run);
+}
+
+}  // namespace quor::cli

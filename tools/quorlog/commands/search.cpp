@@ -1,0 +1,137 @@
+// search.
+#include <poll.h>
+#include <sys/signalfd.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <csignal>
+#include <ctime>
+
+#include "base/guards.h"
+#include "base/paths.h"
+#include "store/follower.h"
+#include "store/selection.h"
+#include "store/whynothing.h"
+#include "tools/quorlog/commands/commands.h"
+#include "tools/quorlog/messages.h"
+#include "tools/quorlog/options.h"
+#include "tools/quorlog/records.h"
+
+namespace quor::cli {
+namespace {
+
+constexpr uint64_t kTableRows = 50;   // what a person gets without a limit
+constexpr uint64_t kFollowRows = 10;  // the rows before the new ones
+
+struct SearchOptions {
+    std::string db = paths::kWorkingDb;
+    std::string table = "logs";
+    store::FilterOptions filters;
+    OutputOptions output;
+    uint64_t limit = 0;
+    uint64_t offset = 0;
+    uint64_t before = 0;
+    bool limited = false;
+    bool oldest = false;
+    bool follow = false;
+    uint64_t interval = 1;
+};
+
+void setup(CLI::App& command, SearchOptions& options) {
+    AddDatabaseOption(command, options.db);
+    AddTableOption(command, options.table);
+    AddFilterOptions(command, options.filters);
+    AddOutputOptions(command, options.output);
+    AddNumberOption(command, "--limit", options.limit, "Rows wanted, 0 for all; a table shows 50 by default")
+        ->each([&options](const std::string&) { options.limited = true; });
+    CLI::Option* offset = AddNumberOption(command, "--offset", options.offset, "Rows skipped");
+    CLI::Option* before = AddNumberOption(command, "--before", options.before,
+                                          "Only rows with an id below this: the last id of a page gives the next page");
+    CLI::Option* oldest = command.add_flag("--oldest", options.oldest, "Oldest rows first, instead of newest");
+    CLI::Option* following = command.add_flag("--follow", options.follow, "Print new rows as they arrive, until ^C");
+    following->excludes(offset)->excludes(oldest)->excludes(before);
+    AddNumberOption(command, "--interval", options.interval, "Seconds between two looks for new rows")
+        ->needs(following);
+}
+
+store::Selection selectionOf(const SearchOptions& options) {
+    store::Selection selection;
+    selection.filter = BuildFilter(options.filters, options.table, time(nullptr));
+    selection.table = options.table;
+    selection.offset = options.offset;
+    selection.oldestFirst = options.oldest;
+    selection.limit = options.limit;
+    if (options.before != 0) {
+        selection.filter.conditions.push_back(store::IdCondition(SYSLOG_OP_BELOW, options.before));
+    }
+    return selection;
+}
+
+// Waits for the next look at the database; ends on SIGINT and SIGTERM, and when the reader of the output has gone.
+class Ticker {
+  public:
+    explicit Ticker(uint64_t seconds) : milliseconds_(static_cast<int>(std::min(seconds, kMaxSeconds) * 1000)) {
+        sigset_t ending;
+        sigemptyset(&ending);
+        sigaddset(&ending, SIGINT);
+        sigaddset(&ending, SIGTERM);
+        sigprocmask(SIG_BLOCK, &ending, nullptr);
+        signals_ = Descriptor(signalfd(-1, &ending, SFD_CLOEXEC));
+    }
+
+    // False when it is over.
+    bool wait() const {
+        pollfd watched[] = {{signals_.get(), POLLIN, 0}, {STDOUT_FILENO, 0, 0}};
+        if (poll(watched, 2, milliseconds_) > 0 && (watched[1].revents & POLLERR) != 0) {
+            throw Failure("cannot write the output: its reader has gone");
+        }
+        return watched[0].revents == 0;
+    }
+
+  private:
+    static constexpr uint64_t kMaxSeconds = 86400;
+
+    int milliseconds_;
+    Descriptor signals_;
+};
+
+int follow(const SearchOptions& options, const store::Source& source, const store::Selection& selection) {
+    Output out(STDOUT_FILENO);
+    RecordSink sink(options.output.style(), selection.table, out);
+    const auto print = [&](const auto& record) { sink.add(record); };
+    const Ticker ticker(options.interval);
+    store::Follower follower(source, selection);
+    follower.last(options.limited ? options.limit : kFollowRows, print);
+    sink.flush();
+    while (ticker.wait()) {
+        follower.poll(print);
+        sink.flush();
+    }
+    sink.finish();
+    return kDone;
+}
+
+int run(const SearchOptions& options) {
+    store::Selection selection = selectionOf(options);
+    const auto source = store::OpenSource(options.db);
+    if (options.follow) {
+        return follow(options, *source, selection);
+    }
+    const Style style = options.output.style();
+    if (!options.limited && style.format == Format::Table) {
+        selection.limit = kTableRows;
+    }
+    Output out(STDOUT_FILENO);
+    RecordSink sink(style, selection.table, out);
+    const uint64_t rows = Select(*source, selection, [&](const auto& record) { sink.add(record); });
+    sink.finish();
+    return rows == 0 ? ReportNothing(WhyNothing(*source, selection, options.filters, options.before)) : kDone;
+}
+
+}  // namespace
+
+void AddSearch(CLI::App& app, int& status) {
+    AddCommand<SearchOptions>(app, "search", "Print log rows, newest first", status, setup, run);
+}
+
+}  // namespace quor::cli

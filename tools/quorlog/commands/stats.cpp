@@ -1,0 +1,187 @@
+// stats total, device, top, eps: what the accounting database knows.
+#include <algorithm>
+#include <ctime>
+
+#include "base/paths.h"
+#include "store/ask.h"
+#include "store/databasefile.h"
+#include "store/dates.h"
+#include "tools/quorlog/commands/commands.h"
+#include "tools/quorlog/messages.h"
+#include "tools/quorlog/options.h"
+
+namespace quor::cli {
+namespace {
+
+constexpr size_t kBarWidth = 40;
+
+struct StatsOptions {
+    std::string db = paths::kAccountingDb;
+    OutputOptions output;
+    std::string device;
+    uint64_t limit = 10;
+    std::string last = "10m";
+    std::string from;
+    std::string to;
+};
+
+void setup(CLI::App& command, StatsOptions& options) {
+    AddDatabaseOption(command, options.db);
+    AddOutputOptions(command, options.output);
+}
+
+void setupDevice(CLI::App& command, StatsOptions& options) {
+    command.add_option("device", options.device, "Name of the device, as host")->type_name("NAME")->required();
+    setup(command, options);
+}
+
+void setupTop(CLI::App& command, StatsOptions& options) {
+    setup(command, options);
+    AddNumberOption(command, "--limit", options.limit, "Devices wanted, 0 for all; 10 by default");
+}
+
+void setupEps(CLI::App& command, StatsOptions& options) {
+    setup(command, options);
+    CLI::Option* last = command.add_option("--last", options.last, "The time before now: 90s, 10m, 6h, 2d");
+    last->type_name("SPAN")->capture_default_str();
+    command.add_option("--from", options.from, "First day, instead: YYYY-MM-DD, today, yesterday, 7d")
+        ->type_name("DATE")
+        ->excludes(last);
+    command.add_option("--to", options.to, "Last day")->type_name("DATE")->excludes(last);
+}
+
+// The readers of the library give 0 and nothing for a database that they cannot read.
+std::string requireStatistics(const std::string& path, const char* table) {
+    std::string db = store::RequireDatabase(path, "start quorlogd, which writes it, or give another --db");
+    store::RequireTable(db, table);
+    return db;
+}
+
+int writeCount(const StatsOptions& options, const std::string& device, uint64_t count) {
+    Output out(STDOUT_FILENO);
+    std::vector<Value> values = {{"count", std::to_string(count), Kind::Number}};
+    if (!device.empty()) {
+        values.insert(values.begin(), {"device", device});
+    }
+    WriteRecord(options.output.style(), values, out);
+    return count == 0 ? ReportNothing("no log was counted") : kDone;
+}
+
+int runTotal(const StatsOptions& options) {
+    std::string db = requireStatistics(options.db, "histogram");
+    return writeCount(options, "", SyslogDBHistTotalGet(db));
+}
+
+// The library puts the name between single quotes as it stands.
+std::string quoted(const std::string& name) {
+    std::string out;
+    for (const char c : name) {
+        out.append(c == '\'' ? 2 : 1, c);
+    }
+    return out;
+}
+
+int runDevice(const StatsOptions& options) {
+    std::string db = requireStatistics(options.db, "histogram");
+    return writeCount(options, options.device, SyslogDBHistGetSingle(db, quoted(options.device)));
+}
+
+int runTop(const StatsOptions& options) {
+    std::string db = requireStatistics(options.db, "histogram");
+    const auto counts = SyslogDBHistGet(db, static_cast<int>(std::min<uint64_t>(options.limit, INT32_MAX)));
+    std::vector<std::pair<std::string, unsigned long long>> sorted(counts.begin(), counts.end());
+    std::stable_sort(sorted.begin(), sorted.end(), [](const auto& a, const auto& b) { return a.second > b.second; });
+    Output out(STDOUT_FILENO);
+    const auto sink = MakeSink(options.output.style(), {{"count", Kind::Number}, {"device"}}, out);
+    for (const auto& [device, count] : sorted) {
+        sink->row({std::to_string(count), device});
+    }
+    sink->finish();
+    return sorted.empty() ? ReportNothing("no log was counted") : kDone;
+}
+
+struct Span {
+    int64_t first;
+    int64_t last;
+};
+
+Span spanOf(const StatsOptions& options) {
+    const time_t now = time(nullptr);
+    const std::string from = store::ParseDate(options.from, "--from", now);
+    const std::string to = store::ParseDate(options.to, "--to", now);
+    if (from.empty() && to.empty()) {
+        return {now - static_cast<int64_t>(store::ParseSpan(options.last, "--last")), now};
+    }
+    if (!from.empty() && !to.empty() && from > to) {
+        throw Failure("--from " + from + " is after --to " + to + "; swap them");
+    }
+    return {from.empty() ? 0 : store::DayBegin(from), to.empty() ? now : store::DayBegin(to, 1) - 1};
+}
+
+int bounded(int64_t seconds) {
+    return static_cast<int>(std::clamp<int64_t>(seconds, 0, INT32_MAX));
+}
+
+std::string decimal(double value) {
+    char text[32];
+    return {text, static_cast<size_t>(snprintf(text, sizeof text, "%.2f", value))};
+}
+
+// A sample holds what was counted since the one before it closed, so its rate needs that distance; the first sample
+// shown may have an unknown one.
+void writeSamples(const std::map<int32_t, SYSLOG_LOG_EPS>& samples, const Style& style, Output& out) {
+    unsigned long long largest = 1;
+    for (const auto& [stamp, sample] : samples) {
+        largest = std::max(largest, sample.eps);
+    }
+    const bool table = style.format == Format::Table;
+    const bool drawn = table && style.terminal;
+    Columns columns = {{"stamp", table ? Kind::Text : Kind::Number},
+                       {"logs", Kind::Number},
+                       {"seconds", Kind::Number},
+                       {"per_second", Kind::Number}};
+    if (drawn) {
+        columns.push_back({"samples"});
+    }
+    const auto sink = MakeSink(style, columns, out);
+    const int32_t* previous = nullptr;
+    for (const auto& [stamp, sample] : samples) {
+        const int64_t seconds = previous == nullptr ? 0 : int64_t{stamp} - *previous;
+        previous = &stamp;
+        const std::string bar(static_cast<size_t>(sample.eps * kBarWidth / largest), '#');
+        const std::string texts[] = {
+            table ? store::LocalTime(stamp) : std::to_string(stamp), std::to_string(sample.eps),
+            seconds == 0 ? "" : std::to_string(seconds),
+            seconds == 0 ? "" : decimal(static_cast<double>(sample.eps) / static_cast<double>(seconds))};
+        Cells cells(std::begin(texts), std::end(texts));
+        if (drawn) {
+            cells.emplace_back(bar);
+        }
+        sink->row(cells);
+    }
+    sink->finish();
+}
+
+int runEps(const StatsOptions& options) {
+    std::string db = requireStatistics(options.db, "eps");
+    const Span span = spanOf(options);
+    const auto samples = SyslogDBEpsGet(db, bounded(span.first), bounded(span.last));
+    Output out(STDOUT_FILENO);
+    writeSamples(samples, options.output.style(), out);
+    return samples.empty()
+               ? ReportNothing("no sample from " + store::LocalTime(span.first) + " to " + store::LocalTime(span.last))
+               : kDone;
+}
+
+}  // namespace
+
+void AddStats(CLI::App& app, int& status) {
+    CLI::App& stats = *app.add_subcommand("stats", "Counts of received logs");
+    stats.require_subcommand(1);
+    AddCommand<StatsOptions>(stats, "total", "Logs counted", status, setup, runTotal);
+    AddCommand<StatsOptions>(stats, "device", "Logs counted of one device", status, setupDevice, runDevice);
+    AddCommand<StatsOptions>(stats, "top", "Devices with the most logs", status, setupTop, runTop);
+    AddCommand<StatsOptions>(stats, "eps", "Samples of the log rate", status, setupEps, runEps);
+}
+
+}  // namespace quor::cli
