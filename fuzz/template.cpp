@@ -4,8 +4,11 @@
 #include <algorithm>
 #include <memory>
 
+#include "base/utf8.h"
+#include "common/handles.h"
 #include "fuzz/fuzz.h"
-#include "platform/notify/notify.h"
+#include "platform/notify/message.h"
+#include "platform/notify/render.h"
 
 using quor::fuzz::Require;
 
@@ -48,7 +51,7 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* bytes, size_t size) {
     if (!notice) {
         return 0;
     }
-    Require(isOneLine(notice->subject) && quor::notify::IsUtf8(notice->subject), "the subject is one line of UTF-8");
+    Require(isOneLine(notice->subject) && quor::IsUtf8(notice->subject), "the subject is one line of UTF-8");
     Require(isJson(quor::notify::NoticeAsJson(*notice)), "the JSON is valid");
     QUORMAIL mail{};
     snprintf(mail.recipient, sizeof mail.recipient, "a@example.org");

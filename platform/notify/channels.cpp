@@ -1,9 +1,14 @@
+#include "platform/notify/channels.h"
+
 #include <syslog.h>
 
 #include <cstring>
+#include <optional>
 
 #include "base/numbers.h"
-#include "platform/notify/notify.h"
+#include "base/words.h"
+#include "platform/notify/delivery.h"
+#include "platform/notify/oneline.h"
 
 namespace quor::notify {
 namespace {
@@ -49,11 +54,11 @@ uint32_t ConfiguredChannels(const Settings& settings) {
 
 uint32_t ChannelsNamed(std::string_view names) {
     uint32_t bits = 0;
-    for (const std::string& name : Words(names, ", \t")) {
+    EachWord(names, ", \t", [&bits](std::string_view name) {
         for (size_t i = 0; i < kChannelCount; ++i) {
             bits |= name == kChannels[i].name ? bitOf(i) : 0;
         }
-    }
+    });
     return bits;
 }
 

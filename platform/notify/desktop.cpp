@@ -7,7 +7,9 @@
 #include <cstring>
 
 #include "base/paths.h"
-#include "platform/notify/notify.h"
+#include "platform/notify/delivery.h"
+#include "platform/notify/message.h"
+#include "platform/notify/spool.h"
 
 namespace quor::notify {
 namespace {
@@ -27,7 +29,7 @@ std::string append(const std::string& path, const std::string& line) {
 
 // When the file has grown to its bound it becomes "desktop.jsonl.1", in place of the one before.
 std::string DeliverToDesktop(const Settings& /*settings*/, const Notice& notice) {
-    const Spool spool(kPatientlyMs);
+    const Spool spool(kWaitForever);
     const std::string path = std::string(paths::kNotifySpool) + kFile;
     struct stat found {};
     if (stat(path.c_str(), &found) == 0 && found.st_size >= kMostBytes) {

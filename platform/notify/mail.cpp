@@ -1,14 +1,12 @@
 #include <algorithm>
 #include <cstring>
 
-#include "platform/notify/notify.h"
+#include "platform/notify/delivery.h"
+#include "platform/notify/message.h"
 #include "platform/notify/transfer.h"
 
 namespace quor::notify {
 namespace {
-
-constexpr int kStartTls = 1;
-constexpr int kTls = 2;
 
 struct Upload {
     std::string_view rest;

@@ -1,10 +1,14 @@
+#include "platform/notify/message.h"
+
 #include <unistd.h>
 
 #include <algorithm>
 #include <array>
 #include <ctime>
 
-#include "platform/notify/notify.h"
+#include "base/json.h"
+#include "base/utf8.h"
+#include "base/words.h"
 
 namespace quor::notify {
 namespace {
@@ -22,17 +26,30 @@ bool isPlainSubject(const std::string& subject) {
     return subject.size() <= kPlainSubjectBytes && subject.find("=?") == std::string::npos;
 }
 
+std::string base64(std::string_view bytes) {
+    constexpr std::string_view kDigits = "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789+/";
+    std::string text;
+    for (; !bytes.empty(); bytes.remove_prefix(bytes.size() < 3 ? bytes.size() : 3)) {
+        uint32_t group = 0;
+        for (size_t i = 0; i < 3; ++i) {
+            group = group << 8U | (i < bytes.size() ? static_cast<uint8_t>(bytes[i]) : 0U);
+        }
+        for (size_t i = 0; i < 4; ++i) {
+            text += i <= bytes.size() ? kDigits[group >> (18U - 6U * i) & 63U] : '=';
+        }
+    }
+    return text;
+}
+
 // Encoded words, one a line; each holds whole characters.
 std::string encodedSubject(std::string_view subject) {
     std::string encoded;
     while (!subject.empty()) {
         size_t size = 0;
-        for (size_t next = Utf8Length(subject); next != 0 && size + next <= kEncodedWordBytes;
-             next = Utf8Length(subject.substr(size))) {
-            size += next;
+        while (size < subject.size() && size + NextSymbol(subject, size).length <= kEncodedWordBytes) {
+            size += NextSymbol(subject, size).length;
         }
-        size = size == 0 ? 1 : size;
-        encoded += (encoded.empty() ? "=?UTF-8?B?" : "\r\n =?UTF-8?B?") + Base64(subject.substr(0, size)) + "?=";
+        encoded += (encoded.empty() ? "=?UTF-8?B?" : "\r\n =?UTF-8?B?") + base64(subject.substr(0, size)) + "?=";
         subject.remove_prefix(size);
     }
     return encoded;
@@ -65,7 +82,7 @@ std::string messageId() {
 std::string base64Lines(std::string_view bytes) {
     std::string lines;
     for (; !bytes.empty(); bytes.remove_prefix(std::min(bytes.size(), kBase64LineBytes))) {
-        lines += Base64(bytes.substr(0, kBase64LineBytes)) + "\r\n";
+        lines += base64(bytes.substr(0, kBase64LineBytes)) + "\r\n";
     }
     return lines;
 }
@@ -78,17 +95,22 @@ std::string joined(const std::vector<std::string>& items, const char* separator)
     return text;
 }
 
-std::vector<std::string> addresses(const char* list) {
-    std::vector<std::string> found = Words(list, ",; \t");
-    const auto unusable = [](const std::string& address) {
-        for (const char c : address) {
-            if (c < 0x21 || c > 0x7E || c == '<' || c == '>' || c == '"') {
-                return true;
-            }
+bool isAddress(std::string_view text) {
+    for (const char c : text) {
+        if (c < 0x21 || c > 0x7E || c == '<' || c == '>' || c == '"') {
+            return false;
         }
-        return address.find('@') == std::string::npos;
-    };
-    found.erase(std::remove_if(found.begin(), found.end(), unusable), found.end());
+    }
+    return text.find('@') != std::string_view::npos;
+}
+
+std::vector<std::string> addresses(const char* list) {
+    std::vector<std::string> found;
+    EachWord(list, ",; \t", [&found](std::string_view word) {
+        if (isAddress(word)) {
+            found.emplace_back(word);
+        }
+    });
     return found;
 }
 
@@ -125,12 +147,12 @@ std::string NoticeAsMail(const QUORMAIL& mail, const Notice& notice) {
 }
 
 std::string NoticeAsJson(const Notice& notice) {
-    std::string json = "{\"tag\":" + JsonText(notice.tag) + ",\"class\":" + JsonText(notice.className) +
-                       ",\"time\":" + std::to_string(notice.time) + ",\"host\":" + JsonText(notice.host) +
-                       ",\"subject\":" + JsonText(notice.subject) + ",\"body\":" + JsonText(notice.body) +
+    std::string json = "{\"tag\":" + JsonString(notice.tag) + ",\"class\":" + JsonString(notice.className) +
+                       ",\"time\":" + std::to_string(notice.time) + ",\"host\":" + JsonString(notice.host) +
+                       ",\"subject\":" + JsonString(notice.subject) + ",\"body\":" + JsonString(notice.body) +
                        ",\"suppressed\":" + std::to_string(notice.heldBack);
     if (!IsUtf8(notice.body)) {
-        json += ",\"bodyBase64\":" + JsonText(Base64(notice.body));
+        json += ",\"bodyBase64\":\"" + base64(notice.body) + "\"";
     }
     return json + "}";
 }

@@ -1,4 +1,4 @@
-#include "platform/notify/notify.h"
+#include "platform/notify/delivery.h"
 
 namespace quor::notify {
 

@@ -1,27 +1,32 @@
-#include "platform/notify/notify.h"
-
+// The notification service as its callers see it.
 #include <ctime>
+#include <optional>
 
 #include "base/guarded.h"
-#include "base/numbers.h"
+#include "platform/notify/channels.h"
+#include "platform/notify/filter.h"
+#include "platform/notify/interval.h"
+#include "platform/notify/render.h"
+#include "platform/notify/spool.h"
+#include "platform/notify/worker.h"
 
 namespace quor::notify {
 namespace {
 
-constexpr int kPatienceMs = 500;  // others hold the spool for far less than one, unless the system stops them
+constexpr int kCallerWaitsMs = 500;  // others hold the spool for far less than one, unless the system stops them
 
-enum class Outcome { failed, nothingToDo, deliver };
+enum class Outcome { Failed, NothingToDo, Deliver };
 
 Outcome queue(const Spool& spool, Notice& notice, int32_t seconds) {
     Interval interval(spool.ledger(), notice);
     if (!interval.due(seconds, notice.time)) {
-        return interval.countHeldBack() ? Outcome::nothingToDo : Outcome::failed;
+        return interval.countHeldBack() ? Outcome::NothingToDo : Outcome::Failed;
     }
     if (spool.full()) {
-        return interval.countHeldBack() ? Outcome::deliver : Outcome::failed;
+        return interval.countHeldBack() ? Outcome::Deliver : Outcome::Failed;
     }
     notice.heldBack = interval.heldBack();
-    return spool.put(notice) && interval.countSent(seconds, notice.time) ? Outcome::deliver : Outcome::failed;
+    return spool.put(notice) && interval.countSent(seconds, notice.time) ? Outcome::Deliver : Outcome::Failed;
 }
 
 int send(const std::string& tag, const char* textsDir, const char* filterFile, QLIBSZHASH* values) {
@@ -38,10 +43,10 @@ int send(const std::string& tag, const char* textsDir, const char* filterFile, Q
     notice->time = time(nullptr);
     Descriptor slot;
     {
-        const Spool spool(kPatienceMs);
-        const Outcome outcome = spool ? queue(spool, *notice, rule.interval) : Outcome::failed;
-        if (outcome != Outcome::deliver) {
-            return outcome == Outcome::failed ? -1 : 0;
+        const Spool spool(kCallerWaitsMs);
+        const Outcome outcome = spool ? queue(spool, *notice, rule.interval) : Outcome::Failed;
+        if (outcome != Outcome::Deliver) {
+            return outcome == Outcome::Failed ? -1 : 0;
         }
         slot = spool.freeSlot();
     }

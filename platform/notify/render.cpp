@@ -1,6 +1,10 @@
-#include <cstring>
+#include "platform/notify/render.h"
 
-#include "platform/notify/notify.h"
+#include <cstring>
+#include <string_view>
+
+#include "base/guards.h"
+#include "platform/notify/oneline.h"
 
 namespace quor::notify {
 namespace {

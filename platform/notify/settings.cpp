@@ -1,18 +1,20 @@
+#include "platform/notify/settings.h"
+
 #include <algorithm>
 #include <array>
 #include <cstring>
+#include <memory>
 
 #include "base/guarded.h"
 #include "base/numbers.h"
 #include "base/paths.h"
+#include "base/words.h"
 #include "platform/core/sections.h"
 #include "platform/core/textfile.h"
-#include "platform/notify/notify.h"
 
 namespace quor::notify {
 namespace {
 
-enum Security { kNone, kStartTls, kTls, kSecurities };
 constexpr std::array<const char*, kSecurities> kSecurityNames{"none", "starttls", "tls"};
 constexpr std::array<int, kSecurities> kDefaultPorts{25, 587, 465};
 constexpr size_t kMostBytes = size_t{1} << 20U;
@@ -85,7 +87,8 @@ Settings readSettings(const Keys& keys) {
     settings.mail = readMail(keys);
     settings.mailEnabled = keys.yes("smtp_mail_enabled");
     settings.desktopEnabled = keys.yes("desktop_notify_enabled");
-    settings.webhookUrls = Words(keys.text("webhook_url"), " \t");
+    EachWord(keys.text("webhook_url"), " \t",
+             [&settings](std::string_view url) { settings.webhookUrls.emplace_back(url); });
     settings.webhookCaFile = keys.text("webhook_ca_file");
     settings.webhookVerify = keys.yes("webhook_tls_verify", true);
     const int32_t timeout = ToInt32(keys.text("notify_timeout").c_str());

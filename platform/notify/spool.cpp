@@ -1,3 +1,5 @@
+#include "platform/notify/spool.h"
+
 #include <fcntl.h>
 #include <sys/file.h>
 #include <sys/stat.h>
@@ -7,10 +9,11 @@
 #include <array>
 #include <cstring>
 #include <filesystem>
+#include <string>
+#include <vector>
 
 #include "base/numbers.h"
 #include "base/paths.h"
-#include "platform/notify/notify.h"
 #include "quor/quorfs.h"
 
 namespace quor::notify {
@@ -104,12 +107,12 @@ std::string readNotice(const std::string& path) {
     return text;
 }
 
-bool lock(const Descriptor& file, int patienceMs) {
-    if (patienceMs == kPatientlyMs) {
+bool lock(const Descriptor& file, int waitMs) {
+    if (waitMs == kWaitForever) {
         return flock(file.get(), LOCK_EX) == 0;
     }
     while (flock(file.get(), LOCK_EX | LOCK_NB) != 0) {
-        if (patienceMs-- <= 0) {
+        if (waitMs-- <= 0) {
             return false;
         }
         (void)usleep(1000);
@@ -119,12 +122,12 @@ bool lock(const Descriptor& file, int patienceMs) {
 
 }  // namespace
 
-Spool::Spool(int patienceMs) {
+Spool::Spool(int waitMs) {
     if (QUORFSMkdirP(queueFolder().c_str(), 0, 0, -1, -1, 0700) < 0) {
         return;
     }
     Descriptor ledger = openOwn(below("ledger"), O_RDWR);
-    if (ledger && lock(ledger, patienceMs)) {
+    if (ledger && lock(ledger, waitMs)) {
         ledger_ = std::move(ledger);
     }
 }

@@ -1,4 +1,5 @@
-#include "platform/notify/notify.h"
+#include "platform/notify/delivery.h"
+#include "platform/notify/message.h"
 #include "platform/notify/transfer.h"
 
 namespace quor::notify {

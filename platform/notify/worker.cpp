@@ -1,3 +1,5 @@
+#include "platform/notify/worker.h"
+
 #include <fcntl.h>
 #include <sys/file.h>
 #include <sys/prctl.h>
@@ -8,8 +10,10 @@
 #include <unistd.h>
 
 #include <csignal>
+#include <optional>
 
-#include "platform/notify/notify.h"
+#include "platform/notify/channels.h"
+#include "platform/notify/spool.h"
 
 namespace quor::notify {
 namespace {
@@ -73,7 +77,7 @@ void deliverQueue() {
     for (;;) {
         std::optional<Notice> notice;
         {
-            const Spool spool(kPatientlyMs);
+            const Spool spool(kWaitForever);
             notice = spool ? spool.take() : std::nullopt;
             if (!notice) {
                 (void)flock(kSlotDescriptor, LOCK_UN);

@@ -13,7 +13,7 @@
 #include "logger.h"
 #include "logger/eventdb.h"
 #include "parser.h"
-#include "platform/notify/notify.h"
+#include "platform/notify/spool.h"
 #include "quor/quorfs.h"
 #include "quor/quorsalvage.h"
 #include "tests/support/clock.h"

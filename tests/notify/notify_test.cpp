@@ -44,7 +44,7 @@ TEST_F(Notices, ShowValuesAsTheyWereReceived) {
         {"%A%\n\n%A%\n", {{"%A%", "%HOST%"}, {"%HOST%", "h"}}, "%HOST%", "%HOST%\n"},
         {"S\n\n%SYSLOG_CONTENT%|%A%\n", {{"%SYSLOG_CONTENT%", R"(\"\\n\x)"}, {"%A%", R"(\")"}}, "S", "\"\\n\\x|\\\"\n"},
         {"%A%\n\n%A%\n", {{"%A%", "a\r\nBcc: x\x1b[31m\x7f"}}, "a  Bcc: x [31m ", "a\r\nBcc: x\x1b[31m\x7f\n"},
-        {"%A%\n\n%A%\n", {{"%A%", "\xE9z"}}, "\xEF\xBF\xBDz", "\xEF\xBF\xBDz\n"},
+        {"%A%\n\n%A%\n", {{"%A%", "\xE9z"}}, "\xEF\xBF\xBDz", "\\xe9z\n"},
     };
     Json::Value notice;
     for (const auto& [text, values, subject, body] : cases) {
