@@ -12,8 +12,8 @@
 
 #include "base/guarded.h"
 #include "platform/salvage/pages.h"
-#include "platform/salvage/rows.h"
-#include "platform/salvage/target.h"
+#include "platform/salvage/rowsaver.h"
+#include "platform/salvage/sql.h"
 #include "quor/quorsalvage.h"
 
 namespace quor::salvage {
@@ -77,15 +77,15 @@ bool syncFile(const std::string& path) {
     return file && fsync(file.get()) == 0;
 }
 
-int write(const PageFile& file, Salvage& salvage, const std::string& path, QUORSALVAGE& report) {
+int write(const PageFile& file, RowSaver& rows, const std::string& path, QUORSALVAGE& report) {
     const Database db = openDatabase(path);
     if (db == nullptr) {
         return fail(report, "cannot open %s; look at the rights of its folder", path.c_str());
     }
-    if (begin(db.get(), file) && salvage.fill(db.get()) && run(db.get(), "COMMIT; PRAGMA journal_mode=WAL")) {
+    if (begin(db.get(), file) && rows.fill(db.get()) && run(db.get(), "COMMIT; PRAGMA journal_mode=WAL")) {
         return 0;
     }
-    return salvage.gaveUp()
+    return rows.gaveUp()
                ? fail(report, "given up; nothing was kept")
                : fail(report, "cannot write %s: %s; look at the space left", path.c_str(), sqlite3_errmsg(db.get()));
 }
@@ -104,14 +104,14 @@ int salvageFile(const char* damaged, const char* fresh, const char* const* schem
                     strerror(errno));
     }
     NewFile partial(std::string(fresh) + ".partial", mode | 0600U);
-    Salvage salvage(file, progress, context, report);
+    RowSaver rows(file, progress, context, report);
     if (!partial.created()) {
         return fail(report, "cannot create %s; remove what is left of an earlier try", partial.path().c_str());
     }
-    if (!salvage.findSchema(schemas)) {
+    if (!rows.findSchema(schemas)) {
         return fail(report, "no rows of a known table are left in %s; restore it from a backup", damaged);
     }
-    if (write(file, salvage, partial.path(), report) != 0) {
+    if (write(file, rows, partial.path(), report) != 0) {
         return -1;
     }
     if (!syncFile(partial.path()) || rename(partial.path().c_str(), fresh) != 0) {

@@ -1,22 +1,24 @@
 // Finding the rows of a damaged database: its tables' trees first, then, where they are broken, every page on its own.
-#ifndef PLATFORM_SALVAGE_ROWS_H
-#define PLATFORM_SALVAGE_ROWS_H
+#ifndef PLATFORM_SALVAGE_ROWSAVER_H
+#define PLATFORM_SALVAGE_ROWSAVER_H
 
 #include <cstddef>
 #include <cstdint>
 #include <functional>
 #include <vector>
 
-#include "platform/salvage/cells.h"
 #include "platform/salvage/pages.h"
-#include "platform/salvage/target.h"
+#include "platform/salvage/records.h"
+#include "platform/salvage/schema.h"
+#include "platform/salvage/table.h"
+#include "platform/salvage/tree.h"
 #include "quor/quorsalvage.h"
 
 namespace quor::salvage {
 
-class Salvage {
+class RowSaver {
   public:
-    Salvage(const PageFile& file, QUORSALVAGEPROGRESS progress, void* context, QUORSALVAGE& report);
+    RowSaver(const PageFile& file, QUORSALVAGEPROGRESS progress, void* context, QUORSALVAGE& report);
 
     // Finds the definitions; false when neither the file nor a schema gives tables for its rows.
     bool findSchema(const char* const* schemas);
@@ -30,13 +32,15 @@ class Salvage {
 
     bool walk(uint32_t root, const Taker& take);
     bool visit(uint32_t number, std::vector<uint32_t>& next, const Taker& take);
+    bool readUnused(uint32_t number, Bytes& page) const;
     bool readLeaf(const Bytes& page, const TreePage& leaf, const Taker& take);
     bool readSchema();
+    bool dropUnusable();
     size_t sample(const Schema& schema);
     bool saveTree(const Definition& definition);
     bool saveStrays();
     bool saveStray(const Row& row);
-    bool save(TargetTable& table, const Row& row, bool& added);
+    bool save(Table& table, const Row& row, bool& added);
     void markFree();
     bool tick();
     bool tell(uint64_t done);
@@ -48,7 +52,7 @@ class Salvage {
     std::vector<bool> used_;  // pages that were taken for something
     RecordReader reader_;
     Schema schema_;
-    std::vector<TargetTable> tables_;
+    std::vector<Table> tables_;
     uint64_t done_ = 0;
     bool gaveUp_ = false;
 };

@@ -1,10 +1,13 @@
-#include "platform/salvage/rows.h"
+#include "platform/salvage/rowsaver.h"
 
 #include <algorithm>
 #include <cstdio>
 #include <iterator>
 #include <string>
 #include <utility>
+
+#include "platform/salvage/cells.h"
+#include "platform/salvage/sql.h"
 
 namespace quor::salvage {
 namespace {
@@ -24,23 +27,23 @@ bool isOfSqlite(const Definition& definition) {
 
 }  // namespace
 
-Salvage::Salvage(const PageFile& file, QUORSALVAGEPROGRESS progress, void* context, QUORSALVAGE& report)
+RowSaver::RowSaver(const PageFile& file, QUORSALVAGEPROGRESS progress, void* context, QUORSALVAGE& report)
     : file_(file), progress_(progress), context_(context), report_(report), used_(size_t{file.count()} + 1),
       reader_(file, used_) {
     report_.pages = file.count();
 }
 
-bool Salvage::tick() {
+bool RowSaver::tick() {
     return ++done_ % kPagesPerReport != 0 || tell(std::min<uint64_t>(done_, report_.pages));
 }
 
-bool Salvage::tell(uint64_t done) {
+bool RowSaver::tell(uint64_t done) {
     gaveUp_ = progress_ != nullptr && progress_(done, report_.pages, context_) != 0;
     return !gaveUp_;
 }
 
 // Every page below a root, in the order of the rows.
-bool Salvage::walk(uint32_t root, const Taker& take) {
+bool RowSaver::walk(uint32_t root, const Taker& take) {
     std::vector<uint32_t> next = {root};
     while (!next.empty()) {
         const uint32_t number = next.back();
@@ -52,9 +55,13 @@ bool Salvage::walk(uint32_t root, const Taker& take) {
     return true;
 }
 
-bool Salvage::visit(uint32_t number, std::vector<uint32_t>& next, const Taker& take) {
+bool RowSaver::readUnused(uint32_t number, Bytes& page) const {
+    return number <= file_.count() && !used_[number] && file_.read(number, page);
+}
+
+bool RowSaver::visit(uint32_t number, std::vector<uint32_t>& next, const Taker& take) {
     Bytes page;
-    if (number == 0 || number > file_.count() || used_[number] || !file_.read(number, page)) {
+    if (!readUnused(number, page)) {
         ++report_.badPages;
         return true;
     }
@@ -73,7 +80,7 @@ bool Salvage::visit(uint32_t number, std::vector<uint32_t>& next, const Taker& t
 }
 
 // A page that is no leaf has no rows.
-bool Salvage::readLeaf(const Bytes& page, const TreePage& leaf, const Taker& take) {
+bool RowSaver::readLeaf(const Bytes& page, const TreePage& leaf, const Taker& take) {
     Row row;
     for (uint32_t i = 0; leaf.isLeaf() && i < leaf.cells(); ++i) {
         if (!reader_.read(page, leaf.cell(i), row)) {
@@ -86,7 +93,7 @@ bool Salvage::readLeaf(const Bytes& page, const TreePage& leaf, const Taker& tak
 }
 
 // The definitions that stand in the file itself: type, name, table, root page, SQL. One that is damaged keeps its root.
-bool Salvage::readSchema() {
+bool RowSaver::readSchema() {
     if (file_.encoding() != 1) {
         return false;
     }
@@ -94,37 +101,44 @@ bool Salvage::readSchema() {
         const auto text = [&row](size_t i) {
             return std::string(reinterpret_cast<const char*>(row.values[i].bytes), row.values[i].size);
         };
-        if (row.values.size() == 5 && row.values[4].kind == Value::Kind::kText) {
+        if (row.values.size() == 5 && row.values[4].kind == Value::Kind::Text) {
             schema_.push_back({text(0), text(1), static_cast<uint32_t>(row.values[3].integer), text(4)});
         }
         return true;
     });
-    bool found = false;
+    return dropUnusable();
+}
+
+// False when no table is left.
+bool RowSaver::dropUnusable() {
+    bool usable = false;
     const Database scratch = OpenScratch();
     for (Definition& definition : schema_) {
         const bool table = definition.type == "table" && !isOfSqlite(definition);
         if (table && CanUse(scratch.get(), definition)) {
-            found = true;
+            usable = true;
         } else if (table) {
             definition.sql.clear();
         }
     }
-    return found;
+    return usable;
 }
 
 // How many rows of some pages fit a table of the schema.
-size_t Salvage::sample(const Schema& schema) {
+size_t RowSaver::sample(const Schema& schema) {
     const Database db = OpenScratch();
-    std::vector<TargetTable> tables;
+    std::vector<Table> tables;
     (void)CreateTables(db.get(), schema, tables);  // a table that cannot be created fits nothing
     size_t fitting = 0;
+    const Taker count = [&tables, &fitting](const Row& row) {
+        const auto fits = [&row](const Table& table) { return table.fits(row); };
+        fitting += std::any_of(tables.begin(), tables.end(), fits) ? 1 : 0;
+        return true;
+    };
     Bytes page;
     for (uint32_t number = 2; number <= file_.count(); number += 1 + file_.count() / kSampledPages) {
         if (file_.read(number, page)) {
-            readLeaf(page, TreePage(page, number, file_.usable()), [&tables, &fitting](const Row& row) {
-                fitting += std::any_of(tables.begin(), tables.end(), [&row](auto& table) { return table.fits(row); });
-                return true;
-            });
+            readLeaf(page, TreePage(page, number, file_.usable()), count);
         }
     }
     used_.assign(used_.size(), false);
@@ -132,7 +146,7 @@ size_t Salvage::sample(const Schema& schema) {
     return fitting;
 }
 
-bool Salvage::findSchema(const char* const* schemas) {
+bool RowSaver::findSchema(const char* const* schemas) {
     report_.schemaRead = readSchema() ? 1 : 0;
     if (report_.schemaRead != 0) {
         return true;
@@ -154,7 +168,7 @@ bool Salvage::findSchema(const char* const* schemas) {
     return best > 0;
 }
 
-bool Salvage::save(TargetTable& table, const Row& row, bool& added) {
+bool RowSaver::save(Table& table, const Row& row, bool& added) {
     if (row.values.size() > table.columns()) {
         ++report_.badRows;
         return true;
@@ -166,12 +180,12 @@ bool Salvage::save(TargetTable& table, const Row& row, bool& added) {
 
 // SQLite's own tables are walked too, so that their pages are accounted for. The rows of one that could not be created
 // may fit another.
-bool Salvage::saveTree(const Definition& definition) {
+bool RowSaver::saveTree(const Definition& definition) {
     if (definition.type != "table" || definition.root == 0) {
         return true;
     }
     const auto table = std::find_if(tables_.begin(), tables_.end(),
-                                    [&definition](auto& each) { return each.name() == definition.name; });
+                                    [&definition](const Table& each) { return each.name() == definition.name; });
     return walk(definition.root, [&](const Row& row) {
         bool added = false;
         return table != tables_.end() ? save(*table, row, added) : isOfSqlite(definition) || saveStray(row);
@@ -179,7 +193,7 @@ bool Salvage::saveTree(const Definition& definition) {
 }
 
 // Pages on the free list hold deleted rows. A trunk page that makes no sense ends the list.
-void Salvage::markFree() {
+void RowSaver::markFree() {
     Bytes trunk;
     for (uint32_t number = file_.firstFree(); number != 0 && number <= file_.count() && !used_[number];) {
         const uint32_t leaves = file_.read(number, trunk) ? Big32(trunk.data() + 4) : UINT32_MAX;
@@ -197,8 +211,9 @@ void Salvage::markFree() {
     }
 }
 
-bool Salvage::saveStray(const Row& row) {
-    const auto table = std::find_if(tables_.begin(), tables_.end(), [&row](auto& each) { return each.fits(row); });
+bool RowSaver::saveStray(const Row& row) {
+    const auto table =
+        std::find_if(tables_.begin(), tables_.end(), [&row](const Table& each) { return each.fits(row); });
     if (table == tables_.end()) {
         ++report_.unknownRows;
         return true;
@@ -210,26 +225,25 @@ bool Salvage::saveStray(const Row& row) {
 }
 
 // Whole trees hold every row there is, so strays matter only where one is broken.
-bool Salvage::saveStrays() {
+bool RowSaver::saveStrays() {
     if (report_.badPages == 0) {
         return true;
     }
     markFree();
     Bytes page;
+    const Taker save = [this](const Row& row) { return saveStray(row); };
     for (uint32_t number = 2; number <= file_.count(); ++number) {
         if (!tick()) {
             return false;
         }
-        if (!used_[number] && file_.read(number, page) &&
-            !readLeaf(page, TreePage(page, number, file_.usable()),
-                      [this](const Row& row) { return saveStray(row); })) {
+        if (readUnused(number, page) && !readLeaf(page, TreePage(page, number, file_.usable()), save)) {
             return false;
         }
     }
     return true;
 }
 
-bool Salvage::fill(sqlite3* db) {
+bool RowSaver::fill(sqlite3* db) {
     if (!CreateTables(db, schema_, tables_)) {
         return false;
     }
@@ -237,7 +251,7 @@ bool Salvage::fill(sqlite3* db) {
     if (!std::all_of(schema_.begin(), schema_.end(), saved) || !saveStrays()) {
         return false;
     }
-    for (const TargetTable& table : tables_) {
+    for (const Table& table : tables_) {
         if (report_.tableCount < static_cast<int>(std::size(report_.tables))) {
             QUORSALVAGETABLE& entry = report_.tables[report_.tableCount++];
             (void)snprintf(entry.name, sizeof entry.name, "%s", table.name().c_str());

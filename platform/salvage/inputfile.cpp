@@ -1,0 +1,33 @@
+#include "platform/salvage/inputfile.h"
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <cerrno>
+
+namespace quor::salvage {
+
+bool InputFile::open(const std::string& path) {
+    file_ = Descriptor(::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));  // a pipe does not hang it
+    struct stat status {};
+    if (!file_ || fstat(file_.get(), &status) != 0 || !S_ISREG(status.st_mode)) {
+        return false;
+    }
+    size_ = static_cast<uint64_t>(status.st_size);
+    return true;
+}
+
+size_t InputFile::read(uint64_t offset, uint8_t* out, size_t size) const {
+    size_t done = 0;
+    while (done < size) {
+        const ssize_t got = pread(file_.get(), out + done, size - done, static_cast<off_t>(offset + done));
+        if (got == 0 || (got < 0 && errno != EINTR)) {
+            break;
+        }
+        done += got > 0 ? static_cast<size_t>(got) : 0;
+    }
+    return done;
+}
+
+}  // namespace quor::salvage
