@@ -1,6 +1,7 @@
 #include <sys/stat.h>
 #include <sys/wait.h>
 
+#include <algorithm>
 #include <csignal>
 #include <map>
 
@@ -11,6 +12,17 @@
 #include "tests/support/testing.h"
 
 using namespace quor::test;
+
+constexpr char kLine[] = "%s=\"%s\"\n";
+
+// No process is signalled: the only one that there is no longer is kGone.
+constexpr pid_t kGone = 4712;
+pid_t hungUp = 0;
+
+extern "C" __attribute__((visibility("default"))) int kill(pid_t process, int number) noexcept {
+    hungUp = number == SIGHUP && process != kGone ? process : 0;
+    return process != kGone ? 0 : -1;
+}
 
 namespace {
 
@@ -24,6 +36,48 @@ TEST(StringTable, GrowsAndReplaces) {
     EXPECT_EQ(QLIBCSzHashGetValue(table.get(), "1000"), nullptr);
 }
 
+TEST(Core, NullIsAFailure) {
+    QLIBSZHASH* noTable = nullptr;
+    QLIBSZLIST* noList = nullptr;
+    const quor::StringTable table(QLIBCSzHashAlloc(1));
+    QLIBSZHASH* some = table.get();
+    char out[2] = "";
+    const int results[] = {
+        QLIBCSzHashSetValue(nullptr, "k", "v"),
+        QLIBCSzHashSetValue(&noTable, "k", "v"),
+        QLIBCSzHashSetValue(&some, nullptr, "v"),
+        QLIBCSzHashSetValue(&some, "k", nullptr),
+        QLIBCFileEnumSection(nullptr, &noList),
+        QLIBCFileEnumSection("/etc/passwd", nullptr),
+        QLIBCFileEnumSection("/etc/passwd", &noList),
+        QLIBCFileGetSection(nullptr, "s", &some),
+        QLIBCFileGetSection("/etc/passwd", nullptr, &some),
+        QLIBCFileGetSection("/etc/passwd", "s", nullptr),
+        QLIBCFileGetSection("/etc/passwd", "s", &noTable),
+        QLIBCFileSetSection(nullptr, "s", "s", some, kLine),
+        QLIBCFileSetSection("/nowhere/f", nullptr, "s", some, kLine),
+        QLIBCFileSetSection("/nowhere/f", "s", nullptr, some, kLine),
+        QLIBCFileSetSection("/nowhere/f", "s", "s", nullptr, kLine),
+        QLIBCFileSetSection("/nowhere/f", "s", "s", some, nullptr),
+        QLIBCFileGetKeyValue(nullptr, "k", out, 2, 0),
+        QLIBCFileGetKeyValue("/etc/passwd", nullptr, out, 2, 0),
+        QLIBCFileGetKeyValue("/etc/passwd", "k", nullptr, 2, 0),
+        QLIBCFileGetKeyValue("/etc/passwd", "k", out, 0, 0),
+        QLIBCExec(nullptr),
+        QLIBServiceReload(nullptr),
+        QUORFSMkdirP(nullptr, 0, 0, -1, -1, 0700),
+        QUORFSMkdirP("", 0, 0, -1, -1, 0700),
+    };
+    EXPECT_EQ(std::count(std::begin(results), std::end(results), -1), std::size(results));
+    EXPECT_EQ(QLIBCSzHashAlloc(0), nullptr);
+    EXPECT_EQ(QLIBCSzListAlloc(0), nullptr);
+    EXPECT_EQ(QLIBCSzHashGetValue(nullptr, "k"), nullptr);
+    EXPECT_EQ(QLIBCSzHashGetValue(some, nullptr), nullptr);
+    EXPECT_EQ(QLIBCFileExist(nullptr) + QLIBCFileExist("/nowhere/f") + QLIBCFileExist("/"), 1);
+    EXPECT_STREQ(quor::CText(QLIBCStrGet("%d%s", 7, "x")).get(), "7x");
+    QLIBCSzListFree(nullptr);
+}
+
 int shell(const std::string& command) {
     return QLIBCExec("/bin/sh", "-c", command.c_str(), nullptr, nullptr);
 }
@@ -32,6 +86,9 @@ TEST(Exec, TellsHowTheProgramEnded) {
     EXPECT_EQ(shell("exit 3"), 3);
     EXPECT_EQ(shell("kill -KILL $$"), 128 + SIGKILL);
     EXPECT_EQ(QLIBCExec("/usr/bin/test", "$(id) `x` 'y' *", "=", "$(id) `x` 'y' *", nullptr), 0) << "no shell";
+    (void)signal(SIGCHLD, SIG_IGN);
+    EXPECT_EQ(shell("exit 3"), 0) << "nobody is told";
+    (void)signal(SIGCHLD, SIG_DFL);
 }
 
 // Not under emulation, which runs the child of vfork on its own.
@@ -40,28 +97,35 @@ TEST(Exec, FailsWhenNothingCouldBeRun) {
     EXPECT_LT(QLIBCExec("/etc/passwd", nullptr), 0) << "not executable";
 }
 
-TEST(Exec, GivesNoDescriptorAndNoBlockedSignal) {
+TEST(Exec, GivesAProgramNoDescriptorAndNoSignalSetting) {
     const int inherited = dup2(STDERR_FILENO, 57);  // no close-on-exec
     EXPECT_EQ(shell("test /dev/null -ef /proc/self/fd/0 && test /dev/null -ef /proc/self/fd/1"), 0);
-    sigset_t term;
-    sigemptyset(&term);
-    sigaddset(&term, SIGTERM);
-    sigprocmask(SIG_BLOCK, &term, nullptr);
     EXPECT_NE(shell("test -e /proc/self/fd/57"), 0);
-    EXPECT_EQ(shell("kill -TERM $$; exit 0"), 128 + SIGTERM);
-    sigprocmask(SIG_UNBLOCK, &term, nullptr);
     close(inherited);
+    for (const int number : {SIGHUP, SIGINT, SIGPIPE, SIGTERM}) {
+        sigset_t blocked;
+        sigemptyset(&blocked);
+        sigaddset(&blocked, number);
+        sigprocmask(SIG_BLOCK, &blocked, nullptr);
+        const auto before = signal(number, SIG_IGN);
+        EXPECT_EQ(shell("kill -" + std::to_string(number) + " $$; exit 0"), 128 + number);
+        (void)signal(number, before);
+        sigprocmask(SIG_UNBLOCK, &blocked, nullptr);
+    }
+}
+
+TEST(Exec, LeavesOtherChildrenToTheirOwner) {
     const pid_t other = fork();
     if (other == 0) {
         _exit(5);
     }
-    EXPECT_EQ(shell("exit 0"), 0) << "other children are left to their owner";
+    EXPECT_EQ(shell("exit 0"), 0);
     int status = 0;
     ASSERT_EQ(waitpid(other, &status, 0), other);
     EXPECT_EQ(WEXITSTATUS(status), 5);
 }
 
-TEST(MkdirP, CreatesMissingParentsWithTheMode) {
+TEST(MkdirP, CreatesMissingParentsWithModeAndOwner) {
     const TempFolder folder;
     const mode_t mask = umask(027);
     EXPECT_EQ(QUORFSMkdirP(folder.path("a//b/c/").c_str(), 0, 1, -1, -1, 0777), 0);
@@ -70,62 +134,46 @@ TEST(MkdirP, CreatesMissingParentsWithTheMode) {
     ASSERT_EQ(stat(folder.path("a/b").c_str(), &found), 0);
     EXPECT_EQ(found.st_mode & 07777, 0750U);
     EXPECT_EQ(QUORFSMkdirP(folder.path("a/b/c").c_str(), 0, 1, -1, -1, 0700), 0) << "exists already";
-    EXPECT_LT(QUORFSMkdirP(folder.write("file", "").c_str(), 0, 1, -1, -1, 0777), 0) << "is no folder";
+    EXPECT_LT(QUORFSMkdirP(folder.write("file", "").c_str(), 0, 1, -1, -1, 0777), 0) << "is not a folder";
+    EXPECT_EQ(QUORFSMkdirP(folder.path("given").c_str(), 0, 1, 4711, -1, 0700) == 0, geteuid() == 0);
+    ASSERT_EQ(stat(folder.path("given").c_str(), &found), 0);
+    EXPECT_EQ(found.st_uid == 4711, geteuid() == 0);
 }
 
-class ServiceReload : public testing::Test {
-  protected:
-    ServiceReload() {
-        if (daemon_ == 0) {
-            pause();
-            _exit(0);
+TEST(ServiceReload, HangsUpTheProcessOfThePidFileAndNoOther) {
+    const std::tuple<const char*, const char*, const char*, pid_t> cases[] = {
+        // the service, the file and its text, and who is hung up
+        {"flat", "flat.pid", "4711\n", 4711},
+        {"nested", "nested/nested.pid", "4711", 4711},
+        {"aZ09@._:-", "aZ09@._:-.pid", "2", 2},
+        {"flat", "flat.pid", "", 0},
+        {"flat", "flat.pid", "0", 0},
+        {"flat", "flat.pid", "1", 0},
+        {"flat", "flat.pid", "-1", 0},
+        {"flat", "flat.pid", "4711x", 0},
+        {"flat", "flat.pid", "99999999999", 0},
+        {"flat", "flat.pid", "4712", 0},
+        {"flat", "other.pid", "4711", 0},
+        {"-flat", "-flat.pid", "4711", 0},
+        {".flat", ".flat.pid", "4711", 0},
+        {"fl*t", "fl*t.pid", "4711", 0},
+        {"sub/flat", "sub/flat.pid", "4711", 0},
+        {"", ".pid", "4711", 0},
+    };
+    const std::string run = quor::paths::kRunFolder;
+    for (const auto& [service, file, text, expected] : cases) {
+        SCOPED_TRACE(std::string(file) + ": " + text);
+        WriteFile(run + "/" + file, text);
+        for (const auto reload : {QLIBServiceReload, QLIBServicectlJobReload}) {
+            hungUp = 0;
+            EXPECT_EQ(reload(service), expected != 0 ? 0 : -1);
+            EXPECT_EQ(hungUp, expected);
         }
+        std::filesystem::remove_all(run);
     }
-    ~ServiceReload() override {
-        std::filesystem::remove_all(run_);
-        kill(daemon_, SIGKILL);
-        waitpid(daemon_, nullptr, 0);
-    }
-
-    // What ended the daemon: a HUP, as it does not catch it.
-    int endOfDaemon() const {
-        int status = 0;
-        waitpid(daemon_, &status, 0);
-        return WIFSIGNALED(status) ? WTERMSIG(status) : 0;
-    }
-
-    const std::string run_ = quor::paths::kRunFolder;
-    const pid_t daemon_ = fork();
-};
-
-TEST_F(ServiceReload, HangsUpTheProcessOfThePidFile) {
-    WriteFile(run_ + "/flat.pid", std::to_string(daemon_) + "\n");
-    EXPECT_EQ(QLIBServiceReload("flat"), 0);
-    EXPECT_EQ(endOfDaemon(), SIGHUP);
-    EXPECT_LT(QLIBServiceReload("flat"), 0) << "the process is gone";
-}
-
-TEST_F(ServiceReload, FindsThePidFileInTheFolderOfTheService) {
-    WriteFile(run_ + "/nested/nested.pid", std::to_string(daemon_));
-    EXPECT_EQ(QLIBServicectlJobReload("nested"), 0);
-    EXPECT_EQ(endOfDaemon(), SIGHUP);
-}
-
-TEST_F(ServiceReload, SignalsNothingElse) {
-    for (const std::string text : {"", "0", "1", "-1", "%x"}) {
-        WriteFile(run_ + "/bad.pid", text == "%x" ? std::to_string(daemon_) + "x" : text);
-        EXPECT_LT(QLIBServiceReload("bad"), 0) << text;
-    }
-    WriteFile(run_ + "/flat.pid", std::to_string(daemon_));
-    for (const char* name : {"", "missing", "./flat", "-flat", "fl*t"}) {
-        EXPECT_LT(QLIBServiceReload(name), 0) << name;
-    }
-    EXPECT_EQ(waitpid(daemon_, nullptr, WNOHANG), 0) << "the daemon still runs";
 }
 
 using Entries = std::map<std::string, std::string>;
-
-constexpr char kLine[] = "%s=\"%s\"\n";
 
 class Sections : public testing::Test {
   protected:

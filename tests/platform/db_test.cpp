@@ -149,9 +149,10 @@ TEST_F(Database, AnySizeOfResultIsReadBackWhole) {
         return i % 100'000 == 7 ? 10'000'000 : i % 100'000 == 8 ? 80'000 : 200;
     };
     for (unsigned int i = 0; i < kRows; ++i) {
-        const unsigned int other = i * 7919 % kRows;
         ASSERT_EQ(strlen(QUORDBFetchField(result_.get(), i, "text")), lengthOf(i));
-        ASSERT_EQ(field(other, "i"), std::to_string(other));
+        if (const unsigned int other = i * 7919 % kRows; i % 64 < 2) {
+            ASSERT_EQ(field(other, "i"), std::to_string(other));
+        }
     }
 }
 
