@@ -1,3 +1,4 @@
+#include <sys/stat.h>
 #include <sys/wait.h>
 
 #include <chrono>
@@ -144,7 +145,12 @@ TEST_F(Delivery, TheTestNoticeTellsTheOutcomeOfEachChannel) {
         static_cast<Strings*>(context)->push_back(std::string(channel) + (ok != 0 ? " ok" : " failed") +
                                                   (*detail != '\0' ? ", cause" : ""));
     };
+    const mode_t mask = umask(0);
     EXPECT_EQ(QUORNotifyTest(report, &heard), 3);
+    umask(mask);
+    EXPECT_EQ(QUORNotifyTest(nullptr, &heard), -1);
+    EXPECT_EQ(std::filesystem::status(std::string(paths::kNotifySpool) + "/desktop.jsonl").permissions(),
+              std::filesystem::perms{0600});
     EXPECT_EQ(heard, (Strings{"desktop ok", "webhook ok", "mail failed, cause"}));
 }
 

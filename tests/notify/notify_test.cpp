@@ -1,7 +1,9 @@
 #include <json/reader.h>
 #include <json/value.h>
+#include <sys/stat.h>
 #include <sys/wait.h>
 
+#include "platform/notify/settings.h"
 #include "tests/notify/fixture.h"
 
 namespace quor::test {
@@ -107,14 +109,23 @@ TEST_F(Notices, KeepTheIntervalOfTheirTagAndHost) {
     }
 }
 
-TEST_F(Notices, TheLedgerStaysSmallAndReadable) {
-    filter_ = folder_.write("filter", "[T]\nchannels=\"desktop\"\ninterval=\"60\"\n");
-    std::filesystem::create_directories(kSpool);
-    std::ofstream(kSpool + "/ledger") << std::string(100000, '\xFF') << "cut";
-    for (int host = 0; host < 400; ++host) {
-        ASSERT_EQ(send({{"%HOST%", std::to_string(host)}}), 0);
+// Each of the 512 hosts has sent at a second of its own.
+TEST_F(Notices, TheOldestEntryOfAFullLedgerGivesWay) {
+    filter_ = folder_.write("filter", "[T]\nchannels=\"email, desktop\"\ninterval=\"60\"\n");
+    const auto entry = [](const std::string& host, int64_t sent) {
+        std::string record = "T\n" + host;
+        record.resize(240);
+        return record.append(reinterpret_cast<const char*>(&sent), sizeof sent).append(8, '\0');
+    };
+    std::string ledger;
+    for (int host = 0; host < 512; ++host) {
+        ledger += entry(std::to_string(host), 1000 + (host + 200) % 512);
     }
-    EXPECT_EQ(std::filesystem::file_size(kSpool + "/ledger"), 512U * 256U);
+    WriteFile(kSpool + "/ledger", ledger + "cut");
+    SetClock(1515);
+    sent({{"%HOST%", "new"}});
+    ledger.replace(size_t{312} * 256, 256, entry("new", 1515));
+    EXPECT_EQ(ReadFile(kSpool + "/ledger"), ledger + "cut");
 }
 
 TEST_F(Notices, PastTheBoundOfTheQueueAreCounted) {
@@ -123,8 +134,15 @@ TEST_F(Notices, PastTheBoundOfTheQueueAreCounted) {
     std::vector<Descriptor> slots;
     ASSERT_TRUE(Eventually([&] { return (slots = takeSlots()).size() == 3; }));
     std::ofstream(kSpool + "/queue/00000000000000000000") << "not a notice";
+    const mode_t mask = umask(0);
+    std::filesystem::remove(kSpool + "/ledger");
     for (int i = 0; i < 210; ++i) {
         ASSERT_EQ(send({{"%SYSLOG_CONTENT%", std::to_string(i)}}), 0);
+    }
+    umask(mask);
+    for (const char* name : {"", "/queue", "/ledger", "/queue/00000000000000000003"}) {
+        const bool folder = std::filesystem::is_directory(kSpool + name);
+        EXPECT_EQ(std::filesystem::status(kSpool + name).permissions(), std::filesystem::perms{folder ? 0700U : 0600U});
     }
     slots.clear();
     ASSERT_EQ(send({}), 0) << "held back too, but it starts a worker";
@@ -156,8 +174,52 @@ TEST_F(Notices, TheDesktopSpoolIsTurnedOver) {
     ASSERT_EQ(send({}), 0);
     EXPECT_TRUE(Eventually([] { return std::filesystem::exists(kSpool + "/desktop.jsonl.1"); }));
     arrived(1);
-    EXPECT_EQ(std::filesystem::status(kSpool + "/desktop.jsonl").permissions(), std::filesystem::perms{0600});
-    EXPECT_EQ(std::filesystem::status(kSpool).permissions(), std::filesystem::perms{0700});
+}
+
+TEST_F(Notices, GoWhereTheSettingsSay) {
+    struct Expected {
+        int security;
+        int port;
+        int32_t timeout;
+        bool verify;
+    };
+    const std::pair<const char*, Expected> cases[]{
+        {"", {1, 587, 30, true}},
+        {"smtp_security=none\nnotify_timeout=0\nwebhook_tls_verify=yes\nsmtp_tls_verify=yes\n", {0, 25, 30, true}},
+        {"smtp_security=tls\nnotify_timeout=1\nwebhook_tls_verify=no\nsmtp_tls_verify=no\n", {2, 465, 1, false}},
+        {"smtp_security=TLS\nsmtp_port=1\nnotify_timeout=300\n", {1, 1, 300, true}},
+        {"smtp_security=plain\nsmtp_port=65535\nnotify_timeout=301\n", {1, 65535, 300, true}},
+        {"smtp_port=65536\nnotify_timeout=-1\n", {1, 587, 30, true}},
+        {"smtp_port=0\nnotify_timeout=99999999999\n", {1, 587, 300, true}},
+    };
+    for (const auto& [text, expected] : cases) {
+        SCOPED_TRACE(text);
+        settings(std::string("smtp_server=") + std::string(255, 's') + "\nsmtp_user=" + std::string(256, 'u') + "\n" +
+                 text);
+        const auto read = notify::LoadSettings();
+        ASSERT_TRUE(read);
+        QUORMAIL mail;
+        ASSERT_EQ(QUORMailGet(&mail), 0);
+        EXPECT_EQ(mail.security, expected.security);
+        EXPECT_EQ(mail.port, expected.port);
+        EXPECT_EQ(std::string(mail.server), std::string(255, 's'));
+        EXPECT_EQ(std::string(mail.user), "") << "half a name is somebody else's";
+        EXPECT_EQ(read->timeout, expected.timeout);
+        EXPECT_EQ(read->webhookVerify && mail.verify == 1, expected.verify);
+        EXPECT_EQ(read->webhookVerify || mail.verify == 1, expected.verify);
+    }
+    for (const char* enabled : {"yes", "no"}) {
+        settings(std::string("sms_enabled=") + enabled);
+        QUORSMSCONF* sms = QUORSmsConfGet();
+        ASSERT_NE(sms, nullptr);
+        EXPECT_EQ(sms->enabled, *enabled == 'y' ? 1 : 0);
+        QUORSmsConfFree(sms);
+    }
+    std::filesystem::remove(paths::kSystemSettings);
+    QUORMAIL mail;
+    EXPECT_TRUE(QUORMailGet(&mail) == -1 && QUORMailGet(nullptr) == -1 && QUORSmsConfGet() == nullptr);
+    EXPECT_EQ(QUORNotifyTest([](const char*, int, const char*, void*) {}, nullptr), -1);
+    EXPECT_EQ(send({}), 0) << "no channel";
 }
 
 }  // namespace

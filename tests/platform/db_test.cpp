@@ -115,6 +115,8 @@ TEST_F(Database, UnknownColumnsAndRowsHaveNoField) {
         EXPECT_EQ(field(0, column), "NULL") << column;
     }
     EXPECT_EQ(field(3, "name") + field(UINT_MAX, "name"), "NULLNULL");
+    EXPECT_EQ(QUORDBFetchField(result_.get(), 0, nullptr), nullptr);
+    EXPECT_LT(QUORDBFetchRow(result_.get(), nullptr) + QUORDBExecute(connection_.get(), nullptr, nullptr), -1);
 }
 
 TEST_F(Database, ResultOutlivesItsConnectionAndSchema) {
@@ -137,23 +139,73 @@ TEST_F(Database, LockedDatabaseIsWaitedForThenFails) {
     EXPECT_EQ(errorCode(), SQLITE_BUSY);
 }
 
-// Rows of every shape, more than memory holds, read in order and at random.
+// As long as the log writer runs, it alone restarts the write-ahead log: it checkpoints from 1,000 pages on.
+TEST_F(Database, CheckpointsLongAfterTheLogWriter) {
+    ASSERT_EQ(execute("PRAGMA wal_autocheckpoint"), 0);
+    EXPECT_EQ(field(0, "wal_autocheckpoint"), "10000");
+}
+
+TEST_F(Database, FieldsAreTheTextOfAnyValue) {
+    ASSERT_EQ(execute("SELECT 1 AS twice, 2 AS other, 3 AS twice, NULL AS n, -9223372036854775808 AS i, 1.5 AS r, "
+                      "x'6162' AS b, '' AS e, x'' AS z"),
+              0);
+    const std::pair<const char*, const char*> cases[] = {
+        {"twice", "1"},
+        {"twice", "1"},
+        {"other", "2"},
+        {"twice", "1"},
+        {"n", "NULL"},
+        {"i", "-9223372036854775808"},
+        {"r", "1.5"},
+        {"b", "ab"},
+        {"e", ""},
+        {"z", ""},
+        {"i", "-9223372036854775808"},
+    };
+    for (const auto& [column, text] : cases) {
+        EXPECT_EQ(field(0, column), text) << column;
+    }
+    EXPECT_EQ(execute("CREATE TABLE empty(a)"), 0);
+    EXPECT_EQ(field(0, "a"), "NULL") << "no columns";
+}
+
+// Rows of every length, more than memory holds, read in order and at random.
 TEST_F(Database, AnySizeOfResultIsReadBackWhole) {
     constexpr unsigned int kRows = 400'000;
-    ASSERT_EQ(execute("WITH RECURSIVE n(i) AS (SELECT 0 UNION ALL SELECT i + 1 FROM n LIMIT 400000) SELECT i, "
-                      "CASE i % 100000 WHEN 7 THEN hex(zeroblob(5000000)) WHEN 8 THEN hex(zeroblob(40000)) ELSE "
-                      "printf('%0200d', i) END AS text FROM n"),
+    setenv("TMPDIR", folder_.path().c_str(), 1);
+    ASSERT_EQ(execute("WITH RECURSIVE n(i) AS (SELECT 0 UNION ALL SELECT i + 1 FROM n LIMIT 400000) SELECT i, printf("
+                      "'%0*d', CASE WHEN i % 100000 < 64 THEN 65480 + i % 100000 WHEN i % 100000 = 77 THEN 10000000 "
+                      "ELSE 200 END, i) AS text FROM n"),
               0);
+    unsetenv("TMPDIR");
+    EXPECT_NE(ReadFile("/proc/self/maps").find(folder_.path()), std::string::npos) << "not in a temporary file";
     ASSERT_EQ(QUORDBNumRows(result_.get()), static_cast<int>(kRows));
     const auto lengthOf = [](unsigned int i) -> size_t {
-        return i % 100'000 == 7 ? 10'000'000 : i % 100'000 == 8 ? 80'000 : 200;
+        return i % 100'000 < 64 ? 65'480 + i % 100'000 : i % 100'000 == 77 ? 10'000'000 : 200;
     };
     for (unsigned int i = 0; i < kRows; ++i) {
-        ASSERT_EQ(strlen(QUORDBFetchField(result_.get(), i, "text")), lengthOf(i));
+        const char* text = QUORDBFetchField(result_.get(), i, "text");
+        ASSERT_EQ(strlen(text), lengthOf(i));
+        ASSERT_EQ(atoi(text + lengthOf(i) - 9), static_cast<int>(i));
         if (const unsigned int other = i * 7919 % kRows; i % 64 < 2) {
             ASSERT_EQ(field(other, "i"), std::to_string(other));
         }
     }
+}
+
+TEST(Db, NullIsAFailure) {
+    unsigned int row = 0;
+    char out[4] = "x";
+    EXPECT_EQ(QUORDBConnect(nullptr, nullptr, nullptr, nullptr), nullptr);
+    EXPECT_LT(QUORDBExecute(nullptr, "SELECT 1", nullptr), 0);
+    EXPECT_LT(QUORDBFetchRow(nullptr, &row), 0);
+    EXPECT_EQ(QUORDBFetchField(nullptr, 0, "a"), nullptr);
+    EXPECT_EQ(QUORDBNumRows(nullptr), 0);
+    EXPECT_STREQ(QUORDBErrorGet(nullptr), "no database connection");
+    EXPECT_EQ(QUORDBInternalDBHdlGet(nullptr), nullptr);
+    EXPECT_LT(QUORDBEscapeStringEX2(nullptr, nullptr, 4, "a", 1) + QUORDBEscapeStringEX(nullptr, out, 0, "a", 1), -1);
+    EXPECT_LT(QUORDBEscapeBackslashEX2(nullptr, out, 4, nullptr), 0);
+    EXPECT_STREQ(out, "");
 }
 
 TEST(Escape, DoublesQuotesAndMarksWildcards) {

@@ -11,14 +11,15 @@ namespace {
 
 constexpr char kLogs[] =
     "CREATE TABLE logs(id INTEGER PRIMARY KEY AUTOINCREMENT, msg TEXT, host TEXT, utcsec INTEGER,"
-    " llevel TEXT GENERATED ALWAYS AS (host) VIRTUAL, prog TEXT); CREATE INDEX logs_host ON logs(host);";
+    " llevel TEXT GENERATED ALWAYS AS (host) VIRTUAL, prog TEXT, extra); CREATE INDEX logs_host ON logs(host);";
 
-enum class Damage { kNone, kGarbage, kZeros, kHeader, kFirstPage, kHalf, kInterior };
+enum class Damage { None, Garbage, Zeros, Header, FirstPage, Half, Interior };
 
 struct Case {
     const char* name;
     Damage damage;
     uint32_t pageSize;
+    const char* encoding = "UTF-8";
 };
 
 class Salvaging : public testing::TestWithParam<Case> {
@@ -26,11 +27,14 @@ class Salvaging : public testing::TestWithParam<Case> {
     // Logs of all lengths up to several pages, a deleted range, and a second table.
     void fill() {
         SqliteFile db(path_);
-        db.run("PRAGMA page_size=" + std::to_string(GetParam().pageSize) + "; PRAGMA secure_delete=OFF;" + kLogs +
+        db.run("PRAGMA page_size=" + std::to_string(GetParam().pageSize) + "; PRAGMA encoding='" + GetParam().encoding +
+               "'; PRAGMA secure_delete=OFF;" + kLogs +
                "WITH RECURSIVE n(i) AS (SELECT 1 UNION ALL SELECT i + 1 FROM n WHERE i < 12000) "
-               "INSERT INTO logs(id, msg, host, utcsec, prog) "
+               "INSERT INTO logs(id, msg, host, utcsec, prog, extra) "
                "SELECT i, hex(zeroblob(CASE WHEN i % 1000 THEN i % 60 ELSE 20000 END)) || i, 'host' || (i % 50), i * "
-               "(1 + i % 3 * 3000000000), CASE WHEN i % 9 THEN 'prog' END FROM n;"
+               "(1 + i % 3 * 3000000000), CASE WHEN i % 9 THEN 'prog' END, "
+               "CASE i % 5 WHEN 0 THEN i / 3.0 WHEN 1 THEN zeroblob(i % 7) WHEN 2 THEN i % 3 WHEN 3 THEN -1 << i % 60 "
+               "END FROM n;"
                "CREATE TABLE histogram(id INTEGER PRIMARY KEY, device TEXT UNIQUE, count INTEGER);"
                "INSERT INTO histogram VALUES(NULL, 'a', 7), (NULL, 'b', -3);"
                "DELETE FROM logs WHERE id BETWEEN 5000 AND 6999;");
@@ -46,17 +50,17 @@ class Salvaging : public testing::TestWithParam<Case> {
     void damage() {
         std::string file = ReadFile(path_);
         const Damage kind = GetParam().damage;
-        if (kind == Damage::kGarbage || kind == Damage::kZeros) {
+        if (kind == Damage::Garbage || kind == Damage::Zeros) {
             for (int i = 0; i < 10; ++i) {
-                overwrite(file, 2 + random_() % (file.size() / GetParam().pageSize - 1), kind == Damage::kGarbage);
+                overwrite(file, 2 + random_() % (file.size() / GetParam().pageSize - 1), kind == Damage::Garbage);
             }
-        } else if (kind == Damage::kHeader) {
+        } else if (kind == Damage::Header) {
             file.replace(0, 100, 100, '\0');
-        } else if (kind == Damage::kFirstPage) {
+        } else if (kind == Damage::FirstPage) {
             overwrite(file, 1, true);
-        } else if (kind == Damage::kInterior) {
+        } else if (kind == Damage::Interior) {
             overwrite(file, pages("min(pageno)", "pagetype = 'internal'"), false);
-        } else if (kind == Damage::kHalf) {
+        } else if (kind == Damage::Half) {
             file.resize(file.size() / 2 + 99);
             lost_ += " OR pageno > " + std::to_string(file.size() / GetParam().pageSize);
         }
@@ -94,9 +98,12 @@ TEST_P(Salvaging, KeepsTheRowsOfEveryUndamagedPageAndNoOther) {
     const uint64_t saved = std::stoull(db.query("SELECT count(*) FROM logs").at(0));
     EXPECT_GE(saved, expected * 99 / 100);
     EXPECT_GE(report.tables[0].rows, saved);
-    EXPECT_EQ(report.badPages == 0, GetParam().damage == Damage::kNone || GetParam().damage == Damage::kHeader);
+    const bool whole = GetParam().damage == Damage::None && report.schemaRead != 0;
+    EXPECT_EQ(report.badPages == 0, whole || GetParam().damage == Damage::Header);
+    EXPECT_TRUE(!whole || report.badRows + report.strayRows + report.duplicates + report.unknownRows == 0);
+    EXPECT_EQ(report.pages, before.size() / GetParam().pageSize);
     EXPECT_EQ(!db.query("SELECT id FROM logs EXCEPT SELECT id FROM whole.logs").empty(),
-              GetParam().damage == Damage::kFirstPage)
+              GetParam().damage == Damage::FirstPage)
         << "deleted rows return only when the definitions and the list of free pages are lost";
     EXPECT_EQ(db.query("SELECT count(*) FROM (SELECT * FROM logs WHERE id NOT BETWEEN 5000 AND 6999 EXCEPT "
                        "SELECT * FROM whole.logs)"),
@@ -107,13 +114,15 @@ TEST_P(Salvaging, KeepsTheRowsOfEveryUndamagedPageAndNoOther) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Damages, Salvaging,
-                         testing::Values(Case{"nothing", Damage::kNone, 4096}, Case{"garbage", Damage::kGarbage, 4096},
-                                         Case{"zeros", Damage::kZeros, 16384}, Case{"header", Damage::kHeader, 4096},
-                                         Case{"firstPage", Damage::kFirstPage, 4096},
-                                         Case{"firstLargePage", Damage::kFirstPage, 16384},
-                                         Case{"firstSmallPage", Damage::kFirstPage, 1024},
-                                         Case{"half", Damage::kHalf, 4096}, Case{"halfLarge", Damage::kHalf, 65536},
-                                         Case{"interior", Damage::kInterior, 4096}),
+                         testing::Values(Case{"nothing", Damage::None, 4096}, Case{"garbage", Damage::Garbage, 4096},
+                                         Case{"zeros", Damage::Zeros, 16384}, Case{"header", Damage::Header, 4096},
+                                         Case{"firstPage", Damage::FirstPage, 4096},
+                                         Case{"firstLargePage", Damage::FirstPage, 16384},
+                                         Case{"firstSmallPage", Damage::FirstPage, 1024},
+                                         Case{"half", Damage::Half, 4096}, Case{"halfLarge", Damage::Half, 65536},
+                                         Case{"interior", Damage::Interior, 4096},
+                                         Case{"littleEndian", Damage::None, 4096, "UTF-16le"},
+                                         Case{"bigEndian", Damage::None, 4096, "UTF-16be"}),
                          [](const auto& each) { return std::string(each.param.name); });
 
 // The rows of a writer that was killed stand in the log; those after its broken frame were never promised.
@@ -129,22 +138,52 @@ TEST(Salvage, AppliesTheWriteAheadLog) {
     insert(500);
     db.run("PRAGMA wal_checkpoint(TRUNCATE)");
     insert(300);
-    std::string log = ReadFile(path + "-wal");
-    const size_t promised = log.size();
+    const size_t promised = ReadFile(path + "-wal").size();
     insert(200);
-    log = ReadFile(path + "-wal");
-    const auto saved = [&](const std::string& name) {
+    const std::string log = ReadFile(path + "-wal");
+    const std::tuple<const char*, size_t, uint64_t> cases[] = {
+        // the byte of the log that is broken, and the rows that are left
+        {"none", log.size(), 1000},
+        {"magic", 0, 500},
+        {"page size", 9, 500},
+        {"salt", 17, 500},
+        {"sum", 25, 500},
+        {"second sum", 29, 500},
+        {"frame of before", promised + 8, 800},
+        {"frame's sum", promised + 17, 800},
+        {"its second sum", promised + 21, 800},
+        {"its page", promised + 99, 800},
+    };
+    for (const auto& [name, broken, rows] : cases) {
+        SCOPED_TRACE(name);
+        std::string changed = log + '\0';
+        changed[broken] ^= 1;
         const std::string copy = folder.write(name, ReadFile(path));
-        folder.write(name + "-wal", log);
+        folder.write(std::string(name) + "-wal", changed);
         QUORSALVAGE report;
         EXPECT_EQ(QUORDBSalvage(copy.c_str(), (copy + ".new").c_str(), nullptr, nullptr, nullptr, &report), 0);
-        return report.tables[0].rows;
-    };
-    EXPECT_EQ(saved("whole"), 1000U);
-    log[promised + 99] ^= 1;
-    EXPECT_EQ(saved("brokenFrame"), 800U);
-    log[9] ^= 1;
-    EXPECT_EQ(saved("brokenLog"), 500U);
+        EXPECT_EQ(report.tables[0].rows, rows);
+    }
+    const std::string lost = folder.write("lost", "");  // the log alone, without its last transaction
+    folder.write("lost-wal", log.substr(0, log.size() - 1));
+    QUORSALVAGE report;
+    EXPECT_EQ(QUORDBSalvage(lost.c_str(), (lost + ".new").c_str(), nullptr, nullptr, nullptr, &report), 0);
+    EXPECT_TRUE(report.tables[0].rows >= 300 && report.tables[0].rows < 500) << report.tables[0].rows;
+}
+
+// A definition may define a table, and nothing else.
+TEST(Salvage, RunsNoQueryOfTheDamagedFile) {
+    const TempFolder folder;
+    const std::string path = folder.path("hostile.db");
+    SqliteFile(path).run(std::string(kLogs) +
+                         "CREATE TABLE evil(a); INSERT INTO logs(msg) VALUES('x');"
+                         "PRAGMA writable_schema=ON; UPDATE sqlite_master SET "
+                         "sql = 'CREATE TABLE evil AS SELECT sqlite_version() AS a' WHERE name = 'evil'");
+    const std::string saved = folder.path("saved.db");
+    QUORSALVAGE report;
+    ASSERT_EQ(QUORDBSalvage(path.c_str(), saved.c_str(), nullptr, nullptr, nullptr, &report), 0) << report.error;
+    EXPECT_EQ(SqliteFile(saved).query("SELECT name FROM sqlite_master WHERE name IN ('logs', 'logs_host', 'evil')"),
+              (std::vector<std::string>{"logs", "logs_host"}));
 }
 
 TEST(Salvage, RefusesAndLeavesNothing) {
