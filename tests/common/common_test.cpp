@@ -50,11 +50,29 @@ TEST(ReadFileInReverse, StoresLinesFromTheLast) {
     EXPECT_EQ(reversed(std::string(1030, 'x'), 1), Strings{std::string(1023, 'x')});
 }
 
+TEST(ReadFileInReverse, LeavesNoArrayForLessThanNoLines) {
+    for (const int maxLines : {-1, INT32_MIN}) {
+        testing::internal::CaptureStderr();
+        char* uninitialised = nullptr;
+        char** lines = &uninitialised;
+        int count = 0;
+        EXPECT_EQ(readfileinreverse(stdin, &lines, count, maxLines), -1);
+        EXPECT_EQ(lines, nullptr);
+        EXPECT_EQ(testing::internal::GetCapturedStderr(), "calloc: Cannot allocate memory\n");
+    }
+}
+
 TEST(CmdParser, CutsAfterEveryClosingBraceAndStopsAtTheFirstFailure) {
-    using Case = std::tuple<const char*, int, size_t>;
-    for (const auto& [text, result, count] :
-         {Case{"}}}", 1, 0}, Case{R"(}{"a":1}}{"b":2}})", 1, 2}, Case{R"({"a":{"b":1}})", 0, 0},
-          Case{R"({"a":"}"})", 0, 0}, Case{R"({"a":1}{"b"}{"c":1})", 0, 1}}) {
+    // The command, the result, the values that were appended and the reason of a failure.
+    const std::tuple<std::string, int, size_t, const char*> cases[] = {
+        {"}}}", 1, 0, ""},
+        {R"(}{"a":1}}{"b":2}})", 1, 2, ""},
+        {R"({"a":{"b":1}})", 0, 0, "* Line 1"},
+        {R"({"a":"}"})", 0, 0, "* Line 1"},
+        {R"({"a":1}{"b"}{"c":1})", 0, 1, "* Line 1"},
+        {R"({"a":1})" + std::string(1001, '['), 0, 1, "Exceeded stackLimit"},
+    };
+    for (const auto& [text, result, count, reason] : cases) {
         SCOPED_TRACE(text);
         TakeSystemLog();
         std::string input = text;
@@ -63,7 +81,8 @@ TEST(CmdParser, CutsAfterEveryClosingBraceAndStopsAtTheFirstFailure) {
         EXPECT_EQ(values.size(), 1 + count) << "appended";
         const auto lines = TakeSystemLog();
         ASSERT_EQ(lines.size(), result == 1 ? 0U : 1U);
-        EXPECT_TRUE(lines.empty() || lines[0].text.rfind("Error: parsing error, reason = * Line 1", 0) == 0);
+        EXPECT_TRUE(lines.empty() ||
+                    lines[0].text.rfind("Error: parsing error, reason = " + std::string(reason), 0) == 0);
     }
 }
 

@@ -45,6 +45,7 @@ TEST_F(Handle, WorksWhileItIsConnected) {
     EXPECT_EQ(handle_.DBDiscon(), 0);
     EXPECT_FALSE(handle_.isConnected());
     EXPECT_EQ(handle_.DBDiscon(), 0);
+    EXPECT_EQ(SpyOnDb().closed, 1) << "no connection is held, none is closed";
 }
 
 TEST_F(Handle, KeepsTheFlagOfATransaction) {

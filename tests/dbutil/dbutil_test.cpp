@@ -3,6 +3,7 @@
 #include "common/handles.h"
 #include "tests/support/database.h"
 #include "tests/support/db_spy.h"
+#include "tests/support/faults.h"
 
 using namespace quor::test;
 
@@ -201,6 +202,28 @@ TEST(Condition, EscapesTheValueForItsOperator) {
          }) {
         EXPECT_EQ(rendered({cond(attr, op, value)}), text);
     }
+}
+
+TEST(Condition, WhoseValueCannotBeEscapedHasAnEmptyOne) {
+    const std::string value = "it's " + std::string(100, '*');
+    const _SYSLOG_SQL_COND_tag like = cond(SYSLOG_ATTRI_HOST, SYSLOG_OP_LIKE, value);
+    using Case = std::pair<const char*, size_t>;
+    for (const auto& [failing, escapes] : {Case{"quotes", 1}, Case{"backslashes", 2}}) {
+        SpyOnDb() = {};
+        SpyOnDb().failing = failing;
+        EXPECT_EQ(rendered({like}), "(host LIKE '' escape '\\')");
+        EXPECT_EQ(SpyOnDb().escapes.size(), escapes) << failing;
+    }
+    SpyOnDb() = {};
+    for (const int op : {SYSLOG_OP_EQUAL, SYSLOG_OP_NOT_LIKE, SYSLOG_OP_NOT_GLOB}) {
+        const _SYSLOG_SQL_COND_tag any = cond(SYSLOG_ATTRI_HOST, op, value);
+        for (int nth = 1; nth == 1 || Fault::struck(); ++nth) {
+            const Fault fault(Resource::Memory, nth, false);
+            const std::string text = CondValueEscape(&any);
+            EXPECT_EQ(text.empty(), Fault::struck()) << "operator " << op << ", allocation " << nth;
+        }
+    }
+    EXPECT_EQ(CondValueEscape(nullptr), "");
 }
 
 TEST(Condition, ReplacesTheTextAndJoinsAlternativesOneLevelDeep) {

@@ -1,4 +1,4 @@
-// The wrapper's statements as the library sends them: recorded, then run for real, or failing on demand.
+// The wrapper's calls as the library makes them: recorded, then run for real, or failing on demand.
 #ifndef TESTS_SUPPORT_DB_SPY_H
 #define TESTS_SUPPORT_DB_SPY_H
 
@@ -9,7 +9,9 @@ namespace quor::test {
 
 struct DbSpy {
     std::vector<std::string> statements;  // a limited select ends in " [COUNT,SKIP]"
-    std::string failing;                  // a statement that contains this fails without being run, when not empty
+    std::vector<std::string> escapes;     // "quotes TEXT" and "backslashes TEXT"
+    std::string failing;                  // a statement or escape that contains this fails unrun, when not empty
+    int closed = 0;                       // connections, null ones too
 };
 
 DbSpy& SpyOnDb();
