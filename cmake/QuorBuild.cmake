@@ -32,7 +32,7 @@ function(quor_install_library target header_folder headers)
     target_include_directories(${target} INTERFACE $<INSTALL_INTERFACE:include>)
     if(BUILD_SHARED_LIBS)
         set(map ${PROJECT_SOURCE_DIR}/cmake/${target}.map)
-        target_link_options(${target} PRIVATE LINKER:--version-script=${map})
+        target_link_options(${target} PRIVATE LINKER:--version-script=${map},--no-undefined-version)
         set_property(TARGET ${target} APPEND PROPERTY LINK_DEPENDS ${map})
     endif()
     install(TARGETS ${target} EXPORT quorsyslog
