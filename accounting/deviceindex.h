@@ -16,7 +16,7 @@ struct AccountingManager::DeviceIndex {
     };
 
     std::unordered_map<std::string_view, Entry> entries;  // named by the texts of the rows
-    uint64_t openSample = 1;                              // the counts of earlier samples are not to be touched
+    uint64_t openSample = 1;                              // counts of earlier samples are closed
 
     // The entry of `device`; a new device gets a row at the end of the histogram.
     Entry& at(const std::string& device, std::list<QUORLOG_LOG_DEVICE_STATISTIC>& histogram);

@@ -20,7 +20,7 @@ using SqlText = quor::Guard<char, sqlite3_free>;
 constexpr off_t kPurgeAboveBytes = off_t{5} * 1024 * 1024;
 constexpr const char* kPurge = "DELETE FROM eps WHERE stamp < strftime('%s', 'now') - 24*60*60;";
 
-// Ends the transaction, rolled back or never started as it may be.
+// Ends the transaction in every case, also one that was rolled back or never began (which is reported).
 class EndOfTransaction {
   public:
     explicit EndOfTransaction(DBHandler& db) : db_(db) {}
@@ -80,7 +80,7 @@ bool writeHistogram(DBHandler& db, const Histogram& histogram) {
     return true;
 }
 
-// Keeps the file bounded. False when it is not what it should be; a failed purge is only reported.
+// Keeps the file from growing without end. False when it is no regular file; a failed purge is only reported.
 bool purge(DBHandler& db, const std::string& path) {
     struct stat status {};
     if (stat(path.c_str(), &status) != 0) {

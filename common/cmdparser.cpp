@@ -36,7 +36,7 @@ bool parseObject(const std::string& piece, Json::Value& value) {
         }
         reason = reader.getFormattedErrorMessages();
     } catch (const Json::Exception& refused) {
-        reason = refused.what();  // a text nested too deep is not reported, but thrown
+        reason = refused.what();  // a text that is nested too deeply is not reported but thrown
     }
     syslog(LOG_ERR, "Error: parsing error, reason = %s\n", reason.c_str());
     return false;

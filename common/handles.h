@@ -20,12 +20,12 @@ using StringTable = Guard<QLIBSZHASH, QLIBCSzHashFree>;
 using StringList = Guard<QLIBSZLIST, QLIBCSzListFree>;
 using PlatformText = Guard<char, QLIBCStrPut>;
 
-// One row of a result after the other, or a row of a known number.
+// Walks over the rows of a result, or reads the row of a known number.
 class Row {
   public:
     explicit Row(DBResult_tag* result, unsigned int number = 0) : result_(result), number_(number) {}
 
-    // Goes on to the next row that the result hands out; false when there is none.
+    // Goes on to the next row; false when there is none.
     bool next() { return QUORDBFetchRow(result_, &number_) >= 0; }
     unsigned int number() const { return number_; }
     // NULL and a missing column read as the empty text. The text belongs to the result.

@@ -1,5 +1,5 @@
-// The line numbers in messages of the system log. They are part of the messages: readers and their filters know each
-// failure by its number. They are not lines of these sources, and never follow them.
+// The line numbers in messages of the system log. Readers and their filters know each failure by its number, so the
+// numbers never change: they are not lines of these sources.
 #ifndef COMMON_LOGPLACES_H
 #define COMMON_LOGPLACES_H
 

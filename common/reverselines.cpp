@@ -49,7 +49,7 @@ void storeLinesBackwards(FILE* file, long length, LineStore& store) {
     }
 }
 
-// Null pointers; null when there is no memory. No number of lines is below zero: that is an array that cannot be had.
+// An array of null pointers, or null when there is no memory for it: for a negative size there never is.
 char** newArray(int size) {
     if (size < 0) {
         errno = ENOMEM;

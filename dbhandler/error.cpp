@@ -32,7 +32,7 @@ void DBHandler::DBErrorHandle(std::string sql) {
     int priority = LOG_ERR;
     switch (code) {
     case SQLITE_ERROR:
-        // A failed table check is not answered by another one, which would fail the same way without end.
+        // A failed table check is not followed by another one, which would fail the same way without end.
         if (sql != tableQuery(kLogs) && DBcheckTableExist(kLogs) != 0) {
             priority = LOG_INFO;
         }

@@ -2,22 +2,21 @@
 
 #include <cstdio>
 
-#include "common/handles.h"
 #include "common/logplaces.h"
 #include "dbhandler.h"
 #include "notification.h"
+#include "notification/notice.h"
 #include "quor/quorservice.h"
 
 int DBErrorHandle_SQLITE_CORRUPT(DBConnect_tag* /*connection*/, std::string dbPath) {
     NotificationManager notifier;
-    quor::StringTable values(QLIBCSzHashAlloc(1024));
+    quor::StringTable values(QLIBCSzHashAlloc(quor::kNoticeTableSize));
     if (values == nullptr) {
         return -1;
     }
-    // Neither a value that cannot be set nor a notice that cannot be sent keeps the file from being moved.
+    quor::FillNotice(values, {{"%DBPATH%", dbPath.c_str()}});
     char tag[] = "QUORSYSLOG_DB_CORRUPT";
-    (void)QLIBCSzHashSetValue(quor::Adopt(values), "%DBPATH%", dbPath.c_str());
-    (void)notifier.NotificationSend(tag, quor::Adopt(values));
+    (void)notifier.NotificationSend(tag, quor::Adopt(values));  // whether it was sent or not, the file is moved
 
     if (rename(dbPath.c_str(), (dbPath + ".corrupt").c_str()) != 0) {
         return -1;

@@ -42,6 +42,7 @@ int SyslogDBExtkeyMapGet(std::string& dbPath, _SYSLOG_EXTKEY_TB_TYPE_tag type,
     const bool complete = query.eachRow([&](const quor::Row& row) {
         const unsigned long long key = keyTables ? quor::ToUint64(row[source.idColumn]) : map.size();
         map.emplace(key, row[keyTables ? source.nameColumn : source.logColumn]);
+        return true;
     });
     return complete ? 0 : -1;
 }
@@ -74,6 +75,9 @@ int SyslogDBAttriValueGet(std::string& dbPath, std::string& attrName, _SYSLOG_SQ
     if (!query.connect(dbPath) || query.execute(sql, limit) < 0) {
         return -1;
     }
-    const bool complete = query.eachRow([&](const quor::Row& row) { values.emplace_back(row[attrName.c_str()]); });
+    const bool complete = query.eachRow([&](const quor::Row& row) {
+        values.emplace_back(row[attrName.c_str()]);
+        return true;
+    });
     return complete ? 0 : -1;
 }

@@ -5,6 +5,7 @@
 #include <syslog.h>
 
 #include <string>
+#include <utility>
 
 #include "common/handles.h"
 #include "common/logplaces.h"
@@ -17,7 +18,7 @@ inline bool IsValidDbPath(const std::string& path) {
     return !path.empty() && path.front() == '/';
 }
 
-// The same with a report; `place` is one of common/logplaces.h.
+// The same, with a report when it is not; `place` is one of common/logplaces.h.
 inline bool CheckDbPath(const std::string& path, int place) {
     if (!IsValidDbPath(path)) {
         syslog(LOG_ERR, "%s:%d Invalid syslog db path!", "dbutil", place);
@@ -53,16 +54,17 @@ struct Query {
                                  static_cast<uint32_t>(limit->offset), Adopt(result));
     }
 
-    // Hands every row to `visit`; false as soon as a counted row cannot be fetched.
+    // Hands one row after the other to `visit(const Row&)` until it answers false. False when a row cannot be fetched.
     template <typename Visit>
     bool eachRow(Visit visit) const {
         const int count = QUORDBNumRows(result.get());
+        bool more = true;
         Row row(result.get());
-        for (int i = 0; i < count; ++i) {
+        for (int i = 0; i < count && more; ++i) {
             if (!row.next()) {
                 return false;
             }
-            visit(static_cast<const Row&>(row));
+            more = visit(std::as_const(row));
         }
         return true;
     }

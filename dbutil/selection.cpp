@@ -45,23 +45,13 @@ std::string selectStatement(const std::string& table, const std::string& where, 
            (where.empty() ? " WHERE " : " AND ") + idWindow(*limit) + orderBy(order);
 }
 
-// Hands every row over until the callback or a row that cannot be converted ends the walk. -1 when a row is missing.
-int walkRows(const quor::Query& query, std::string& table, RecordCallback callback, void* ctx, bool trim) {
+// Hands every row over until the callback or a row that cannot be converted ends the walk. False when a row is missing.
+bool walkRows(const quor::Query& query, std::string& table, RecordCallback callback, void* ctx, bool trim) {
     _SYSLOG_LOG_DATA_tag record;
-    const int rows = QUORDBNumRows(query.result.get());
-    quor::Row row(query.result.get());
-    for (int i = 0; i < rows; ++i) {
-        if (!row.next()) {
-            return -1;
-        }
-        if (callback == nullptr) {
-            continue;
-        }
-        if (DBRecToLogInfo(table, query.result.get(), row.number(), &record, trim) != 0 || callback(record, ctx) != 0) {
-            break;
-        }
-    }
-    return 0;
+    return query.eachRow([&](const quor::Row& row) {
+        return callback == nullptr || (DBRecToLogInfo(table, query.result.get(), row.number(), &record, trim) == 0 &&
+                                       callback(record, ctx) == 0);
+    });
 }
 
 }  // namespace
@@ -86,7 +76,7 @@ int SyslogDBSelectByTable(std::string& dbPath, std::string& table, Conditions& c
         syslog(LOG_ERR, "fail to execute database command (%s)", sql.c_str());
         return -1;
     }
-    return walkRows(query, table, callback, ctx, trim);
+    return walkRows(query, table, callback, ctx, trim) ? 0 : -1;
 }
 
 int SyslogDBSelect(std::string& dbPath, Conditions& conds, _SYSLOG_SQL_LIMIT_tag* limit, _SYSLOG_SQL_ORDER_tag* order,

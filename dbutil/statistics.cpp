@@ -58,6 +58,7 @@ std::map<std::string, unsigned long long> SyslogDBHistGet(std::string& path, int
     if (readStatistics(path, quor::place::kHistogramPath, sql, query)) {
         (void)query.eachRow([&](const quor::Row& row) {  // a row that cannot be fetched ends the list
             counts.emplace_hint(counts.end(), row["device"], quor::ToUint64(row["count"]));
+            return true;
         });
     }
     return counts;
@@ -71,6 +72,7 @@ std::map<int32_t, SYSLOG_LOG_EPS> SyslogDBEpsGet(std::string& path, int from, in
     if (readStatistics(path, quor::place::kSamplesPath, sql, query)) {
         (void)query.eachRow([&](const quor::Row& row) {
             addSample(samples, quor::ToInt32(row["stamp"]), row["device"], quor::ToInt32(row["eps"]));
+            return true;
         });
     }
     return samples;

@@ -33,7 +33,7 @@ class AccountingManager {
 
     // Sets the path of the accounting database. Always 0.
     int ConfigLoad();
-    // Reads the notification rules anew.
+    // Reads the notification rules again.
     void RulesReload();
     // Counts one log of `device`, after closing the open sample if the second has changed. Always 0.
     int LogInc(std::string device);
@@ -49,11 +49,11 @@ class AccountingManager {
     // A copy of the histogram, in the order in which the devices first appeared.
     std::list<QUORLOG_LOG_DEVICE_STATISTIC> HistogramGet();
 
-    // Writes the closed samples and the histogram in one transaction; without a closed sample it does nothing (0).
-    // -1 keeps the samples for the next flush.
+    // Writes the closed samples and the histogram to the accounting database in one transaction; without a closed
+    // sample it does nothing. -1 keeps the samples for the next flush.
     int AccoutingFlush2DB();
     // Forgets the oldest closed samples until those left hold at most `maxCounts` counts of devices, for an owner whose
-    // database stays unwritable. The number of samples forgotten; the histogram still counts their logs.
+    // database cannot be written for long. Returns how many it forgot; the histogram still counts their logs.
     unsigned long long EpsListTrim(unsigned long long maxCounts);
     // Prints the counters as debug messages at a level that the sink drops.
     void AccountingDump();

@@ -14,7 +14,7 @@ struct DBResult_tag;
 
 #pragma GCC visibility push(default)
 
-// Attributes of a log, in the order of the attribute table. "ip" stands twice: for logs and for transfers.
+// Attributes of a log. Two of them are columns named "ip": one of table logs, one of transfer_log.
 enum _SYSLOG_DB_ATTRI_tag : int32_t {
     SYSLOG_ATTRI_ID = 0,
     SYSLOG_ATTRI_HOST = 1,
@@ -52,7 +52,8 @@ enum _SYSLOG_DB_PRIORITY_tag : int32_t {
 
 // Names of the severities, by value.
 extern const char* const g_MappingSyslogPrior[8];
-// SQL operators, by number.
+
+// Operators of a condition.
 enum _SYSLOG_SQL_OP_tag : int {
     SYSLOG_OP_EQUAL = 0,
     SYSLOG_OP_NOT_EQUAL = 1,
@@ -65,6 +66,8 @@ enum _SYSLOG_SQL_OP_tag : int {
     SYSLOG_OP_GLOB = 8,
     SYSLOG_OP_NOT_GLOB = 9,
 };
+
+// Their SQL, by value.
 extern const char* const g_MappingSyslogOP[10];
 
 // One log, of any table. Each converter fills the fields of its table and leaves the others alone.
@@ -156,35 +159,38 @@ int DBRecToXferLogInfo(DBResult_tag* result, unsigned int row, _SYSLOG_LOG_DATA_
 
 // ---- conditions to SQL
 
-// The value escaped for its operator. LIKE takes "*" and "?" as wildcards and everything else literally; GLOB takes
-// "*" and "?" as wildcards and brackets literally. Empty for a null condition.
+// The value escaped for its operator. LIKE and GLOB take "*" and "?" as wildcards and everything else literally. The
+// empty text for a null condition, and for a value that cannot be escaped.
 std::string CondValueEscape(const _SYSLOG_SQL_COND_tag* cond);
-// Replaces `out` with the condition as SQL. The value of a numeric attribute is neither quoted nor checked.
+// Replaces `out` with the condition as SQL. The value of a numeric attribute (id, utcsec) is neither quoted nor
+// checked: it must be a number. Always 0.
 int SqlCondToStr(const _SYSLOG_SQL_COND_tag& cond, std::string& out);
 // Appends the conditions joined by " AND " to `out`, without "WHERE".
 int SqlCondListToStr(std::list<_SYSLOG_SQL_COND_tag>& conds, std::string& out);
 
-// Fills `cond` with "attr equals one of the comma-separated values". An empty text or "any" leaves `cond` untouched.
+// Fills `cond` with "attr equals one of the comma-separated values", which are not trimmed. An empty text or "any"
+// leaves `cond` alone. Always 0.
 int OneCondListGen(_SYSLOG_DB_ATTRI_tag attr, const std::string& text, _SYSLOG_SQL_COND_tag& cond);
-// Appends the conditions of a search form. Lists are comma-separated; empty or "any" asks for nothing. `keyword` is a
-// GLOB pattern, wrapped in "*" by the caller ("**" matches all). A date "" or "0" is unset; dates compare as text.
+// Appends the conditions of a search form. The first four are comma-separated lists; an empty one or "any" asks for
+// nothing. `keyword` is a GLOB pattern that the caller wraps in "*" ("**" matches every log). A date that is empty or
+// "0" is not set; dates compare as text.
 void LogSearchCondListGen(std::string& hosts, std::string& levels, std::string& facs, std::string& progs,
                           std::string& keyword, std::string& fromDate, std::string& toDate,
                           std::list<_SYSLOG_SQL_COND_tag>& conds);
 
-// ---- selection, counting, deletion: the table name is used as given, unchecked
+// ---- selection, counting, deletion: the table name is used as given, unchecked; `limit` and `order` may be null
 
-// Hands each row to `callback` until it returns nonzero. `limit` and `order` may be null. Without a filter the window
-// is counted back from the largest id, so it holds the newest rows whatever the order, and deleted ids shrink it.
-// The record is reused for every row.
+// Hands each row to `callback` until it returns nonzero, which is no failure; a null callback walks over the rows. The
+// same record is used for every row. Without a filter the window is counted back from the largest id, so it holds the
+// newest rows whatever the order, and deleted ids shrink it.
 int SyslogDBSelectByTable(std::string& dbPath, std::string& table, std::list<_SYSLOG_SQL_COND_tag>& conds,
                           _SYSLOG_SQL_LIMIT_tag* limit, _SYSLOG_SQL_ORDER_tag* order,
                           int (*callback)(_SYSLOG_LOG_DATA_tag&, void*), void* ctx, bool trim);
 // The same on table logs.
 int SyslogDBSelect(std::string& dbPath, std::list<_SYSLOG_SQL_COND_tag>& conds, _SYSLOG_SQL_LIMIT_tag* limit,
                    _SYSLOG_SQL_ORDER_tag* order, int (*callback)(_SYSLOG_LOG_DATA_tag&, void*), void* ctx, bool trim);
-// Number of matching rows (low 32 bits); -1 on failure, -2 when the result is not one row. Without a filter it is the
-// largest id, not a count.
+// Number of matching rows (low 32 bits); -1 on failure, -2 when the result is more than one row. Without a filter it is
+// the largest id, not a count.
 int SyslogDBSelectCountByTable(std::string& dbPath, std::string& table, std::list<_SYSLOG_SQL_COND_tag>& conds,
                                _SYSLOG_SQL_LIMIT_tag* limit, _SYSLOG_SQL_ORDER_tag* order);
 // The same on table logs.
@@ -195,12 +201,14 @@ int SyslogDBDelete(std::string& dbPath, std::list<_SYSLOG_SQL_COND_tag>& conds);
 
 // ---- names in a log database
 
-// Fills `map` (cleared first) with key and name. In a version 2 database the keys number the distinct values from 0.
+// Replaces `map` with keys and names. In a version 2 database (see SyslogDBVersionGet) the keys number the distinct
+// values from 0. -1 leaves the map as it was, or with the rows before one that could not be read.
 int SyslogDBExtkeyMapGet(std::string& dbPath, _SYSLOG_EXTKEY_TB_TYPE_tag type,
                          std::map<unsigned long long, std::string>& map);
-// Key of `name`, or 0 when there is none; 0 is also the first key of a version 2 database.
+// Key of `name`, or 0 when there is none or the names cannot be read; 0 is also the first key of a version 2 database.
 unsigned long long SyslogDBExtkeyLookupByName(std::string& dbPath, _SYSLOG_EXTKEY_TB_TYPE_tag type, std::string name);
-// Appends the distinct values of an attribute of table logs in ascending order. `limit` may be null.
+// Appends the distinct values of an attribute of table logs in ascending order. `limit` may be null. -1 for a name that
+// is no attribute, too.
 int SyslogDBAttriValueGet(std::string& dbPath, std::string& attrName, _SYSLOG_SQL_LIMIT_tag* limit,
                           std::list<std::string>& values);
 

@@ -1,4 +1,4 @@
-// What the parts of the event log share.
+// An event database for the length of one call, created from the package's schema when it is missing.
 #ifndef LOGGER_EVENTDB_H
 #define LOGGER_EVENTDB_H
 

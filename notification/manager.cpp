@@ -8,7 +8,7 @@ namespace {
 
 constexpr char kFailedMail[] = "Failed to send email.";
 
-// Reported where a sender is told to: 0 or -1.
+// 0, or -1 with a second report beside that of NotificationSend().
 int send(NotificationManager& manager, const char* tag, quor::StringTable& table) {
     if (manager.NotificationSend(const_cast<char*>(tag), quor::Adopt(table)) < 0) {
         Debuger::MSG(0, "Fail to send notification");

@@ -1,4 +1,4 @@
-// Failures of the rules and of the settings, as the system log knows them.
+// The form in which the system log gets failures of the rules and of the settings.
 #ifndef NOTIFICATION_REPORT_H
 #define NOTIFICATION_REPORT_H
 

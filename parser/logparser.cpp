@@ -13,33 +13,30 @@ class Words {
   public:
     explicit Words(const char* text) : next_(text) {}
 
-    // Each leaves `field` alone and answers false when no word is left.
+    // Each puts the next word into `field`. False, and `field` as it was, when no word is left.
     bool take(std::string& field) {
-        const std::string_view word = nextWord();
-        if (!word.empty()) {
-            field.assign(word);
-        }
-        return !word.empty();
+        return takeWord([&field](std::string_view word) { field.assign(word); });
     }
     bool take(long long& field) {
-        const std::string_view word = nextWord();
-        if (!word.empty()) {
-            field = toNumber(word);
-        }
-        return !word.empty();
+        return takeWord([&field](std::string_view word) { field = toNumber(word); });
     }
     bool take(_SYSLOG_DB_PRIORITY_tag& field) {
-        const std::string word(nextWord());
-        if (!word.empty()) {
-            field = PriorStrToType(word.c_str());
-        }
-        return !word.empty();
+        return takeWord([&field](std::string_view word) { field = PriorStrToType(std::string(word).c_str()); });
     }
 
     // What follows the blank after the last word.
     const char* rest() const { return next_; }
 
   private:
+    template <typename Put>
+    bool takeWord(Put put) {
+        const std::string_view word = nextWord();
+        if (!word.empty()) {
+            put(word);
+        }
+        return !word.empty();
+    }
+
     std::string_view nextWord() {
         while (*next_ == ' ') {
             ++next_;
