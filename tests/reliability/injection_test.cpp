@@ -1,18 +1,76 @@
 // Hostile values through every path that reaches SQL. SQLite's authorizer sees what each statement does.
 #include <dlfcn.h>
 
-#include <CLI/CLI.hpp>
 #include <functional>
+#include <random>
+#include <set>
 
 #include "accounting.h"
+#include "common.h"
 #include "common/handles.h"
 #include "dbhandler.h"
 #include "dbutil.h"
 #include "logger.h"
-#include "store/failure.h"
-#include "tests/reliability/injection.h"
 #include "tests/support/clock.h"
-#include "tools/quorlog/commands/commands.h"
+#include "tests/support/testing.h"
+
+namespace quor::test {
+namespace {
+
+// The same values in every run.
+class Hostile {
+  public:
+    size_t number(size_t below) { return random_() % below; }
+
+    // May hold zero bytes.
+    std::string value() {
+        static const std::list<std::string> pieces = Tokenize(
+            "'|''|\"|;|--|/*|*/|[|]|(|)|\\|%|_|`|*|?|x| OR |1=1|%s%n|$(id)>|<b>|\t|\n|\x01|\x1b[|\x7f|\xff|\xc3|"
+            "\xef\xbf\xbd|UNION SELECT|DROP TABLE logs|DELETE FROM log",
+            "|");
+        std::string text;
+        for (size_t left = number(8); left > 0; --left) {
+            const auto piece = std::next(pieces.begin(), static_cast<long>(number(pieces.size())));
+            text += number(30) == 0 ? std::string(1, '\0') : *piece;
+        }
+        return text;
+    }
+
+    // What a command line can carry.
+    std::string argument() {
+        const std::string text = value();
+        return text.substr(0, text.find('\0'));
+    }
+
+  private:
+    std::mt19937 random_{2024};
+};
+
+using Actions = std::set<std::string>;
+
+// What statements did beside reading: "INSERT log", "BEGIN", or SQLite's number of any other action with its object.
+Actions& Seen() {
+    static Actions seen;
+    return seen;
+}
+
+Actions TakeActions() {
+    return std::exchange(Seen(), {});
+}
+
+int Watch(void* /*context*/, int action, const char* object, const char*, const char*, const char*) {
+    static const std::map<int, std::string> writing = {
+        {SQLITE_INSERT, "INSERT "}, {SQLITE_UPDATE, "UPDATE "}, {SQLITE_DELETE, "DELETE "}, {SQLITE_TRANSACTION, ""}};
+    static const std::set<int> reading = {SQLITE_SELECT, SQLITE_READ, SQLITE_FUNCTION, SQLITE_RECURSIVE};
+    const auto known = writing.find(action);
+    if (reading.count(action) == 0) {
+        Seen().insert((known != writing.end() ? known->second : std::to_string(action) + " ") + OrEmpty(object));
+    }
+    return SQLITE_OK;
+}
+
+}  // namespace
+}  // namespace quor::test
 
 // Every connection of the library is watched, and does not wait for the disk.
 DBConnect_tag* QUORDBConnect(const char* host, const char* user, const char* password, const char* path) {
@@ -166,105 +224,6 @@ TEST_F(Injection, DevicesAreCountedUnderTheirNames) {
     EXPECT_EQ(SqliteFile(path).query("SELECT count(*) FROM (SELECT device, sum(eps) FROM eps GROUP BY device EXCEPT "
                                      "SELECT device, count FROM histogram)"),
               Strings{"0"});
-}
-
-// quorlog with hostile arguments.
-class InjectionQuorlog : public Injection {
-  protected:
-    using Row = std::array<std::string, 4>;
-
-    // The exit status; the output in `out_`.
-    int quorlog(Strings arguments) {
-        CLI::App app;
-        int status = 0;
-        cli::AddCommands(app, status);
-        std::reverse(arguments.begin(), arguments.end());
-        testing::internal::CaptureStdout();
-        testing::internal::CaptureStderr();
-        try {
-            app.parse(arguments);
-        } catch (const std::runtime_error&) {  // wrong usage, or what the program itself refuses
-            status = 2;
-        }
-        testing::internal::GetCapturedStderr();
-        out_ = testing::internal::GetCapturedStdout();
-        return status;
-    }
-
-    void fill() {
-        SqliteFile file(path_);
-        file.run("BEGIN; DELETE FROM logs");
-        for (int id = 1; id <= 300; ++id) {
-            Row& row = rows_[id];
-            std::generate(row.begin(), row.end(), [this] { return "x" + hostile_.argument(); });
-            char* insert = sqlite3_mprintf("INSERT INTO logs(id, host, prog, fac, msg) VALUES(%d, %Q, %Q, %Q, %Q)", id,
-                                           row[0].c_str(), row[1].c_str(), row[2].c_str(), row[3].c_str());
-            file.run(insert);
-            sqlite3_free(insert);
-        }
-        file.run("COMMIT");
-    }
-
-    // The rows whose field holds the value, or is the value.
-    Strings idsOf(size_t field, const std::string& value) const {
-        Strings ids;
-        for (const auto& [id, row] : rows_) {
-            if (field == 3 ? row[field].find(value) != std::string::npos : row[field] == value) {
-                ids.push_back(std::to_string(id));
-            }
-        }
-        return ids;
-    }
-
-    std::map<int, Row> rows_;
-    std::string out_;
-};
-
-TEST_F(InjectionQuorlog, FiltersFindAndDeleteTheirRowsAlone) {
-    constexpr const char* options[] = {"--host=", "--program=", "--facility=", "--keyword="};
-    for (int i = 0; i < 4000; ++i) {
-        if (rows_.size() < 200) {
-            fill();
-        }
-        const size_t kind = hostile_.number(4);
-        const auto any = std::next(rows_.begin(), static_cast<long>(hostile_.number(rows_.size())));
-        const std::string value = i % 2 == 0 ? any->second[kind] : "x" + hostile_.argument();
-        const Strings ids = idsOf(kind, value);
-        if (i % 7 != 0) {
-            ASSERT_EQ(quorlog({"search", "--format=ndjson", "--db=" + path_, options[kind] + value}), ids.empty());
-            ASSERT_EQ(std::count(out_.begin(), out_.end(), '\n'), static_cast<long>(ids.size())) << value;
-            for (const std::string& id : ids) {
-                ASSERT_NE(out_.find("{\"id\":" + id + ","), std::string::npos) << value;
-            }
-            ASSERT_EQ(TakeActions(), Actions()) << value;
-            continue;
-        }
-        const bool refused = kind == 3 && value.find_first_of("*?\xff\xc3\xef") != std::string::npos;
-        ASSERT_EQ(quorlog({"delete", "--yes", "--db=" + path_, options[kind] + value}), refused ? 2 : ids.empty());
-        ASSERT_EQ(TakeActions(), refused || ids.empty() ? Actions() : Actions{"DELETE logs"}) << value;
-        for (const std::string& id : refused ? Strings() : ids) {
-            rows_.erase(std::stoi(id));
-        }
-        ASSERT_EQ(SqliteFile(path_).query("SELECT id FROM logs ORDER BY id"), idsOf(3, "")) << value;
-    }
-}
-
-// What has to be a number, a name, a pattern or a file is refused before a database is asked.
-TEST_F(InjectionQuorlog, RefusesWhatIsNone) {
-    const std::list<std::string> calls = Tokenize(
-        "search --level=|search --from=|search --to=|search --before=|search --glob=\xff|count --table=|count "
-        "--limit=|count --db=|delete --yes --level=|values |values host --offset=|names |events list --limit=|"
-        "events list --db=|events clear --yes --db=|stats eps --last=|stats top --db=|db info --db=|db wal --db=|"
-        "db limit --yes |db create --db=\"$(",
-        "|");
-    for (const std::string& call : calls) {
-        for (int i = 0; i < 100; ++i) {
-            std::list<std::string> words = Tokenize(call, " ");
-            words.back() += "'" + hostile_.argument();
-            ASSERT_EQ(quorlog({words.begin(), words.end()}), 2) << call << words.back();
-            ASSERT_EQ(TakeActions(), Actions()) << call << words.back();
-        }
-    }
 }
 
 }  // namespace
