@@ -1,5 +1,7 @@
 #include "store/ask.h"
 
+#include <unistd.h>
+
 #include "common/errorcode.h"
 #include "common/handles.h"
 #include "store/failure.h"
@@ -35,9 +37,9 @@ const char* adviceFor(Cause cause) {
     case Cause::Damaged:
         return "run quorlog db check on it";
     case Cause::Busy:
-        return "try again, another program holds it";
+        return "another program is using it; try again";
     case Cause::Denied:
-        return "see that you may read and write it and its folder";
+        return "make sure that you may read and write it and its folder";
     default:
         return "see the system log";
     }
@@ -48,7 +50,9 @@ const char* adviceFor(Cause cause) {
 std::vector<std::string> Ask(const std::string& db, const std::string& sql, const char* column) {
     const Connection connection(QUORDBConnect(nullptr, nullptr, nullptr, db.c_str()));
     if (connection == nullptr) {
-        throw Failure("cannot open " + db + "; see that it is a database that you may read", Cause::Denied);
+        const bool missing = access(db.c_str(), F_OK) != 0;
+        throw Failure("cannot open " + db + "; make sure that it is a database and that you may read it",
+                      missing ? Cause::Missing : Cause::Denied);
     }
     Result result;
     if (QUORDBExecute(connection.get(), sql.c_str(), Adopt(result)) < 0) {

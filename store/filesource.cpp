@@ -1,4 +1,5 @@
 // One log database, read through the library.
+#include <fcntl.h>
 #include <sys/stat.h>
 
 #include "store/ask.h"
@@ -71,13 +72,20 @@ class FileSource : public Source {
         std::string db = path_;
         Conditions doomed = conditions;
         if (SyslogDBDelete(db, doomed) < 0) {
-            throw Failure("cannot delete from " + path_ + "; see that you may write it, and try again", Cause::Denied);
+            (void)Ask(path_, "DELETE FROM logs WHERE 0", "");
+            throw Failure("cannot delete from " + path_ + "; see the system log", Cause::Other);
         }
     }
 
+    // The number of a removed file is soon given to another one; the time when it was made tells them apart.
     uint64_t identity() const override {
-        struct stat status = {};
-        return stat(path_.c_str(), &status) == 0 ? static_cast<uint64_t>(status.st_ino) : 0;
+        struct statx status = {};
+        if (statx(AT_FDCWD, path_.c_str(), 0, STATX_INO | STATX_BTIME, &status) != 0) {
+            return 0;
+        }
+        constexpr uint64_t kSpread = 1000000007;
+        const auto seconds = static_cast<uint64_t>(status.stx_btime.tv_sec);
+        return (status.stx_ino * kSpread + seconds) * kSpread + status.stx_btime.tv_nsec;
     }
 
     const std::string& name() const override { return path_; }

@@ -45,7 +45,7 @@ void checkColumns(const FilterOptions& options, const std::string& table) {
 void checkNames(const char* option, const std::string& names) {
     const std::list<std::string> list = Tokenize(names, ",");
     if (list.size() > 1 && std::find(list.begin(), list.end(), "any") != list.end()) {
-        throw Failure(std::string(option) + ": 'any' stands for every name; give it alone or leave it out");
+        throw Failure(std::string(option) + ": 'any' means every name; give it alone or leave it out");
     }
     if (std::find(list.begin(), list.end(), "") != list.end()) {
         throw Failure(std::string(option) + ": empty name in '" + names + "'; separate names with one comma");
@@ -128,7 +128,7 @@ void check(const FilterOptions& options, const std::string& table) {
         throw Failure("the text to search for is too long; give at most " + std::to_string(kMaxPattern) + " bytes");
     }
     if (!comparesExactly(options.glob)) {
-        throw Failure("--glob: the pattern holds bytes that are not UTF-8; give --keyword, which takes any");
+        throw Failure("--glob: the pattern is not UTF-8; give --keyword, which takes any bytes");
     }
 }
 

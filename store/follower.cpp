@@ -30,20 +30,34 @@ void Follower::last(uint64_t rows, const RecordHandler& handler) const {
 void Follower::poll(const RecordHandler& handler) {
     const uint64_t identity = source_.identity();
     const bool replaced = identity != identity_;
+    uint64_t newest = 0;
+    try {
+        newest = LargestId(source_, selection_.table);
+    } catch (const Failure& failure) {
+        if (replaced && failure.cause() == Cause::Missing) {
+            return;  // the new one is about to be made
+        }
+        throw;
+    }
     if (replaced) {
+        identity_ = identity;
         after_ = 0;
     }
-    try {
-        SelectAfter(source_, selection_, after_, [&](const _SYSLOG_LOG_DATA_tag& record) {
-            after_ = record.id;
-            handler(record);
-        });
-        identity_ = identity;
-    } catch (const Failure&) {
-        if (!replaced) {
-            throw;
-        }
+    deliver(newest, handler);
+}
+
+// Every row up to the newest is done with, whether the filter takes it or not: the next look begins behind it.
+void Follower::deliver(uint64_t newest, const RecordHandler& handler) {
+    if (newest <= after_) {
+        return;
     }
+    Selection arrived = selection_;
+    arrived.filter.conditions.push_back(IdCondition(SYSLOG_OP_AT_MOST, newest));
+    SelectAfter(source_, arrived, after_, [&](const _SYSLOG_LOG_DATA_tag& record) {
+        after_ = record.id;
+        handler(record);
+    });
+    after_ = newest;
 }
 
 }  // namespace quor::store

@@ -8,19 +8,21 @@
 
 namespace quor::store {
 
-// Stands after the newest row of the moment when it was made, and goes on from there.
+// Begins after the row that is the newest when it is made, and goes on from there.
 class Follower {
   public:
-    // Limit, offset and order of the selection do not count. `source` must outlive this.
+    // Limit, offset and order of the selection are ignored. `source` must outlive this.
     Follower(const Source& source, Selection selection);
 
-    // Hands over the last `rows` (0: all) that were there at the beginning, oldest first.
+    // Hands over the last `rows` (0: all) of those that were there at the beginning, oldest first.
     void last(uint64_t rows, const RecordHandler& handler) const;
-    // Hands over what has arrived since the last look, oldest first. Rows that took the place of those before (the
-    // database was removed and begun anew) are all new; while a new one has no table yet, nothing has arrived.
+    // Hands over what has arrived since the last look, oldest first. When the database was replaced, every row of the
+    // new one has arrived. While there is no database, or one without the table, nothing has.
     void poll(const RecordHandler& handler);
 
   private:
+    void deliver(uint64_t newest, const RecordHandler& handler);
+
     const Source& source_;
     Selection selection_;
     uint64_t identity_;

@@ -21,7 +21,7 @@ struct Window {
     uint64_t offset = 0;
 };
 
-// Every question is answered from the state of that moment, and fails with a Failure that says why.
+// Every question is answered from the state of that moment. One that cannot be answered throws a Failure.
 class Source {
   public:
     Source() = default;
@@ -29,20 +29,20 @@ class Source {
     Source& operator=(const Source&) = delete;
     virtual ~Source() = default;
 
-    // Hands over the rows that meet all conditions, by id, all of them held in memory at once. Returns their number.
-    // Limit and offset have 32 bits.
+    // Hands over the rows that meet all conditions, in the order of their ids, and returns their number. They are all
+    // held in memory at once. Of limit and offset the low 32 bits count.
     virtual uint64_t read(const std::string& table, const Conditions& conditions, const Window& window, bool ascending,
                           const RecordHandler& handler) const = 0;
     // Counts the rows that meet all conditions.
     virtual uint64_t count(const std::string& table, const Conditions& conditions) const = 0;
-    // The distinct values of an attribute of table logs, ascending.
+    // The distinct values of an attribute of table logs, ascending. Of limit and offset the low 32 bits count.
     virtual std::list<std::string> values(_SYSLOG_DB_ATTRI_tag attribute, const Window& window) const = 0;
     // Deletes the rows of table logs that meet all conditions: every row when there is none.
     virtual void remove(const Conditions& conditions) const = 0;
 
-    // Another one as soon as other rows have taken the place of those that were here; 0 while there are none.
+    // A number of these rows as a whole: another one as soon as others have taken their place, 0 while there are none.
     virtual uint64_t identity() const = 0;
-    // How people know it.
+    // What people call it.
     virtual const std::string& name() const = 0;
 };
 

@@ -102,7 +102,7 @@ TEST_F(Commands, WrongUsageAndFailuresAreOneLineThatHelps) {
             {"nosuch --db x", 2, "", "no such command 'nosuch'; see quorlog --help-all"},
             {"search --table transfer_log --keyword x", 2, "", "--keyword: table transfer_log has no column for it"},
             {"search --host a --host ''", 2, "", "empty name in 'a,'"},
-            {"search --program a,any", 2, "", "'any' stands for every name"},
+            {"search --program a,any", 2, "", "'any' means every name"},
             {"search --level warn", 2, "", "no such level 'warn'"},
             {"search --from 2026-02-02 --to 2026-02-01", 2, "", "--from 2026-02-02 is after --to 2026-02-01"},
             {"search --glob $(printf '%15001s' | tr ' ' '[')", 2, "", "too long"},

@@ -17,13 +17,13 @@ TEST_F(Reports, StatisticsCountAndRate) {
         "(3, 1767225604, 'b', 2), (4, 1767312000, 'a', 1)");
     expect({
         {"stats total --db acc.db", 0, "count  9000000021\n"},
-        {"stats device --db acc.db nobody", 1, "device  nobody\ncount   0\n", "no log was counted"},
+        {"stats device --db acc.db nobody", 1, "device  nobody\ncount   0\n", "no logs were counted"},
         {"stats top --limit 3 --db acc.db", 0,
          "     COUNT  DEVICE\n9000000000  b\n         9  c\n         7  O'Neil\n"},
         {"stats eps --from 2026-01-01 --to 2026-01-01 --format ndjson --db acc.db", 0,
          "{\"stamp\":1767225600,\"logs\":6,\"seconds\":null,\"per_second\":null}\n"
          "{\"stamp\":1767225604,\"logs\":3,\"seconds\":4,\"per_second\":0.75}\n"},
-        {"stats eps --db acc.db --last 5s", 1, "", "no sample from"},
+        {"stats eps --db acc.db --last 5s", 1, "", "no samples from"},
         {"stats eps --db acc.db --last 5w", 2, "", "give 90s, 10m, 6h or 2d"},
         {"stats total --db none.db", 2, "", "start quorlogd"},
     });
@@ -55,7 +55,7 @@ TEST_F(Reports, EventsAreListedExportedAndCleared) {
          "{\"id\":1,\"time\":1767225600,\"level\":\"Information\",\"user\":\"SYSTEM\",\"event\":\"<b>\"}\n"},
         {"events clear --db log.db", 2, "", "give --yes"},
         {"events clear --yes --db \"it's.db\"", 2, "", "apostrophe"},
-        {"events html page --db \"it's.db\"", 1, "", "no event"},
+        {"events html page --db \"it's.db\"", 1, "", "no events"},
     });
     EXPECT_EQ(run("events html page --safe --db log.db").status, 0);
     const std::string page = ReadFile(folder_.path("page"));
@@ -69,13 +69,14 @@ TEST_F(Reports, RulesAreSetListedAndTested) {
     WriteFile(rules, "");
     std::filesystem::remove(rules);
     expect({
-        {"rules list", 1, "", "no rule is set"},
+        {"rules list", 1, "", "no rules are set"},
         {"rules set worst --level crit", 0, "set rule worst: severity crit\n"},
         {"rules set many --eps 50", 0, "set rule many: eps 50\n"},
         {"rules set word --keyword 'a \"b\" 100%'", 0, "set rule word: keyword a \"b\" 100%\n"},
         {"rules set many --disable", 0, "set rule many: eps 50, disabled\n"},
         {"rules set 'x]' --eps 1", 2, "", "cannot be used"},
-        {"rules set x --keyword 'a\nb=\"c\"'", 2, "", "line break"},
+        {"rules set 'x\ty' --eps 1", 2, "", "the name 'x\\ty' cannot be used"},
+        {"rules set x --keyword 'a\nb=\"c\"'", 2, "", "line breaks"},
         {"rules list --format csv", 0,
          "name,type,threshold,enabled\r\nworst,severity,crit,yes\r\nmany,eps,50,no\r\n"
          "word,keyword,\"a \"\"b\"\" 100%\",yes\r\n"},
@@ -105,7 +106,12 @@ TEST_F(Reports, DatabasesAreCheckedSwitchedAndLimited) {
     std::string damaged = ReadFile(folder_.path("a b.db"));
     std::fill(damaged.begin() + 8192, damaged.begin() + 12288, 'x');
     folder_.write("bad.db", damaged);
-    expect({{"db check --db bad.db", 2, "", "quorlog db salvage"}});
+    SqliteFile lock = database("db check.db");
+    lock.run("CREATE TABLE logs(id); BEGIN EXCLUSIVE");
+    expect({
+        {"db check --db bad.db", 2, "", "bad.db is damaged; stop syslog-ng"},
+        {"db check --db 'db check.db'", 2, "", "db check.db: database is locked; another program is using it"},
+    });
 }
 
 TEST_F(Reports, EntriesAreParsedAndBadLinesNamed) {
@@ -115,7 +121,7 @@ TEST_F(Reports, EntriesAreParsedAndBadLinesNamed) {
                            "0,2026-01-01,10:00:00,0,+00:00,h,ip,kern,debug,t,p,\" m\"\r\n");
     EXPECT_EQ(outcome.status, 2);
     EXPECT_EQ(outcome.err, "quorlog: line 1: fewer than twelve fields\n"
-                           "quorlog: 1 of 2 lines were not entries; see the template that writes them\n");
+                           "quorlog: 1 of 2 lines were not entries; check the template that writes them\n");
 }
 
 }  // namespace

@@ -30,7 +30,7 @@ bool Confirm(const std::string& question) {
     std::string answer;
     if (!std::getline(std::cin, answer)) {
         std::cerr << '\n';
-        throw store::Failure("no answer on standard input; give --yes to do it without a question");
+        throw store::Failure("no answer on standard input; give --yes to go ahead without one");
     }
     return answer == "y" || answer == "yes";
 }

@@ -55,26 +55,28 @@ void AddTableOption(CLI::App& command, std::string& table) {
 
 void AddFilterOptions(CLI::App& command, store::FilterOptions& filters) {
     addList(command, "--host", filters.host, "Sending hosts");
-    addList(command, "--level", filters.level, "Levels: err, crit; err+ is err and worse");
-    addList(command, "--facility", filters.facility, "Facilities: kern, auth");
+    addList(command, "--level", filters.level, "Levels, such as err,crit; err+ is err and worse");
+    addList(command, "--facility", filters.facility, "Facilities, such as kern,auth");
     addList(command, "--program", filters.program, "Programs");
     CLI::Option* keyword = addFilter(command, "--keyword", filters.keyword, "TEXT", "Messages that contain the text");
-    addFilter(command, "--glob", filters.glob, "PATTERN", "Whole messages; * any text, ? any character")
+    addFilter(command, "--glob", filters.glob, "PATTERN",
+              "Messages like this as a whole; * is any text, ? any character")
         ->excludes(keyword);
     addFilter(command, "--from", filters.from, "DATE", "First day: YYYY-MM-DD, today, yesterday, 7d");
-    addFilter(command, "--to", filters.to, "DATE", "Last day");
+    addFilter(command, "--to", filters.to, "DATE", "Last day, inclusive");
 }
 
 void AddOutputOptions(CLI::App& command, OutputOptions& output) {
-    command.add_option("--format", output.format, "Form of the output: table, json, csv, ndjson")
+    command.add_option("--format", output.format, "Output format: table, json, csv, ndjson")
         ->type_name("NAME")
         ->capture_default_str()
         ->check(namesOf(kFormatNames));
-    command.add_flag("--safe-csv", output.safeCsv, "csv: put ' before cells that a spreadsheet takes for a formula");
+    command.add_flag("--safe-csv", output.safeCsv,
+                     "csv: put ' before cells that a spreadsheet would take for a formula");
 }
 
 void AddYesOption(CLI::App& command, bool& yes) {
-    command.add_flag("--yes", yes, "Do not ask");
+    command.add_flag("--yes", yes, "Do not ask for confirmation");
 }
 
 CLI::Option* AddNumberOption(CLI::App& command, const std::string& name, uint64_t& value, const std::string& help) {

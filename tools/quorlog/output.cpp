@@ -121,7 +121,7 @@ void Output::flush() {
             const std::string cause = strerror(errno);
             buffer_.clear();
             throw store::Failure("cannot write the output: " + cause +
-                                     "; see that its reader runs and its disk has room",
+                                     "; make sure that its reader is running and its disk has room",
                                  store::Cause::Other);
         }
         rest.remove_prefix(static_cast<size_t>(written));

@@ -27,7 +27,7 @@ void setup(CLI::App& command, CountOptions& options) {
     AddFilterOptions(command, options.filters);
     AddOutputOptions(command, options.output);
     command.add_flag("--estimate", options.estimate,
-                     "The largest id instead of a count: at once, but too large after deletions");
+                     "Print the largest id instead: immediate, but too large after deletions");
 }
 
 int run(const CountOptions& options) {

@@ -31,7 +31,7 @@ void setupInfo(CLI::App& command, DbOptions& options) {
 
 void connect(DbSession& session, const std::string& path) {
     if (!session.connect()) {
-        throw Failure("cannot open " + path + "; see that you may read and write it and its folder",
+        throw Failure("cannot open " + path + "; make sure that you may read and write it and its folder",
                       store::Cause::Denied);
     }
 }
@@ -86,7 +86,7 @@ int runCheckpoint(const DbOptions& options) {
     DbSession session(db, paths::kLogSchema);
     connect(session, db);
     if (session->DBWalCheckpoint(false) != 0) {
-        throw Failure("cannot move the write-ahead log into " + db + "; try again when no program reads it");
+        throw Failure("cannot move the write-ahead log into " + db + "; try again when no other program is reading it");
     }
     WriteLine("moved the write-ahead log into " + db);
     return kDone;
@@ -98,7 +98,7 @@ void AddDb(CLI::App& app, int& status) {
     CLI::App& db = *app.add_subcommand("db", "Create and look after log databases");
     db.require_subcommand(1);
     AddCommand<DbOptions>(db, "create", "Create an empty log database", status, setup, runCreate);
-    AddCommand<DbOptions>(db, "info", "Size, rows and dates of a log database", status, setupInfo, runInfo);
+    AddCommand<DbOptions>(db, "info", "Print the size, rows and dates of a log database", status, setupInfo, runInfo);
     AddCommand<DbOptions>(db, "checkpoint", "Move the write-ahead log into the database", status, setup, runCheckpoint);
     AddDbSalvage(db, status);
     AddDbCheck(db, status);

@@ -22,7 +22,7 @@ struct CareOptions {
 
 void setupCheck(CLI::App& command, CareOptions& options) {
     AddDatabaseOption(command, options.db);
-    command.add_flag("--full", options.full, "Compare indexes with their tables, too: much slower");
+    command.add_flag("--full", options.full, "Compare indexes with their tables, too; much slower");
 }
 
 void setupWal(CLI::App& command, CareOptions& options) {
@@ -30,7 +30,7 @@ void setupWal(CLI::App& command, CareOptions& options) {
 }
 
 void setupLimit(CLI::App& command, CareOptions& options) {
-    AddNumberOption(command, "kilobytes", options.kilobytes, "The size that is allowed")->required();
+    AddNumberOption(command, "kilobytes", options.kilobytes, "The largest size allowed")->required();
     AddDatabaseOption(command, options.db);
     AddYesOption(command, options.yes);
 }
@@ -71,21 +71,21 @@ int runWal(const CareOptions& options) {
     RequirePlainPath(db, Quoting::None);
     const bool ran = SyslogngWorkingDbSetJouWal(db) == 0;
     if (!ran || store::Ask(db, "PRAGMA journal_mode", "journal_mode") != std::vector<std::string>{"wal"}) {
-        throw Failure("cannot switch " + db + " to write-ahead journaling; try again when no program uses it");
+        throw Failure("cannot switch " + db + " to a write-ahead log; try again when no program uses it");
     }
-    WriteLine(db + " journals ahead");
+    WriteLine(db + " now has a write-ahead log");
     return kDone;
 }
 
 int runLimit(const CareOptions& options) {
     const std::string db = store::RequireLogDatabase(options.db);
     const uint64_t kilobytes = std::filesystem::file_size(db) / 1024;
-    const std::string size = db + " has " + std::to_string(kilobytes) + " KiB";
+    const std::string size = db + " takes " + std::to_string(kilobytes) + " KiB";
     if (options.kilobytes > INT32_MAX || kilobytes <= options.kilobytes) {
         WriteLine(size + ", which is allowed");
         return kDone;
     }
-    if (!options.yes && !Confirm(size + ". Remove it with all its rows, and have syslog-ng begin a new one?")) {
+    if (!options.yes && !Confirm(size + ". Remove it with all its rows, and have syslog-ng start a new one?")) {
         Complain("nothing removed");
         return kNothing;
     }
@@ -99,8 +99,8 @@ int runLimit(const CareOptions& options) {
 }  // namespace
 
 void AddDbCheck(CLI::App& db, int& status) {
-    AddCommand<CareOptions>(db, "check", "Look for damage in a database", status, setupCheck, runCheck);
-    AddCommand<CareOptions>(db, "wal", "Switch a database to write-ahead journaling", status, setupWal, runWal);
+    AddCommand<CareOptions>(db, "check", "Check a database for damage", status, setupCheck, runCheck);
+    AddCommand<CareOptions>(db, "wal", "Switch a database to a write-ahead log", status, setupWal, runWal);
     AddCommand<CareOptions>(db, "limit", "Remove a database that has grown too large", status, setupLimit, runLimit);
 }
 

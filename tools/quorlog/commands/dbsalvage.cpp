@@ -67,7 +67,7 @@ int run(const SalvageOptions& options) {
     WriteRecord(options.output.style(),
                 {{"path", fresh},
                  {"tables", tables},
-                 {"definitions", report.schemaRead != 0 ? "of the damaged file" : "of the package"},
+                 {"definitions", report.schemaRead != 0 ? "from the damaged file" : "from the package"},
                  number("rows", rows),
                  number("pages", report.pages),
                  number("bad_pages", report.badPages),

@@ -20,7 +20,7 @@ struct DeleteOptions {
 void setup(CLI::App& command, DeleteOptions& options) {
     AddDatabaseOption(command, options.db);
     AddFilterOptions(command, options.filters);
-    command.add_flag("--all", options.all, "Delete every row: needed when there is no filter");
+    command.add_flag("--all", options.all, "Delete every row; needed when no filter is given");
     AddYesOption(command, options.yes);
 }
 
@@ -30,7 +30,7 @@ store::Filter filterOf(const DeleteOptions& options) {
     const bool filtered = !filter.conditions.empty();
     if (!filter.literal.empty()) {
         throw Failure("--keyword: rows cannot be deleted by a text with * or ?, or one that is not UTF-8; give --glob, "
-                      "where * and ? match any text");
+                      "where * and ? are wildcards");
     }
     if (filtered == options.all) {
         throw Failure(filtered ? "--all deletes every row; leave out the filters or --all"

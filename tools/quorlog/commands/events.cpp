@@ -30,14 +30,14 @@ struct EventsOptions {
 void setupList(CLI::App& command, EventsOptions& options) {
     AddDatabaseOption(command, options.db);
     AddOutputOptions(command, options.output);
-    AddNumberOption(command, "--limit", options.limit, "Events wanted, 0 for all");
-    AddNumberOption(command, "--offset", options.offset, "Events skipped");
+    AddNumberOption(command, "--limit", options.limit, "Number of events, 0 for all");
+    AddNumberOption(command, "--offset", options.offset, "Number of events to skip");
 }
 
 void setupHtml(CLI::App& command, EventsOptions& options) {
     command.add_option("file", options.page, "The page to write")->type_name("FILE")->required();
     AddDatabaseOption(command, options.db);
-    command.add_flag("--safe", options.safe, "Escape texts, so that an event cannot carry markup of its own");
+    command.add_flag("--safe", options.safe, "Escape texts, so that an event cannot bring its own markup");
 }
 
 void setupClear(CLI::App& command, EventsOptions& options) {
@@ -73,14 +73,14 @@ int runList(const EventsOptions& options) {
         sink->row({id, time, strLevelGet(event.level), event.user, event.event});
     }
     sink->finish();
-    return events.empty() ? ReportNothing("no event was recorded") : kDone;
+    return events.empty() ? ReportNothing("no events were recorded") : kDone;
 }
 
 int runHtml(const EventsOptions& options) {
     const std::string db = requireEvents(options.db);
     const std::string page = store::AbsolutePath(options.page);
     if (Logger().LogCount(db) == 0) {
-        return ReportNothing("no event was recorded");
+        return ReportNothing("no events were recorded");
     }
     if (options.safe) {
         WriteEventPage(Logger().LogEnum(db, 0, 0), page);
@@ -110,7 +110,7 @@ int runClear(const EventsOptions& options) {
     const int before = Logger().LogCount(db);
     Logger().LogClear(db, user);
     if (std::filesystem::exists(db) && Logger().LogCount(db) > 1 && Logger().LogCount(db) >= before) {
-        throw Failure("cannot clear " + db + "; see that you may write its folder");
+        throw Failure("cannot clear " + db + "; make sure that you may write its folder");
     }
     WriteLine("cleared " + db);
     return kDone;

@@ -45,7 +45,7 @@ int run(const NamesOptions& options) {
         sink->row({std::to_string(key), name});
     }
     sink->finish();
-    return names.empty() ? ReportNothing("no value in " + db) : kDone;
+    return names.empty() ? ReportNothing("no names in " + db) : kDone;
 }
 
 }  // namespace

@@ -1,5 +1,4 @@
 // notify test.
-
 #include "base/paths.h"
 #include "quor/quornotify.h"
 #include "tools/quorlog/commands/commands.h"
@@ -37,7 +36,7 @@ int run(const OutputOptions& options) {
         throw Failure(std::to_string(deliveries.failed) + " of " + std::to_string(tried) +
                       " channels failed; correct their settings in " + paths::kSystemSettings);
     }
-    return tried == 0 ? ReportNothing(std::string("no channel is configured in ") + paths::kSystemSettings) : kDone;
+    return tried == 0 ? ReportNothing(std::string("no channels are configured in ") + paths::kSystemSettings) : kDone;
 }
 
 }  // namespace

@@ -1,4 +1,4 @@
-// parse: text entries to records.
+// parse: text entries become rows.
 #include "parser.h"
 
 #include <iostream>
@@ -47,7 +47,7 @@ int run(const OutputOptions& options) {
     sink.finish();
     if (tally.bad != 0) {
         throw Failure(std::to_string(tally.bad) + " of " + std::to_string(tally.line) +
-                      " lines were not entries; see the template that writes them");
+                      " lines were not entries; check the template that writes them");
     }
     return tally.line == 0 ? kNothing : kDone;
 }
@@ -55,7 +55,7 @@ int run(const OutputOptions& options) {
 }  // namespace
 
 void AddParse(CLI::App& app, int& status) {
-    AddCommand<OutputOptions>(app, "parse", "Text entries on standard input to records", status, setup, run);
+    AddCommand<OutputOptions>(app, "parse", "Turn text entries on standard input into rows", status, setup, run);
 }
 
 }  // namespace quor::cli

@@ -6,6 +6,7 @@
 #include "common/handles.h"
 #include "notification.h"
 #include "tools/quorlog/commands/commands.h"
+#include "tools/quorlog/display.h"
 #include "tools/quorlog/messages.h"
 #include "tools/quorlog/options.h"
 
@@ -23,7 +24,7 @@ std::vector<std::string> ruleNames() {
     StringList list(QLIBCSzListAlloc(16));
     std::vector<std::string> names;
     if (QLIBCFileExist(paths::kNotifyRules) == 1 && QLIBCFileEnumSection(paths::kNotifyRules, Adopt(list)) < 0) {
-        throw Failure("cannot read " + kFile + "; see that you may");
+        throw Failure("cannot read " + kFile + "; make sure that you may");
     }
     names.assign(list->items, list->items + list->count);
     return names;
@@ -67,10 +68,10 @@ int runList(const OutputOptions& options) {
     sink->finish();
     if (!bad.empty()) {
         throw Failure("rule '" + bad + "' of " + kFile +
-                      " lacks a key, which ends the loading of rules; "
+                      " lacks a key, and no rule after it is loaded; "
                       "repair it with quorlog rules set");
     }
-    return names.empty() ? ReportNothing("no rule is set") : kDone;
+    return names.empty() ? ReportNothing("no rules are set") : kDone;
 }
 
 struct SetOptions {
@@ -87,11 +88,11 @@ CLI::Option* addLevel(CLI::App& command, std::string& level, const std::string& 
 }
 
 void setupSet(CLI::App& command, SetOptions& options) {
-    command.add_option("name", options.name, "Name of the rule, new or known")->type_name("NAME")->required();
-    CLI::Option* level = addLevel(command, options.level, "Notify of this level and worse");
+    command.add_option("name", options.name, "Name of the rule, which may be new")->type_name("NAME")->required();
+    CLI::Option* level = addLevel(command, options.level, "Notify of logs of this level or worse");
     CLI::Option* keyword =
         command.add_option("--keyword", options.keyword, "Notify of messages that contain the text")->type_name("TEXT");
-    AddNumberOption(command, "--eps", options.eps, "Notify of samples of this many logs and more")
+    AddNumberOption(command, "--eps", options.eps, "Notify of samples with this many logs or more")
         ->excludes(level)
         ->excludes(keyword);
     keyword->excludes(level);
@@ -102,12 +103,12 @@ void setupSet(CLI::App& command, SetOptions& options) {
 void checkTexts(const SetOptions& options) {
     const std::string& name = options.name;
     const bool odd = name.empty() || name.front() == ' ' || name.back() == ' ' ||
-                     name.find_first_of("[]\"#;=") != std::string::npos || name != name;
+                     name.find_first_of("[]\"#;=") != std::string::npos || Visible(name) != name;
     if (odd) {
         throw Failure("the name '" + name + "' cannot be used; give letters, digits and single blanks");
     }
     if (options.keyword.find_first_of("\r\n") != std::string::npos) {
-        throw Failure("--keyword: a rule holds one line; give a text without a line break");
+        throw Failure("--keyword: a rule holds one line; give a text without line breaks");
     }
     if (options.eps > INT64_MAX) {
         throw Failure("--eps: too large; give fewer digits");
@@ -142,7 +143,7 @@ int runSet(const SetOptions& options) {
     }
     apply(options, rule);
     if (SyslogNotifyConfSet(kFile, options.name, rule) < 0) {
-        throw Failure("cannot write " + kFile + "; see that its folder exists and that you may write it");
+        throw Failure("cannot write " + kFile + "; make sure that its folder exists and that you may write it");
     }
     WriteLine("set rule " + options.name + ": " + typeName(rule) + " " + threshold(rule) +
               (rule.notify_enable ? "" : ", disabled"));
@@ -196,7 +197,7 @@ void AddRules(CLI::App& app, int& status) {
     rules.require_subcommand(1);
     AddCommand<OutputOptions>(rules, "list", "Print the rules", status, setupList, runList);
     AddCommand<SetOptions>(rules, "set", "Add or change a rule", status, setupSet, runSet);
-    AddCommand<TestOptions>(rules, "test", "Tell whether a log would be notified of", status, setupTest, runTest);
+    AddCommand<TestOptions>(rules, "test", "Tell whether a log would set off a notice", status, setupTest, runTest);
 }
 
 }  // namespace quor::cli

@@ -42,15 +42,16 @@ void setup(CLI::App& command, SearchOptions& options) {
     AddTableOption(command, options.table);
     AddFilterOptions(command, options.filters);
     AddOutputOptions(command, options.output);
-    AddNumberOption(command, "--limit", options.limit, "Rows wanted, 0 for all; a table shows 50 by default")
+    AddNumberOption(command, "--limit", options.limit, "Number of rows, 0 for all; a table shows 50 by default")
         ->each([&options](const std::string&) { options.limited = true; });
-    CLI::Option* offset = AddNumberOption(command, "--offset", options.offset, "Rows skipped");
-    CLI::Option* before = AddNumberOption(command, "--before", options.before,
-                                          "Only rows with an id below this: the last id of a page gives the next page");
+    CLI::Option* offset = AddNumberOption(command, "--offset", options.offset, "Number of rows to skip");
+    CLI::Option* before =
+        AddNumberOption(command, "--before", options.before,
+                        "Only rows with a smaller id: give the last id of a page to get the next page");
     CLI::Option* oldest = command.add_flag("--oldest", options.oldest, "Oldest rows first, instead of newest");
     CLI::Option* following = command.add_flag("--follow", options.follow, "Print new rows as they arrive, until ^C");
     following->excludes(offset)->excludes(oldest)->excludes(before);
-    AddNumberOption(command, "--interval", options.interval, "Seconds between two looks for new rows")
+    AddNumberOption(command, "--interval", options.interval, "Seconds between two checks for new rows")
         ->needs(following);
 }
 
@@ -70,7 +71,8 @@ store::Selection selectionOf(const SearchOptions& options) {
 // Waits for the next look at the database; ends on SIGINT and SIGTERM, and when the reader of the output has gone.
 class Ticker {
   public:
-    explicit Ticker(uint64_t seconds) : milliseconds_(static_cast<int>(std::min(seconds, kMaxSeconds) * 1000)) {
+    explicit Ticker(uint64_t seconds)
+        : milliseconds_(static_cast<int>(std::clamp(seconds, kMinSeconds, kMaxSeconds) * 1000)) {
         sigset_t ending;
         sigemptyset(&ending);
         sigaddset(&ending, SIGINT);
@@ -89,6 +91,7 @@ class Ticker {
     }
 
   private:
+    static constexpr uint64_t kMinSeconds = 1;
     static constexpr uint64_t kMaxSeconds = 86400;
 
     int milliseconds_;

@@ -31,20 +31,22 @@ void setup(CLI::App& command, StatsOptions& options) {
 }
 
 void setupDevice(CLI::App& command, StatsOptions& options) {
-    command.add_option("device", options.device, "Name of the device, as host")->type_name("NAME")->required();
+    command.add_option("device", options.device, "Name of the device, as in the column host")
+        ->type_name("NAME")
+        ->required();
     setup(command, options);
 }
 
 void setupTop(CLI::App& command, StatsOptions& options) {
     setup(command, options);
-    AddNumberOption(command, "--limit", options.limit, "Devices wanted, 0 for all; 10 by default");
+    AddNumberOption(command, "--limit", options.limit, "Number of devices, 0 for all; 10 by default");
 }
 
 void setupEps(CLI::App& command, StatsOptions& options) {
     setup(command, options);
-    CLI::Option* last = command.add_option("--last", options.last, "The time before now: 90s, 10m, 6h, 2d");
+    CLI::Option* last = command.add_option("--last", options.last, "How far to look back: 90s, 10m, 6h, 2d");
     last->type_name("SPAN")->capture_default_str();
-    command.add_option("--from", options.from, "First day, instead: YYYY-MM-DD, today, yesterday, 7d")
+    command.add_option("--from", options.from, "First day, instead of --last: YYYY-MM-DD, today, yesterday, 7d")
         ->type_name("DATE")
         ->excludes(last);
     command.add_option("--to", options.to, "Last day")->type_name("DATE")->excludes(last);
@@ -64,7 +66,7 @@ int writeCount(const StatsOptions& options, const std::string& device, uint64_t 
         values.insert(values.begin(), {"device", device});
     }
     WriteRecord(options.output.style(), values, out);
-    return count == 0 ? ReportNothing("no log was counted") : kDone;
+    return count == 0 ? ReportNothing("no logs were counted") : kDone;
 }
 
 int runTotal(const StatsOptions& options) {
@@ -97,7 +99,7 @@ int runTop(const StatsOptions& options) {
         sink->row({std::to_string(count), device});
     }
     sink->finish();
-    return sorted.empty() ? ReportNothing("no log was counted") : kDone;
+    return sorted.empty() ? ReportNothing("no logs were counted") : kDone;
 }
 
 struct Span {
@@ -169,19 +171,20 @@ int runEps(const StatsOptions& options) {
     Output out(STDOUT_FILENO);
     writeSamples(samples, options.output.style(), out);
     return samples.empty()
-               ? ReportNothing("no sample from " + store::LocalTime(span.first) + " to " + store::LocalTime(span.last))
+               ? ReportNothing("no samples from " + store::LocalTime(span.first) + " to " + store::LocalTime(span.last))
                : kDone;
 }
 
 }  // namespace
 
 void AddStats(CLI::App& app, int& status) {
-    CLI::App& stats = *app.add_subcommand("stats", "Counts of received logs");
+    CLI::App& stats = *app.add_subcommand("stats", "Statistics of the received logs");
     stats.require_subcommand(1);
-    AddCommand<StatsOptions>(stats, "total", "Logs counted", status, setup, runTotal);
-    AddCommand<StatsOptions>(stats, "device", "Logs counted of one device", status, setupDevice, runDevice);
-    AddCommand<StatsOptions>(stats, "top", "Devices with the most logs", status, setupTop, runTop);
-    AddCommand<StatsOptions>(stats, "eps", "Samples of the log rate", status, setupEps, runEps);
+    AddCommand<StatsOptions>(stats, "total", "Print how many logs were counted", status, setup, runTotal);
+    AddCommand<StatsOptions>(stats, "device", "Print how many logs came from one device", status, setupDevice,
+                             runDevice);
+    AddCommand<StatsOptions>(stats, "top", "Print the devices with the most logs", status, setupTop, runTop);
+    AddCommand<StatsOptions>(stats, "eps", "Print samples of the log rate", status, setupEps, runEps);
 }
 
 }  // namespace quor::cli

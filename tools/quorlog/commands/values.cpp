@@ -1,4 +1,4 @@
-// values: what a filter can be given.
+// values: what there is to filter by.
 #include <unistd.h>
 
 #include "base/paths.h"
@@ -25,8 +25,8 @@ void setup(CLI::App& command, ValuesOptions& options) {
         ->required();
     AddDatabaseOption(command, options.db);
     AddOutputOptions(command, options.output);
-    AddNumberOption(command, "--limit", options.limit, "Values wanted, 0 for all");
-    AddNumberOption(command, "--offset", options.offset, "Values skipped");
+    AddNumberOption(command, "--limit", options.limit, "Number of values, 0 for all");
+    AddNumberOption(command, "--offset", options.offset, "Number of values to skip");
 }
 
 int run(const ValuesOptions& options) {
@@ -43,7 +43,7 @@ int run(const ValuesOptions& options) {
         sink->row({value});
     }
     sink->finish();
-    return values.empty() ? ReportNothing("no value in " + source->name()) : kDone;
+    return values.empty() ? ReportNothing("no values in " + source->name()) : kDone;
 }
 
 }  // namespace
