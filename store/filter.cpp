@@ -136,7 +136,10 @@ std::string datesInWords(const std::string& from, const std::string& to) {
     if (from == to) {
         return "is dated " + from;
     }
-    return "is dated" + (from.empty() ? "" : " from " + from) + (to.empty() ? "" : " to " + to);
+    if (to.empty()) {
+        return "is dated " + from + " or later";
+    }
+    return from.empty() ? "is dated " + to + " or earlier" : "is dated from " + from + " to " + to;
 }
 
 }  // namespace

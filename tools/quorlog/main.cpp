@@ -23,7 +23,7 @@ int fail(const std::string& text) {
 int parseFailed(const CLI::App& app, const CLI::ParseError& error) {
     if (error.get_exit_code() == 0) {
         app.exit(error);
-        return std::cout.flush() ? quor::cli::kDone : kFailed;
+        return std::cout.flush() ? quor::cli::kDone : fail("cannot write the help; make sure that its disk has room");
     }
     const bool unknown = app.get_subcommands().empty() && app.remaining_size() != 0;
     const std::string cause = unknown ? "no such command '" + app.remaining().front() + "'" : error.what();

@@ -101,7 +101,7 @@ void writeBelowEachOther(const std::vector<Value>& values, Output& out) {
     }
     for (const Value& value : values) {
         std::string& line = out.buffer().append(value.name);
-        line.append(width - strlen(value.name) + 2, ' ');
+        line.append(value.text.empty() ? 0 : width - strlen(value.name) + 2, ' ');
         AppendVisible(line, value.text);
         line += '\n';
     }

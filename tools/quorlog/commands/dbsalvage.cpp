@@ -76,7 +76,7 @@ int run(const SalvageOptions& options) {
                  number("duplicates", report.duplicates),
                  number("unknown_rows", report.unknownRows)},
                 out);
-    return rows > 0 ? kDone : kNothing;
+    return rows == 0 ? ReportNothing("no rows could be saved") : kDone;
 }
 
 }  // namespace

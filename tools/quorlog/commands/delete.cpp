@@ -3,6 +3,7 @@
 
 #include "base/paths.h"
 #include "store/selection.h"
+#include "store/whynothing.h"
 #include "tools/quorlog/commands/commands.h"
 #include "tools/quorlog/messages.h"
 #include "tools/quorlog/options.h"
@@ -43,16 +44,17 @@ int run(const DeleteOptions& options) {
     store::Selection selection;
     selection.filter = filterOf(options);
     const auto source = store::OpenSource(options.db);
-    const std::string count = std::to_string(Count(*source, selection));
-    if (count == "0") {
-        return ReportNothing("no row matches");
+    const uint64_t count = Count(*source, selection);
+    if (count == 0) {
+        return ReportNothing(WhyNothing(*source, selection, options.filters, 0));
     }
-    if (!options.yes && !Confirm("Delete " + count + " rows from " + source->name() + "?")) {
+    const std::string rows = std::to_string(count) + (count == 1 ? " row" : " rows");
+    if (!options.yes && !Confirm("Delete " + rows + " from " + source->name() + "?")) {
         Complain("nothing deleted");
         return kNothing;
     }
     source->remove(selection.filter.conditions);
-    WriteLine("deleted " + count + " rows");
+    WriteLine("deleted " + rows);
     return kDone;
 }
 

@@ -36,7 +36,7 @@ int run(const NamesOptions& options) {
     std::string db = store::RequireLogDatabase(options.db);
     std::map<unsigned long long, std::string> names;
     if (SyslogDBExtkeyMapGet(db, kKinds.at(options.kind), names) < 0) {
-        store::RequireTable(db, "logs");
+        (void)store::Ask(db, "SELECT " + options.kind + " FROM logs LIMIT 1", options.kind.c_str());
         throw Failure("cannot read the names from " + db + "; run quorlog db check on it", store::Cause::Other);
     }
     Output out(STDOUT_FILENO);

@@ -49,7 +49,7 @@ int run(const OutputOptions& options) {
         throw Failure(std::to_string(tally.bad) + " of " + std::to_string(tally.line) +
                       " lines were not entries; check the template that writes them");
     }
-    return tally.line == 0 ? kNothing : kDone;
+    return tally.line == 0 ? ReportNothing("standard input is empty") : kDone;
 }
 
 }  // namespace
