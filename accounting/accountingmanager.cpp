@@ -28,6 +28,9 @@ AccountingManager::AccountingManager() : index_(std::make_unique<DeviceIndex>())
 }
 
 AccountingManager::~AccountingManager() {
+    if (followsRows_) {
+        return;  // what was not written is counted again from the rows
+    }
     try {
         (void)AccoutingFlush2DB();  // reports its own failure
     } catch (const std::bad_alloc&) {
@@ -44,9 +47,7 @@ void AccountingManager::RulesReload() {
     notifier_ = NotificationManager();
 }
 
-int AccountingManager::LogInc(std::string device) {
-    ++totalCount_;
-    (void)CurEpsUpdate();  // cannot fail
+void AccountingManager::Count(const std::string& device) {
     DeviceIndex::Entry& entry = index_->at(device, histogram_);
     if (entry.sample != index_->openSample) {
         entry.sampleCount = &epsDeviceCount_[device];
@@ -57,16 +58,26 @@ int AccountingManager::LogInc(std::string device) {
     }
     ++curEps_;
     ++entry.row->count;
+}
+
+int AccountingManager::LogInc(std::string device) {
+    ++totalCount_;
+    (void)CurEpsUpdate();  // cannot fail
+    Count(device);
     return 0;
 }
 
 int AccountingManager::CurEpsUpdate() {
     const auto now = static_cast<long long>(time(nullptr));
-    if (now == epsStamp_ || curEps_ == 0) {
-        return 0;
+    if (now != epsStamp_ && curEps_ != 0) {
+        CloseSample(now);
     }
-    epsStamp_ = now;
-    epsList_.push_back({now, curEps_, {}});
+    return 0;
+}
+
+void AccountingManager::CloseSample(long long stamp) {
+    epsStamp_ = stamp;
+    epsList_.push_back({stamp, curEps_, {}});
     epsList_.back().devices.swap(epsDeviceCount_);
     ++index_->openSample;
     if (notifier_.CheckEps(curEps_)) {
@@ -75,7 +86,6 @@ int AccountingManager::CurEpsUpdate() {
         (void)Logger().LogAddNotifyEps(curEps_);  // reports its own failure
     }
     curEps_ = 0;
-    return 0;
 }
 
 unsigned long long AccountingManager::TotalCountGet() {

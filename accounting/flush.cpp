@@ -2,13 +2,15 @@
 #include <sys/stat.h>
 
 #include <algorithm>
+#include <map>
 #include <new>
+#include <vector>
 
 #include "accounting/deviceindex.h"
-#include "base/guards.h"
 #include "base/numbers.h"
 #include "base/paths.h"
 #include "common.h"
+#include "common/handles.h"
 #include "dbhandler/session.h"
 
 namespace {
@@ -115,6 +117,142 @@ int AccountingManager::AccoutingFlush2DB() {
     }
     epsList_.clear();
     return 0;
+}
+
+namespace {
+
+constexpr long long kOverlap = 5;  // seconds
+
+using Deltas = std::map<std::string, uint64_t>;
+
+Deltas countsOf(const Samples& samples) {
+    Deltas counts;
+    for (const SYSLOG_LOG_EPS& sample : samples) {
+        for (const auto& [device, count] : sample.devices) {
+            counts[device] += static_cast<uint64_t>(count);
+        }
+    }
+    return counts;
+}
+
+bool executeAll(DBHandler& db, const std::string& sql) {
+    if (db.DBExecute(sql) < 0) {
+        reportStatement(sql);
+        return false;
+    }
+    return true;
+}
+
+// Adds to what is there instead of replacing it: whatever was read at the start, or by whom it was changed since, no
+// count is lost.
+bool addCounts(DBHandler& db, const Deltas& counts) {
+    return std::all_of(counts.begin(), counts.end(), [&db](const auto& entry) {
+        return executeAll(db, toSql("INSERT INTO histogram VALUES(NULL, '%q', %q) "
+                                    "ON CONFLICT(device) DO UPDATE SET count = count + excluded.count;",
+                                    entry.first, quor::Decimal(entry.second)));
+    });
+}
+
+struct Positions {
+    const std::string& source;
+    uint64_t last;
+    uint64_t judged;
+};
+
+bool writePositions(DBHandler& db, const Positions& at) {
+    return executeAll(db, toSql("INSERT INTO followed VALUES('%q', %q, %q) ON CONFLICT(source) DO UPDATE SET "
+                                "last = max(last, excluded.last), judged = max(judged, excluded.judged);",
+                                at.source, quor::Decimal(at.last), quor::Decimal(at.judged)));
+}
+
+int readPositions(DBResult_tag* result, void* context) {
+    quor::Row row(result);
+    auto& found = *static_cast<std::vector<uint64_t>*>(context);
+    if (row.next()) {
+        found = {quor::ToUint64(row["last"]), quor::ToUint64(row["judged"])};
+    }
+    return 0;
+}
+
+}  // namespace
+
+int AccountingManager::RowInc(const std::string& device, long long second, unsigned long long id) {
+    const bool overlaps = second < rowSecond_ && rowSecond_ - second <= kOverlap;
+    const long long now = overlaps ? rowSecond_ : second;  // else the clock was set back
+    if (now != rowSecond_) {
+        CloseRows();
+    }
+    followsRows_ = true;
+    rowSecond_ = now;
+    lastRow_ = id;
+    ++totalCount_;
+    Count(device);
+    return 0;
+}
+
+void AccountingManager::CloseRows() {
+    if (curEps_ != 0) {
+        CloseSample(rowSecond_);
+    }
+    closedRow_ = lastRow_;
+}
+
+int AccountingManager::RowsUpdate(long long now) {
+    if (now > rowSecond_ || rowSecond_ - now > kOverlap) {
+        CloseRows();
+    }
+    return 0;
+}
+
+unsigned long long AccountingManager::RowsWaiting() {
+    unsigned long long counts = 0;
+    for (const SYSLOG_LOG_EPS& sample : epsList_) {
+        counts += sample.devices.size();
+    }
+    return counts;
+}
+
+int AccountingManager::RowsFlush2DB(const std::string& source, unsigned long long judged) {
+    if (epsList_.empty() && judged == judgedRow_) {
+        return 0;
+    }
+    quor::DbSession session(dbPath_, quor::paths::kAccountingSchema);
+    DBHandler& db = session.handler();
+    if (!session.connect() || db.DBTranStart() < 0) {
+        return -1;
+    }
+    const bool written = writeSamples(db, epsList_) && addCounts(db, countsOf(epsList_)) &&
+                         writePositions(db, {source, closedRow_, judged}) && db.DBTranEnd() == 0;
+    if (!written) {
+        (void)db.DBTranRollback();  // closing the connection does the same
+        return -1;
+    }
+    judgedRow_ = judged;
+    epsList_.clear();
+    (void)purge(db, dbPath_);  // reports its own failure; everything is written
+    return 0;
+}
+
+int AccountingManager::RowsPositionGet(const std::string& source, unsigned long long& last,
+                                       unsigned long long& judged) {
+    quor::DbSession session(dbPath_, quor::paths::kAccountingSchema);
+    std::vector<uint64_t> found;
+    if (!session.connect() || session->DBExecute(toSql("SELECT last, judged FROM followed WHERE source = '%q'", source),
+                                                 readPositions, &found) < 0) {
+        return -1;
+    }
+    if (found.empty()) {
+        return 0;
+    }
+    last = found[0];
+    judged = found[1];
+    return 1;
+}
+
+void AccountingManager::RowsPositionSet(unsigned long long last) {
+    followsRows_ = true;
+    lastRow_ = closedRow_ = last;
+    judgedRow_ = 0;
 }
 
 unsigned long long AccountingManager::EpsListTrim(unsigned long long maxCounts) {

@@ -25,6 +25,7 @@ constexpr const char kSystemSettings[] = QUOR_ROOT "/etc/quorinfo.conf";
 
 // Service control.
 constexpr const char kPackageEnabled[] = QUOR_ROOT "/var/packages/Orvane/enabled";
+constexpr const char kReceiverPid[] = QUOR_ROOT "/run/quorlogd.pid";
 constexpr const char kRunFolder[] = QUOR_ROOT "/run";
 
 // Programs: never below QUOR_ROOT.

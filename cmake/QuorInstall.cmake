@@ -26,8 +26,12 @@ install(DIRECTORY DESTINATION quor/etc COMPONENT tools)
 if(QUOR_BUILD_TOOLS)
     set(etc ${PROJECT_SOURCE_DIR}/etc)
     install(FILES ${etc}/notify.filter DESTINATION ${CMAKE_INSTALL_SYSCONFDIR}/quorsyslog COMPONENT tools)
-    install(FILES ${etc}/syslog-ng/quorsyslog.conf DESTINATION ${CMAKE_INSTALL_SYSCONFDIR}/quorsyslog
+    install(FILES ${etc}/syslog-ng/quorsyslog.conf DESTINATION ${CMAKE_INSTALL_DATADIR}/quorsyslog
             RENAME syslog-ng.conf COMPONENT tools)
+    install(PROGRAMS packaging/reserve-buffer DESTINATION lib/quorsyslog COMPONENT tools)
+    install(PROGRAMS ${etc}/init.d/quorlogd DESTINATION ${CMAKE_INSTALL_SYSCONFDIR}/init.d COMPONENT tools)
+    install(FILES ${etc}/sysctl.d/quorsyslog.conf DESTINATION lib/sysctl.d COMPONENT tools)
+    install(FILES ${etc}/systemd/quorlogd.service DESTINATION lib/systemd/system COMPONENT tools)
     install(FILES ${etc}/quorinfo.conf.example DESTINATION ${CMAKE_INSTALL_DATADIR}/doc/quorsyslog/examples
             COMPONENT tools)
     install(FILES ${etc}/systemd/syslog-ng-quorsyslog.conf DESTINATION lib/systemd/system/syslog-ng.service.d

@@ -18,4 +18,11 @@ CREATE TABLE IF NOT EXISTS histogram (
     count INTEGER
 );
 
+-- How far the rows of each log database are counted, and how far they are judged by the notification rules.
+CREATE TABLE IF NOT EXISTS followed (
+    source TEXT PRIMARY KEY,
+    last INTEGER NOT NULL,
+    judged INTEGER NOT NULL
+);
+
 COMMIT;

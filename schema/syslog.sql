@@ -16,9 +16,17 @@ CREATE TABLE logs (
     ltime TEXT,
     ip TEXT,
     tag TEXT,
-    utcsec INTEGER,
-    tzoffset TEXT
+    utcsec INTEGER, -- what the sender says of the time
+    tzoffset TEXT,
+    pid TEXT,
+    msgid TEXT,
+    sdata TEXT,
+    rsec INTEGER -- Unix second of the reception, to which ldate and ltime belong
 );
+
+-- Who follows the rows notices by it that another database has taken the place of this one.
+CREATE TABLE store_identity (id INTEGER PRIMARY KEY CHECK (id = 1), value TEXT NOT NULL);
+INSERT INTO store_identity VALUES (1, lower(hex(randomblob(16))));
 
 -- Named as syslog-ng names those that it creates. None on ldate: the newest rows of a range of days would be sorted out
 -- of all its rows.

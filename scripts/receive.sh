@@ -1,26 +1,57 @@
-# Sourced: a syslog-ng with the shipped configuration on loopback, for the scripts that need one.
+# Sourced: a syslog-ng with the shipped configuration on loopback, and a quorlogd, for the scripts that need them.
+# They call fail TEXT when something does not come about.
 
-# Polls a condition for at most 20 seconds.
+# Polls a condition for at most 20 seconds, or $patience.
 await() {
     local what=$1
     shift
-    for _ in $(seq 200); do
+    for _ in $(seq "${patience:-20}0"); do
         if "$@" > /dev/null 2>&1; then return 0; fi
         sleep 0.1
     done
-    fail "$what did not happen within 20 seconds${syslog_ng_log:+; see $syslog_ng_log}"
+    fail "$what did not happen within ${patience:-20} seconds${syslog_ng_log:+; see $syslog_ng_log}"
 }
 listening() { (exec 3<> "/dev/tcp/127.0.0.1/$1") 2> /dev/null; }
 
-# start_syslog_ng FOLDER PORT DATABASE RECEIVER: its process is then in $syslog_ng, its messages in $syslog_ng_log.
+# start_syslog_ng FOLDER PORT DATABASE: its process is then in $syslog_ng, its messages in $syslog_ng_log. Started again
+# in the same folder it goes on with what waits there. $buffer_size and $buffer_folder may be set.
 start_syslog_ng() {
-    sed -e "/^@define quor_address /s|\".*\"|\"127.0.0.1\"|" -e "/^@define quor_port /s|\".*\"|\"$2\"|" \
-        -e "/^@define quor_port_framed /s|\".*\"|\"$(($2 + 1))\"|" -e "/^@define quor_database /s|\".*\"|\"$3\"|" \
-        -e "/^@define quor_receiver /s|\".*\"|\"$4\"|" etc/syslog-ng/quorsyslog.conf > "$1/quorsyslog.conf"
+    local buffer=${buffer_folder:-$1/buffer}
+    mkdir -p "$buffer"
+    cat > "$1/receiving.conf" << CONF
+@define quor_ip_protocol "4"
+@define quor_address "127.0.0.1"
+@define quor_port "$2"
+@define quor_port_framed "$(($2 + 1))"
+@define quor_database "$3"
+@define quor_buffer "$buffer"
+@define quor_buffer_size "${buffer_size:-268435456}"
+CONF
+    sed "s|/etc/quorsyslog/receiving|$1/receiving|" etc/syslog-ng/quorsyslog.conf > "$1/quorsyslog.conf"
     printf '@version: 3.38\n@include "%s"\n' "$1/quorsyslog.conf" > "$1/syslog-ng.conf"
-    /usr/sbin/syslog-ng -F -e --no-caps -f "$1/syslog-ng.conf" --persist-file "$1/persist" --control "$1/ctl" \
-        --pidfile "$1/pid" > "$1/syslog-ng.log" 2>&1 &
-    syslog_ng=$!
     syslog_ng_log=$1/syslog-ng.log
+    /usr/sbin/syslog-ng -F -e --no-caps -f "$1/syslog-ng.conf" --persist-file "$1/persist" --control "$1/ctl" \
+        --pidfile "$1/pid" >> "$syslog_ng_log" 2>&1 &
+    syslog_ng=$!
     await "the start of syslog-ng on port $2" listening "$2"
+    packaging/reserve-buffer "$buffer" "${buffer_size:-268435456}"
+}
+
+# start_quorlogd BUILD DATABASE: its process is then in $quorlogd, its messages in BUILD/root/run/quorlogd.log.
+start_quorlogd() {
+    mkdir -p "$1/root/run"
+    "$1/tools/quorlogd/quorlogd" --db "$2" --stderr >> "$1/root/run/quorlogd.log" 2>&1 &
+    quorlogd=$!
+}
+
+# end SIGNAL PROCESS...: and waits for it.
+end() {
+    local signal=$1
+    shift
+    for process in "$@"; do
+        [ -z "$process" ] || kill "-$signal" "$process" 2> /dev/null || true
+    done
+    for process in "$@"; do
+        [ -z "$process" ] || wait "$process" 2> /dev/null || true
+    done
 }

@@ -14,8 +14,9 @@ db=$root/var/log/quorlog/syslog.db
 rules=$root/etc/quorsyslog/notify.conf
 mails=$root/mails.txt
 quorlog=$build/tools/quorlog/quorlog
-receiver=$build/tools/quorlogd/quorlogd
 children=()
+syslog_ng=
+quorlogd=
 
 say() { printf '\n\033[1m%s\033[0m\n' "$*"; }
 show() {
@@ -28,9 +29,8 @@ fail() {
 }
 
 stop() {
-    for child in "${children[@]}"; do kill "$child" 2> /dev/null || true; done
-    for child in "${children[@]}"; do wait "$child" 2> /dev/null || true; done
-    children=()
+    end TERM "$syslog_ng" "${children[@]}"
+    end TERM "$quorlogd"
 }
 trap stop EXIT
 trap "exit 0" INT TERM
@@ -51,7 +51,8 @@ start_mail_server() {
     await "the start of the mail server on port $smtp_port" listening "$smtp_port"
 }
 
-all_stored() { [ "$("$quorlog" count --format csv | tail -n 1 | tr -d "\r")" -ge "${#sent[@]}" ]; }
+number=0  # of messages sent
+all_stored() { [ "$(field count)" = "$number" ]; }
 
 # Every message carries its number; each must come back by it.
 check_found() {
@@ -66,19 +67,33 @@ check_found() {
     say "All ${#sent[@]} messages sent were found again."
 }
 
-# The receiver closes its sample when the second has passed and writes when asked to; then everything must agree.
 field() { "$quorlog" "$@" --format csv | tail -n +2 | tr -d '\r'; }
 samples_sum() { field stats eps --last 1d | awk -F, '{ sum += $2 } END { print sum + 0 }'; }
 accounted() {
-    pkill -USR2 -P "$syslog_ng" quorlogd
-    [ "$(field stats total)" = "${#sent[@]}" ] && [ "$(samples_sum)" = "${#sent[@]}" ]
+    kill -USR2 "$quorlogd"  # writes what it has counted
+    [ "$(field stats total)" = "$number" ] && [ "$(samples_sum)" = "$number" ]
 }
 check_totals() {
     local rows total samples
-    await "the accounting of ${#sent[@]} messages" accounted
+    await "the arrival of $number messages" all_stored
+    await "the accounting of $number messages" accounted
     rows=$(field count) total=$(field stats total) samples=$(samples_sum)
-    say "${#sent[@]} messages sent, $rows rows stored, $total counted by device, $samples in the samples of the rate."
+    say "$number messages sent, $rows rows stored, $total counted by device, $samples in the samples of the rate."
     [ "$rows" = "$total" ] && [ "$total" = "$samples" ] || fail "the numbers do not agree"
+}
+
+# Ten senders at full speed, and quorlogd killed among their messages: it goes on where its counts ended.
+show_burst() {
+    local burst=20000
+    say "A burst of $burst messages over 10 connections; quorlogd is killed (kill -9) in the middle and started again ..."
+    loggen --inet --stream --rate 1000000 --size 200 --number $((burst / 10)) --active-connections 10 --quiet \
+        127.0.0.1 "$port" > /dev/null 2>&1 &
+    sleep 0.5
+    end KILL "$quorlogd"
+    start_quorlogd "$build" "$db"
+    wait %loggen || true
+    number=$((number + burst))
+    check_totals
 }
 
 mails_arrived() { [ "$(grep -c '^Subject:' "$mails")" -ge 2 ]; }
@@ -104,12 +119,13 @@ TEXT
 
 fresh_root
 start_mail_server
-start_syslog_ng "$root/run" "$port" "$db" "$receiver"
-children+=("$syslog_ng")
+start_syslog_ng "$root/run" "$port" "$db"
 echo "$syslog_ng" > "$root/run/syslog-ng.pid"  # where the library looks for it
+start_quorlogd "$build" "$db"
 say "Sending messages to 127.0.0.1:$port (UDP and TCP, RFC 3164 and RFC 5424) ..."
 send_messages
-await "the arrival of ${#sent[@]} messages" all_stored
+number=${#sent[@]}
+await "the arrival of $number messages" all_stored
 show search --limit 8
 show search --host intruder
 show search --level err+ --limit 5 --offset 2 --format ndjson
@@ -122,4 +138,5 @@ show stats eps
 show names host
 show events list
 show_mails
+show_burst
 [ -n "${ONCE:-}" ] || by_hand

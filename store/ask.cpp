@@ -3,7 +3,6 @@
 #include <unistd.h>
 
 #include "common/errorcode.h"
-#include "common/handles.h"
 #include "store/failure.h"
 
 namespace quor::store {
@@ -47,18 +46,33 @@ const char* adviceFor(Cause cause) {
 
 }  // namespace
 
-std::vector<std::string> Ask(const std::string& db, const std::string& sql, const char* column) {
-    const Connection connection(QUORDBConnect(nullptr, nullptr, nullptr, db.c_str()));
+Connection Connect(const std::string& db) {
+    Connection connection(QUORDBConnect(nullptr, nullptr, nullptr, db.c_str()));
     if (connection == nullptr) {
         const bool missing = access(db.c_str(), F_OK) != 0;
         throw Failure("cannot open " + db + "; make sure that it is a database and that you may read it",
                       missing ? Cause::Missing : Cause::Denied);
     }
+    return connection;
+}
+
+Result Execute(const Connection& connection, const std::string& db, const std::string& sql,
+               const _SYSLOG_SQL_LIMIT_tag* limit) {
     Result result;
-    if (QUORDBExecute(connection.get(), sql.c_str(), Adopt(result)) < 0) {
+    const int status = limit == nullptr
+                           ? QUORDBExecute(connection.get(), sql.c_str(), Adopt(result))
+                           : QUORDBSelectLimit(connection.get(), sql.c_str(), static_cast<uint32_t>(limit->limit),
+                                               static_cast<uint32_t>(limit->offset), Adopt(result));
+    if (status < 0) {
         const Cause cause = causeOf(ErrorCode(connection.get()));
         throw Failure(db + ": " + QUORDBErrorGet(connection.get()) + "; " + adviceFor(cause), cause);
     }
+    return result;
+}
+
+std::vector<std::string> Ask(const std::string& db, const std::string& sql, const char* column) {
+    const Connection connection = Connect(db);
+    const Result result = Execute(connection, db, sql);
     std::vector<std::string> texts;
     for (Row row(result.get()); row.next();) {
         texts.emplace_back(row[column]);

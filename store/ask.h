@@ -5,9 +5,20 @@
 #include <string>
 #include <vector>
 
+#include "common/handles.h"
+#include "dbutil.h"
+
 namespace quor::store {
 
-// The texts of one column of the result. Failure with SQLite's cause and what to do about it.
+// An open database. Failure with what to do about it.
+Connection Connect(const std::string& db);
+
+// The whole result of one statement; with a limit, of the rows in that window. Failure with SQLite's cause and what to
+// do about it, which names the database as `db`.
+Result Execute(const Connection& connection, const std::string& db, const std::string& sql,
+               const _SYSLOG_SQL_LIMIT_tag* limit = nullptr);
+
+// The texts of one column of the result. Fails as these do.
 std::vector<std::string> Ask(const std::string& db, const std::string& sql, const char* column);
 
 // Failure when the table is not there: several readers of the library cannot tell that from an empty one.

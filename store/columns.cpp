@@ -7,8 +7,6 @@
 namespace quor::store {
 namespace {
 
-using Record = _SYSLOG_LOG_DATA_tag;
-
 template <auto Member>
 std::string_view text(const Record& record, Digits&) {
     return record.*Member;
@@ -25,6 +23,11 @@ std::string_view level(const Record& record, Digits&) {
     return index < std::size(g_MappingSyslogPrior) ? g_MappingSyslogPrior[index] : "";
 }
 
+// Empty for a row of a database that does not know.
+std::string_view received(const Record& record, Digits& digits) {
+    return record.rsec == 0 ? std::string_view() : number<&Record::rsec>(record, digits);
+}
+
 constexpr Column kLogs[] = {
     {"id", Kind::Number, true, number<&Record::id>},
     {"ldate", Kind::Text, true, text<&Record::ldate>},
@@ -38,6 +41,10 @@ constexpr Column kLogs[] = {
     {"tag", Kind::Text, false, text<&Record::tag>},
     {"prog", Kind::Text, true, text<&Record::prog>},
     {"msg", Kind::Text, true, text<&Record::msg>},
+    {"pid", Kind::Text, false, text<&Record::pid>},
+    {"msgid", Kind::Text, false, text<&Record::msgid>},
+    {"sdata", Kind::Text, false, text<&Record::sdata>},
+    {"rsec", Kind::Number, false, received},
 };
 
 constexpr Column kSystemLogs[] = {

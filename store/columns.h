@@ -7,7 +7,7 @@
 #include <string_view>
 #include <vector>
 
-#include "dbutil.h"
+#include "store/record.h"
 
 namespace quor::store {
 
@@ -27,7 +27,7 @@ struct Column {
     const char* name;
     Kind kind;
     bool brief;  // shown where there is little room
-    std::string_view (*read)(const _SYSLOG_LOG_DATA_tag& record, Digits& digits);
+    std::string_view (*read)(const Record& record, Digits& digits);
 };
 
 std::vector<Column> ColumnsOf(const std::string& table);

@@ -10,12 +10,19 @@
 namespace quor::store {
 namespace {
 
-using Record = _SYSLOG_LOG_DATA_tag;
+const std::string kNoIdentity = "file ";
 
-// Without a filter the library pages by ids and counts the largest id: exact only while no row was deleted. A condition
-// that every row meets makes both exact.
-Conditions exact(const Conditions& conditions) {
-    return conditions.empty() ? Conditions{IdCondition(SYSLOG_OP_AT_LEAST, 0)} : conditions;
+std::string where(Conditions conditions) {
+    std::string text;
+    (void)SqlCondListToStr(conditions, text);  // cannot fail
+    return text.empty() ? text : " WHERE " + text;
+}
+
+void addExtras(const Row& row, Record& record) {
+    record.pid = row["pid"];
+    record.msgid = row["msgid"];
+    record.sdata = row["sdata"];
+    record.rsec = ToInt64(row["rsec"]);
 }
 
 class FileSource : public Source {
@@ -24,36 +31,26 @@ class FileSource : public Source {
 
     uint64_t read(const std::string& table, const Conditions& conditions, const Window& window, bool ascending,
                   const RecordHandler& handler) const override {
-        struct Walk {
-            const RecordHandler& handler;
-            uint64_t rows = 0;
-        } walk{handler};
-        const auto visit = [](Record& record, void* context) {
-            auto& current = *static_cast<Walk*>(context);
-            ++current.rows;
-            current.handler(record);
-            return 0;
-        };
-        std::string db = path_;
+        const std::string sql =
+            "SELECT * FROM " + table + where(conditions) + " ORDER BY id " + (ascending ? "asc" : "desc");
+        const _SYSLOG_SQL_LIMIT_tag limit{window.limit, window.offset};
+        const Connection connection = Connect(path_);
+        const Result result = Execute(connection, path_, sql, &limit);
         std::string name = table;
-        Conditions wanted = exact(conditions);
-        _SYSLOG_SQL_LIMIT_tag limit{window.limit, window.offset};
-        _SYSLOG_SQL_ORDER_tag order{ascending ? 1 : 0, SYSLOG_ATTRI_ID};
-        if (SyslogDBSelectByTable(db, name, wanted, &limit, &order, visit, &walk, false) < 0) {
-            fail(table, wanted);
+        Record record;
+        Row row(result.get());
+        uint64_t rows = 0;
+        for (; row.next() && DBRecToLogInfo(name, result.get(), row.number(), &record, false) == 0; ++rows) {
+            addExtras(row, record);
+            handler(record);
         }
-        return walk.rows;
+        return rows;
     }
 
     uint64_t count(const std::string& table, const Conditions& conditions) const override {
-        std::string db = path_;
-        std::string name = table;
-        Conditions wanted = exact(conditions);
-        const int rows = SyslogDBSelectCountByTable(db, name, wanted, nullptr, nullptr);
-        if (rows < 0) {
-            fail(table, wanted);
-        }
-        return static_cast<uint64_t>(rows);
+        const std::vector<std::string> rows =
+            Ask(path_, "SELECT COUNT(*) FROM " + table + where(conditions), "COUNT(*)");
+        return ToUint64(rows.front().c_str());
     }
 
     std::list<std::string> values(_SYSLOG_DB_ATTRI_tag attribute, const Window& window) const override {
@@ -77,26 +74,29 @@ class FileSource : public Source {
         }
     }
 
-    // The number of a removed file is soon given to another one; the time when it was made tells them apart.
-    uint64_t identity() const override {
+    // A database says who it is. One that does not is known by the number of its file and the time when that was made.
+    std::string identity() const override {
         struct statx status = {};
         if (statx(AT_FDCWD, path_.c_str(), 0, STATX_INO | STATX_BTIME, &status) != 0) {
-            return 0;
+            return "";
         }
-        constexpr uint64_t kSpread = 1000000007;
-        const auto seconds = static_cast<uint64_t>(status.stx_btime.tv_sec);
-        return (status.stx_ino * kSpread + seconds) * kSpread + status.stx_btime.tv_nsec;
+        const std::vector<std::string> value = identities();
+        return value.empty()
+                   ? kNoIdentity + std::to_string(status.stx_ino) + ":" + std::to_string(status.stx_btime.tv_sec) +
+                         "." + std::to_string(status.stx_btime.tv_nsec)
+                   : value.front();
     }
 
     const std::string& name() const override { return path_; }
 
   private:
-    // The library does not say why it failed; the same question, asked again, does.
-    [[noreturn]] void fail(const std::string& table, Conditions conditions) const {
-        std::string where;
-        (void)SqlCondListToStr(conditions, where);  // it has rendered before
-        (void)Ask(path_, "SELECT 1 FROM " + table + " WHERE " + where + " LIMIT 1", "1");
-        throw Failure(path_ + ": the query failed; see the system log", Cause::Other);
+    std::vector<std::string> identities() const try {
+        return Ask(path_, "SELECT value FROM store_identity", "value");
+    } catch (const Failure& failure) {
+        if (failure.cause() != Cause::Missing) {
+            throw;
+        }
+        return {};
     }
 
     std::string path_;
@@ -104,8 +104,26 @@ class FileSource : public Source {
 
 }  // namespace
 
+bool HasIdentity(const std::string& identity) {
+    return identity.rfind(kNoIdentity, 0) != 0;
+}
+
+// As the writer of the database does.
+void GiveIdentity(const std::string& path) {
+    RequireTable(path, "logs");  // before there is one, the writer still has to choose the size of its pages
+    for (const char* sql : {"CREATE TABLE IF NOT EXISTS store_identity (id INTEGER PRIMARY KEY CHECK (id = 1), value "
+                            "TEXT NOT NULL)",
+                            "INSERT OR IGNORE INTO store_identity VALUES (1, lower(hex(randomblob(16))))"}) {
+        (void)Ask(path, sql, "");
+    }
+}
+
 std::unique_ptr<Source> OpenSource(const std::string& path) {
     return std::make_unique<FileSource>(RequireLogDatabase(path));
+}
+
+std::unique_ptr<Source> ExpectSource(const std::string& path) {
+    return std::make_unique<FileSource>(AbsolutePath(path));
 }
 
 }  // namespace quor::store

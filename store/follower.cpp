@@ -9,8 +9,11 @@
 namespace quor::store {
 
 Follower::Follower(const Source& source, Selection selection)
-    : source_(source), selection_(std::move(selection)), identity_(source.identity()),
-      after_(LargestId(source, selection_.table)) {}
+    : source_(source), selection_(std::move(selection)), start_([](const std::string&) { return 0; }),
+      identity_(source.identity()), after_(LargestId(source, selection_.table)) {}
+
+Follower::Follower(const Source& source, Selection selection, Start start)
+    : source_(source), selection_(std::move(selection)), start_(std::move(start)) {}
 
 void Follower::last(uint64_t rows, const RecordHandler& handler) const {
     Selection before = selection_;
@@ -22,42 +25,61 @@ void Follower::last(uint64_t rows, const RecordHandler& handler) const {
         Select(source_, before, handler);
         return;
     }
-    std::vector<_SYSLOG_LOG_DATA_tag> newestFirst;
-    Select(source_, before, [&](const _SYSLOG_LOG_DATA_tag& record) { newestFirst.push_back(record); });
+    std::vector<Record> newestFirst;
+    Select(source_, before, [&](const Record& record) { newestFirst.push_back(record); });
     std::for_each(newestFirst.rbegin(), newestFirst.rend(), handler);
 }
 
-void Follower::poll(const RecordHandler& handler) {
-    const uint64_t identity = source_.identity();
-    const bool replaced = identity != identity_;
-    uint64_t newest = 0;
-    try {
-        newest = LargestId(source_, selection_.table);
-    } catch (const Failure& failure) {
-        if (replaced && failure.cause() == Cause::Missing) {
-            return;  // the new one is about to be made
-        }
-        throw;
+// False while there is nothing to follow.
+bool Follower::enter(const std::string& identity) {
+    if (identity.empty()) {
+        return false;
     }
-    if (replaced) {
+    if (identity != identity_) {
+        after_ = start_(identity);
         identity_ = identity;
-        after_ = 0;
     }
-    deliver(newest, handler);
+    return true;
 }
 
-// Every row up to the newest is done with, whether the filter takes it or not: the next look begins behind it.
-void Follower::deliver(uint64_t newest, const RecordHandler& handler) {
+// Every row up to the newest is done with, whether the filter takes it or not. The file may have been replaced since
+// its identity was read: rows that are at hand are of the same collection when that is still there.
+uint64_t Follower::look(const RecordHandler& handler) {
+    const uint64_t newest = LargestId(source_, selection_.table);
     if (newest <= after_) {
-        return;
+        after_ = newest;  // rows that were put back from a copy may end before: what follows them is new
+        return 0;
     }
     Selection arrived = selection_;
     arrived.filter.conditions.push_back(IdCondition(SYSLOG_OP_AT_MOST, newest));
-    SelectAfter(source_, arrived, after_, [&](const _SYSLOG_LOG_DATA_tag& record) {
-        after_ = record.id;
-        handler(record);
+    uint64_t reached = after_;
+    bool first = true;
+    bool same = true;
+    const uint64_t rows = SelectAfter(source_, arrived, reached, [&](const Record& record) {
+        same = first ? source_.identity() == identity_ : same;
+        first = false;
+        if (same) {
+            handler(record);
+        }
     });
-    after_ = newest;
+    if (same && source_.identity() == identity_) {
+        after_ = rows < kPiece ? newest : reached;
+    }
+    return same ? rows : 0;
+}
+
+bool Follower::poll(const RecordHandler& handler) {
+    if (!enter(source_.identity())) {
+        return false;
+    }
+    try {
+        return look(handler) == kPiece;
+    } catch (const Failure& failure) {
+        if (after_ == 0 && failure.cause() == Cause::Missing) {
+            return false;  // a new database has no table before its first row
+        }
+        throw;
+    }
 }
 
 }  // namespace quor::store

@@ -3,30 +3,46 @@
 #define STORE_FOLLOWER_H
 
 #include <cstdint>
+#include <functional>
+#include <string>
 
 #include "store/selection.h"
 
 namespace quor::store {
 
-// Begins after the row that is the newest when it is made, and goes on from there.
+// Goes on from a position in the rows, through whatever takes their place.
 class Follower {
   public:
-    // Limit, offset and order of the selection are ignored. `source` must outlive this.
-    Follower(const Source& source, Selection selection);
+    // Where to begin in a collection of rows that was not followed before, by its identity: the id after which rows are
+    // new. It may throw, and is asked again with the next look.
+    using Start = std::function<uint64_t(const std::string& identity)>;
 
-    // Hands over the last `rows` (0: all) of those that were there at the beginning, oldest first.
+    // Stands after the newest row of this moment. Limit, offset and order of the selection do not count. `source` must
+    // outlive this.
+    Follower(const Source& source, Selection selection);
+    // Stands where `start` says.
+    Follower(const Source& source, Selection selection, Start start);
+
+    // Hands over the last `rows` (0: all) up to where it stands, oldest first.
     void last(uint64_t rows, const RecordHandler& handler) const;
-    // Hands over what has arrived since the last look, oldest first. When the database was replaced, every row of the
-    // new one has arrived. While there is no database, or one without the table, nothing has.
-    void poll(const RecordHandler& handler);
+    // Hands over what has arrived since the last look, oldest first: one piece of it. Rows that
+    // took the place of those before (the database was removed and begun anew) are followed from their start; while a
+    // new database has no table yet, nothing has arrived. False when there is no more for now.
+    bool poll(const RecordHandler& handler);
+
+    // The rows that it stands in, and the last one that it has looked at.
+    const std::string& identity() const { return identity_; }
+    uint64_t position() const { return after_; }
 
   private:
-    void deliver(uint64_t newest, const RecordHandler& handler);
+    bool enter(const std::string& identity);
+    uint64_t look(const RecordHandler& handler);
 
     const Source& source_;
     Selection selection_;
-    uint64_t identity_;
-    uint64_t after_;
+    Start start_;
+    std::string identity_;
+    uint64_t after_ = 0;
 };
 
 }  // namespace quor::store

@@ -5,9 +5,6 @@
 namespace quor::store {
 namespace {
 
-using Record = _SYSLOG_LOG_DATA_tag;
-
-constexpr uint64_t kPiece = 8192;                 // rows held in memory at a time
 constexpr uint64_t kMaxSpan = uint64_t{1} << 24;  // ids looked at in one go where few match
 
 // The ids from `first` to `last`.
@@ -111,20 +108,15 @@ uint64_t Select(const Source& source, const Selection& selection, const RecordHa
                        selection.oldestFirst, handler);
 }
 
-uint64_t SelectAfter(const Source& source, const Selection& selection, uint64_t after, const RecordHandler& handler) {
-    uint64_t taken = 0;
-    for (uint64_t rows = kPiece; rows == kPiece;) {
-        Conditions conditions = selection.filter.conditions;
-        conditions.push_back(IdCondition(SYSLOG_OP_ABOVE, after));
-        rows = source.read(selection.table, conditions, {kPiece, 0}, true, [&](const Record& record) {
-            after = record.id;
-            if (selection.filter.accepts(record)) {
-                ++taken;
-                handler(record);
-            }
-        });
-    }
-    return taken;
+uint64_t SelectAfter(const Source& source, const Selection& selection, uint64_t& after, const RecordHandler& handler) {
+    Conditions conditions = selection.filter.conditions;
+    conditions.push_back(IdCondition(SYSLOG_OP_ABOVE, after));
+    return source.read(selection.table, conditions, {kPiece, 0}, true, [&](const Record& record) {
+        after = record.id;
+        if (selection.filter.accepts(record)) {
+            handler(record);
+        }
+    });
 }
 
 uint64_t Count(const Source& source, const Selection& selection) {

@@ -21,8 +21,13 @@ struct Selection {
 // rows that arrive meanwhile are not among them. Returns the number of rows.
 uint64_t Select(const Source& source, const Selection& selection, const RecordHandler& handler);
 
-// Rows with a larger id than `after`, oldest first; limit, offset and order of the selection do not count.
-uint64_t SelectAfter(const Source& source, const Selection& selection, uint64_t after, const RecordHandler& handler);
+// The most rows that one question hands over.
+constexpr uint64_t kPiece = 8192;
+
+// One piece of the rows with a larger id than `after`, oldest first; limit, offset and order of the selection do not
+// count. `after` becomes the id of the last row looked at. Returns the number of rows looked at: fewer than kPiece when
+// there are no more.
+uint64_t SelectAfter(const Source& source, const Selection& selection, uint64_t& after, const RecordHandler& handler);
 
 // The number of matching rows, without limit and offset.
 uint64_t Count(const Source& source, const Selection& selection);

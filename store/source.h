@@ -9,12 +9,12 @@
 #include <memory>
 #include <string>
 
-#include "dbutil.h"
 #include "store/filter.h"
+#include "store/record.h"
 
 namespace quor::store {
 
-using RecordHandler = std::function<void(const _SYSLOG_LOG_DATA_tag&)>;
+using RecordHandler = std::function<void(const Record&)>;
 
 struct Window {
     uint64_t limit = 0;  // 0: no limit
@@ -40,14 +40,22 @@ class Source {
     // Deletes the rows of table logs that meet all conditions: every row when there is none.
     virtual void remove(const Conditions& conditions) const = 0;
 
-    // A number of these rows as a whole: another one as soon as others have taken their place, 0 while there are none.
-    virtual uint64_t identity() const = 0;
+    // The name of this collection of rows: another one as soon as other rows have taken their place. Empty while there
+    // is none to read.
+    virtual std::string identity() const = 0;
     // What people call it.
     virtual const std::string& name() const = 0;
 };
 
 // The log database in the file `path`, which must exist.
 std::unique_ptr<Source> OpenSource(const std::string& path);
+// The same, for those who wait until there is one.
+std::unique_ptr<Source> ExpectSource(const std::string& path);
+
+// False for the makeshift identity of a database that bears none.
+bool HasIdentity(const std::string& identity);
+// Gives the log database in a file an identity unless it has one. Failure when it has no table yet.
+void GiveIdentity(const std::string& path);
 
 }  // namespace quor::store
 

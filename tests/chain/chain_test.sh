@@ -5,7 +5,8 @@ set -eu
 
 describe() {
     sqlite3 "$1" "SELECT name, type, hidden FROM pragma_table_xinfo('logs')" "SELECT * FROM sqlite_stat1" \
-        "SELECT name FROM sqlite_schema WHERE type = 'index'" "PRAGMA page_size"
+        "SELECT name FROM sqlite_schema WHERE type = 'index'" "PRAGMA page_size" \
+        "SELECT id, length(value) FROM store_identity"
 }
 fresh=$(mktemp)
 trap 'rm -f "$fresh"' EXIT

@@ -1,4 +1,4 @@
-// quorlogd as a process: fed, signalled and read like the real one.
+// quorlogd as a process: it follows a database that is written, replaced and locked, and is signalled and killed.
 #include <chrono>
 #include <random>
 
@@ -13,158 +13,208 @@ namespace {
 class Quorlogd : public Child {
   public:
     // `options` as a shell reads them.
-    explicit Quorlogd(const std::string& options = "") : Child(QUORLOGD " --stderr " + options + " >/dev/null") {}
+    explicit Quorlogd(const std::string& options = "")
+        : Child(QUORLOGD " --stderr --flush-interval 1 " + options + " >/dev/null") {}
 
     bool started() const { return says("Started: "); }  // and answers signals
-    bool takes(int lines) const { return says("Statistics: " + std::to_string(lines) + " lines", SIGUSR1); }
 };
-
-std::string entry(const std::string& host, const std::string& message) {
-    return "local0 info 2026-11-21 05:15:54 1795238154 7 +00:00 " + host + " 10.0.0.1 kernel 84 " + message + "\n";
-}
-
-std::string entries(const std::string& host, int count) {
-    std::string text;
-    while (count-- > 0) {
-        text += entry(host, "link is up");
-    }
-    return text;
-}
 
 std::string keywordRule(const std::string& keyword) {
     return "[rule]\nnotify_type=\"2\"\nnotify_pri=\"0\"\nnotify_eps=\"0\"\nnotify_pat=\"" + keyword +
            "\"\nnotify_enable=\"1\"\n";
 }
 
-unsigned long long countOf(const std::string& device) {
-    std::string path = paths::kAccountingDb;
-    return SyslogDBHistGetSingle(path, device);
+void createLogs() {
+    SqliteFile(paths::kWorkingDb).run("PRAGMA journal_mode=WAL; " + ReadFile(paths::kLogSchema));
+}
+
+// `count` rows of a second each, from two devices.
+void store(int count, const std::string& message = "link is up", const std::string& host = "router") {
+    SqliteFile(paths::kWorkingDb)
+        .run("WITH n(i) AS (SELECT 1 UNION ALL SELECT i + 1 FROM n WHERE i < " + std::to_string(count) +
+             ") INSERT INTO logs(msg, prio, host, ip, prog, pid, ldate, ltime, rsec) SELECT '" + message +
+             "', 'info', '" + host +
+             "' || (i % 2), '10.0.0.1', 'kernel', '7', '2026-11-21', '05:15:54', "
+             "1795238154 + i / 100 FROM n");
+}
+
+// Nothing where there is no such database or table yet.
+Strings number(const std::string& path, const std::string& sql) try {
+    return std::filesystem::exists(path) ? SqliteFile(path).query(sql) : Strings();
+} catch (const std::runtime_error&) {
+    return {};
+}
+
+// The rows that are stored, counted by device, and in the samples.
+Strings totals() {
+    Strings all = number(paths::kWorkingDb, "SELECT count(*) FROM logs");
+    for (const char* sql : {"SELECT sum(count) FROM histogram", "SELECT sum(eps) FROM eps"}) {
+        const Strings found = number(paths::kAccountingDb, sql);
+        all.insert(all.end(), found.begin(), found.end());
+    }
+    return all;
+}
+
+bool counts(int rows) {
+    const std::string expected = std::to_string(rows);
+    return Eventually([&] { return totals() == Strings(3, expected); });
 }
 
 Strings events() {
-    SqliteFile file(paths::kEventDb);
-    const bool created = !file.query("SELECT 1 FROM sqlite_master WHERE name = 'log'").empty();
-    return created ? file.query("SELECT event FROM log ORDER BY id") : Strings();
+    return number(paths::kEventDb, "SELECT event FROM log WHERE event NOT LIKE 'Server was %' ORDER BY id");
 }
 
 class QuorlogdProcess : public testing::Test {
   protected:
     void SetUp() override {
-        for (const char* path : {paths::kAccountingDb, paths::kEventDb}) {
+        for (const char* path : {paths::kAccountingDb, paths::kEventDb, paths::kReceiverPid}) {
             std::filesystem::remove_all(std::filesystem::path(path).parent_path());
             std::filesystem::create_directories(std::filesystem::path(path).parent_path());
         }
         WriteFile(paths::kNotifyRules, "");
         std::filesystem::remove(paths::kNotifyFilter);
-    }
-
-    // Until the database holds what a write that is asked for leaves there.
-    static bool writes(Quorlogd& daemon, const std::string& device, unsigned long long count) {
-        return Eventually([&] {
-            daemon.signal(SIGUSR2);
-            return countOf(device) == count;
-        });
+        createLogs();
     }
 };
 
-// Also with databases that a full volume left empty.
-TEST_F(QuorlogdProcess, AccountsTheInputUpToItsEnd) {
+// Also with databases that a full volume left empty, and with rows that arrived while nobody followed.
+TEST_F(QuorlogdProcess, CountsWhatIsStoredAndGoesOnWhereItEnded) {
     WriteFile(paths::kEventDb, "");
     WriteFile(paths::kAccountingDb, "");
-    Quorlogd daemon("--max-line 1024");
-    const std::string text = entry("router1", "it's up") + "not an entry\n\n" + entry("router2", "") +
-                             entry("router1", std::string(1 << 20, 'x')) + entry("router1", "the last, without an end");
-    for (const char c : text.substr(0, 300)) {
-        daemon.send({&c, 1});
-    }
-    daemon.send(std::string_view(text).substr(300, text.size() - 301));
-    EXPECT_EQ(daemon.endOfInput(), 0);
-    EXPECT_EQ(countOf("router1"), 3U);
-    EXPECT_TRUE(daemon.says("5 lines, 1 bad, 1 oversized, 2 devices, 0 notices,")) << daemon.messages();
-    EXPECT_EQ(events().size(), 2U);
-    EXPECT_EQ(SqliteFile(paths::kAccountingDb).query("SELECT sum(eps) FROM eps"), Strings{"4"});
-}
-
-TEST_F(QuorlogdProcess, AnswersSignals) {
-    for (const int last : {SIGTERM, SIGINT}) {
+    store(20000);
+    {
         Quorlogd daemon;
-        ASSERT_TRUE(daemon.started());
-        daemon.send(entries("router1", 5));
-        EXPECT_TRUE(daemon.takes(5)) << daemon.messages();
-        daemon.send(entries("router1", 2));
-        EXPECT_EQ(daemon.endOf(last), 0);
-        EXPECT_EQ(countOf("router1"), last == SIGTERM ? 7U : 14U);  // the second reads back what the first wrote
+        EXPECT_TRUE(counts(20000));
+        store(3);
+        EXPECT_TRUE(counts(20003)) << "woken by the change";
+        EXPECT_EQ(Quorlogd().endOf(0), 1) << "a second one";
+        store(10);
+        EXPECT_EQ(daemon.endOf(SIGTERM), 0);
     }
-}
-
-TEST_F(QuorlogdProcess, FollowsItsRulesAfterHup) {
-    const std::string spool = paths::kNotifySpool + std::string("/desktop.jsonl");
-    std::filesystem::remove(spool);
-    WriteFile(paths::kSystemSettings, "desktop_notify_enabled=\"yes\"\n");
-    Quorlogd daemon("--max-notices 2");
-    ASSERT_TRUE(daemon.started());
-    WriteFile(paths::kNotifyRules, keywordRule("it's"));
-    daemon.signal(SIGHUP);
-    daemon.send(entry("router1", "it's down") + entry("router2", "it is not") + entry("router2", "it's < down") +
-                entry("router3", "it's too much"));
-    EXPECT_EQ(daemon.endOfInput(), 0);
-    EXPECT_TRUE(daemon.says("2 notices, 1 notices suppressed")) << daemon.messages();
-    ASSERT_EQ(events().size(), 4U);
-    EXPECT_EQ(events()[2], "Event detection: Received log which contains [it's]. Log content: [it's \u2039 down]");
-    EXPECT_TRUE(Eventually([&spool] { return ReadFile(spool).find("it's < down") != std::string::npos; }));
-    std::filesystem::remove(paths::kSystemSettings);
-}
-
-TEST_F(QuorlogdProcess, KeepsWhatADatabaseDoesNotTake) {
-    SqliteFile(paths::kAccountingDb).run(ReadFile(paths::kAccountingSchema));
+    EXPECT_TRUE(counts(20013));
+    store(7);
     Quorlogd daemon;
-    ASSERT_TRUE(daemon.started());
-    daemon.send(entries("router1", 3));
-    ASSERT_TRUE(writes(daemon, "router1", 3));
+    EXPECT_TRUE(counts(20020));
+    EXPECT_EQ(number(paths::kAccountingDb, "SELECT max(eps) FROM (SELECT sum(eps) AS eps FROM eps GROUP BY stamp)"),
+              Strings{"119"})
+        << "samples are of the seconds of the rows, which a backlog does not change";
+}
+
+TEST_F(QuorlogdProcess, CountsEqualRowsAfterEveryKill) {
+    std::random_device random;
+    WriteFile(paths::kNotifyRules, keywordRule("up"));
+    int rows = 0;
+    for (int i = 0; i < 5; ++i) {
+        Quorlogd daemon("--max-notices 10");
+        const auto end = std::chrono::steady_clock::now() + std::chrono::microseconds(random() % 600000);
+        do {
+            store(200);
+            rows += 200;
+            daemon.signal(SIGUSR2);
+        } while (std::chrono::steady_clock::now() < end);
+        EXPECT_EQ(daemon.endOf(SIGKILL), -1);
+    }
+    Quorlogd daemon;
+    EXPECT_TRUE(counts(rows)) << testing::PrintToString(totals());
+    EXPECT_EQ(number(paths::kEventDb, "PRAGMA integrity_check"), Strings{"ok"});
+}
+
+TEST_F(QuorlogdProcess, WaitsForADatabaseThatIsLocked) {
+    Quorlogd daemon;
+    store(3);
+    ASSERT_TRUE(counts(3));
     {
         SqliteFile locked(paths::kAccountingDb);
         locked.run("BEGIN EXCLUSIVE");
-        daemon.send(entries("router1", 4));
-        // There is nothing to write before the second has passed.
-        EXPECT_TRUE(daemon.says("Accounting is kept in memory", SIGUSR2)) << daemon.messages();
+        store(4);
+        EXPECT_TRUE(daemon.says("Rows wait to be counted", SIGUSR2)) << daemon.messages();
     }
-    EXPECT_TRUE(writes(daemon, "router1", 7));
-    EXPECT_EQ(SqliteFile(paths::kAccountingDb).query("SELECT sum(eps) FROM eps"), Strings{"7"});
+    EXPECT_TRUE(Eventually([&] {
+        daemon.signal(SIGUSR2);
+        return counts(7);
+    }));
 }
 
-TEST_F(QuorlogdProcess, LeavesSoundDatabasesWhenKilled) {
-    std::random_device random;
-    WriteFile(paths::kNotifyRules, keywordRule("up"));
-    for (int i = 0; i < 5; ++i) {
-        Quorlogd daemon("--max-notices 10");
-        ASSERT_TRUE(daemon.started());
-        const auto end = std::chrono::steady_clock::now() + std::chrono::microseconds(random() % 300000);
-        while (std::chrono::steady_clock::now() < end) {
-            daemon.send(entries("router" + std::to_string(random() % 100), 20));
-            daemon.signal(SIGUSR2);
-        }
-        EXPECT_EQ(daemon.endOf(SIGKILL), -1);
-        for (const char* path : {paths::kAccountingDb, paths::kEventDb}) {
-            EXPECT_TRUE(!std::filesystem::exists(path) ||
-                        SqliteFile(path).query("PRAGMA integrity_check") == Strings{"ok"})
-                << path;
-        }
-    }
-    const unsigned long long before = countOf("last");
+TEST_F(QuorlogdProcess, NoticesReplacedAndRestoredDatabases) {
+    const std::string copy = std::string(paths::kWorkingDb) + ".copy";
+    store(5);
+    std::filesystem::copy_file(paths::kWorkingDb, copy);
+    store(5);
     Quorlogd daemon;
-    daemon.send(entries("last", 3));
-    EXPECT_EQ(daemon.endOfInput(), 0);
-    EXPECT_EQ(countOf("last"), before + 3);
+    ASSERT_TRUE(counts(10));
+    const auto replace = [&](const std::function<void()>& make) {
+        for (const char* suffix : {"", "-wal", "-shm"}) {
+            std::filesystem::remove(paths::kWorkingDb + std::string(suffix));
+        }
+        make();
+    };
+    replace(createLogs);
+    store(4);
+    EXPECT_TRUE(Eventually([] { return totals() == (Strings{"4", "14", "14"}); })) << "all rows of a new one are new";
+    replace([&copy] { std::filesystem::copy_file(copy, paths::kWorkingDb); });
+    EXPECT_TRUE(daemon.says(" 5 the last row", SIGUSR1)) << daemon.messages();
+    store(2);
+    EXPECT_TRUE(Eventually([] { return totals()[1] == "16"; }))
+        << "rows of a copy were counted before: " << testing::PrintToString(totals());
 }
 
-TEST_F(QuorlogdProcess, RaisesAFullVolumeOnce) {
+// It kept no position, and no identity of the database.
+TEST_F(QuorlogdProcess, CarriesOnTheCountsOfAFormerVersion) {
+    store(50);
+    SqliteFile(paths::kWorkingDb).run("DROP TABLE store_identity");
+    SqliteFile(paths::kAccountingDb)
+        .run("CREATE TABLE eps(id INTEGER PRIMARY KEY, stamp INTEGER, device TEXT, eps INTEGER);"
+             "CREATE TABLE histogram(id INTEGER PRIMARY KEY, device TEXT UNIQUE, count INTEGER);"
+             "INSERT INTO eps VALUES(1, 1, 'router1', 50); INSERT INTO histogram VALUES(1, 'router1', 50)");
+    Quorlogd daemon;
+    ASSERT_TRUE(daemon.started());
+    ASSERT_TRUE(daemon.says(" 50 the last row", SIGUSR1)) << daemon.messages();
+    store(2);
+    EXPECT_TRUE(counts(52)) << testing::PrintToString(totals());
+}
+
+TEST_F(QuorlogdProcess, OneDeviceCannotSilenceTheOthers) {
+    const std::string spool = paths::kNotifySpool + std::string("/desktop.jsonl");
+    std::filesystem::remove(spool);
+    WriteFile(paths::kSystemSettings, "desktop_notify_enabled=\"yes\"\n");
+    Quorlogd daemon("--check-interval 1");
+    ASSERT_TRUE(daemon.started());
+    WriteFile(paths::kNotifyRules, keywordRule("it''s"));
+    store(2, "it''s before the rule");
+    ASSERT_TRUE(counts(2));
+    WriteFile(paths::kNotifyRules, keywordRule("it's"));
+    daemon.signal(SIGHUP);
+    ASSERT_TRUE(daemon.says("rows,", SIGUSR1));
+    store(1000, "it''s < a flood", "flood");
+    for (int i = 0; i < 20; ++i) {
+        store(1, "it''s down", "quiet" + std::to_string(i) + "-");
+    }
+    EXPECT_TRUE(counts(1022));
+    const auto holding = [](const std::string& text) {
+        const Strings all = events();
+        return std::count_if(all.begin(), all.end(),
+                             [&](const std::string& event) { return event.find(text) != std::string::npos; });
+    };
+    EXPECT_TRUE(Eventually([&] { return holding(": [quiet") == 20; })) << testing::PrintToString(events());
+    EXPECT_LE(holding("[flood"), 22);
+    EXPECT_GE(holding("[flood1: 2026-11-21 05:15:54 kernel[7]: it's \u2039 a flood]"), 1);
+    EXPECT_TRUE(Eventually([&] { return holding("more logs that match a rule were held back: flood") == 1; }));
+    EXPECT_TRUE(Eventually([&spool] { return ReadFile(spool).find("it's < a flood") != std::string::npos; }));
+    std::filesystem::remove(paths::kSystemSettings);
+}
+
+TEST_F(QuorlogdProcess, RaisesAFullVolumeOnceAndKeepsTheEventLogSmall) {
+    SqliteFile(paths::kEventDb)
+        .run(ReadFile(paths::kEventSchema) + "WITH n(i) AS (SELECT 1 UNION ALL SELECT i + 1 FROM n WHERE i < 15001) "
+                                             "INSERT INTO log SELECT i, 0, i, 'SYSTEM', 'Server was old' FROM n");
     Quorlogd daemon("--volume / --volume-full 0.000001 --check-interval 1");
-    EXPECT_TRUE(Eventually([] { return std::filesystem::exists(paths::kEventDb) && events().size() >= 2; }));
-    daemon.send("not an entry\n");
-    EXPECT_TRUE(daemon.says("1 lines were not log entries")) << "no other check";
-    EXPECT_EQ(daemon.endOfInput(), 0);
-    EXPECT_EQ(events().size(), 3U);
-    EXPECT_EQ(events()[1], "Volume space is not enough.");
+    EXPECT_TRUE(Eventually([] { return events() == Strings{"Volume space is not enough."}; }));
+    EXPECT_TRUE(Eventually([] {
+        return number(paths::kEventDb, "SELECT count(*) BETWEEN 10000 AND 10010, max(id) > 15000 FROM log") ==
+               (Strings{"1", "1"});
+    }));
+    usleep(1500000);
+    EXPECT_EQ(events().size(), 1U) << "another check";
 }
 
 }  // namespace

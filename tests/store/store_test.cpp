@@ -150,8 +150,11 @@ TEST_F(Store, EveryRowOfALargeTableComesInOrder) {
     selection.oldestFirst = true;
     EXPECT_EQ(select(selection), all);
     Ids after;
-    EXPECT_EQ(SelectAfter(*OpenSource(path_), {}, 10, into(after)), all.size() - 6);
+    uint64_t position = 10;
+    while (SelectAfter(*OpenSource(path_), {}, position, into(after)) == kPiece) {
+    }
     EXPECT_EQ(after, Ids(all.begin() + 6, all.end()));
+    EXPECT_EQ(position, all.back());
     selection.offset = 19995;
     selection.limit = 2;
     EXPECT_EQ(select(selection), (Ids{20000, 1000020001}));

@@ -18,7 +18,7 @@ RecordSink::RecordSink(const Style& style, const std::string& table, Output& out
     sink_ = MakeSink(style, std::move(columns), out);
 }
 
-void RecordSink::add(const _SYSLOG_LOG_DATA_tag& record) {
+void RecordSink::add(const store::Record& record) {
     for (size_t i = 0; i < fields_.size(); ++i) {
         cells_[i] = fields_[i].read(record, digits_[i]);
     }

@@ -16,7 +16,7 @@ class RecordSink {
   public:
     RecordSink(const Style& style, const std::string& table, Output& out);
 
-    void add(const _SYSLOG_LOG_DATA_tag& record);
+    void add(const store::Record& record);
     void flush() { sink_->flush(); }
     void finish() { sink_->finish(); }
 

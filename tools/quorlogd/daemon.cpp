@@ -5,7 +5,6 @@
 #include <syslog.h>
 #include <unistd.h>
 
-#include <cerrno>
 #include <csignal>
 #include <stdexcept>
 
@@ -38,8 +37,8 @@ Descriptor openSignals() {
 
 }  // namespace
 
-Daemon::Daemon(const Options& options, int input)
-    : options_(options), input_(input), signals_(openSignals()), receiver_(options), housekeeping_(options) {
+Daemon::Daemon(const Options& options)
+    : options_(options), signals_(openSignals()), watch_(options.db), receiver_(options), housekeeping_(options) {
     nextTick_ = nextCheck_ = Clock::now();
     nextFlush_ = nextTick_ + seconds(options.flushSeconds);
 }
@@ -50,43 +49,30 @@ int Daemon::run() {
     while (!stopping_) {
         runTimers();
         wait();
+        more_ = receiver_.takeRows();
     }
-    drain();
     receiver_.finish();
     syslog(LOG_INFO, "Stopped: %s", receiver_.statistics().c_str());
     (void)Logger().LogAddServStop(kEventText);  // reports its own failure
     return 0;
 }
 
-// For input, a signal or the next timer.
+// For a change of the database, a signal or the next timer; not at all while rows are known to be there. A change is
+// given a moment to be followed by others: each look costs more than a row.
 void Daemon::wait() {
-    pollfd sources[] = {{signals_.get(), POLLIN, 0}, {input_, POLLIN, 0}};
     constexpr int kTickMs = 1000;
-    if (poll(sources, 2, kTickMs) <= 0) {
+    constexpr useconds_t kGatherMicroseconds = 20000;
+    pollfd sources[] = {{signals_.get(), POLLIN, 0}, {watch_.descriptor(), POLLIN, 0}};
+    if (poll(sources, 2, more_ ? 0 : kTickMs) <= 0) {
         return;
     }
     if (sources[0].revents != 0) {
         answerSignal();
+    } else if (!more_) {
+        (void)usleep(kGatherMicroseconds);
     }
-    if (!stopping_ && sources[1].revents != 0 && !read()) {
-        stopping_ = true;
-    }
-}
-
-// False at the end of input.
-bool Daemon::read() {
-    const ssize_t count = ::read(input_, buffer_.data(), buffer_.size());
-    if (count > 0) {
-        receiver_.take({buffer_.data(), static_cast<size_t>(count)});
-    }
-    return count > 0 || (count < 0 && (errno == EINTR || errno == EAGAIN));
-}
-
-// What was already sent when a signal ended the process; a sender that goes on does not keep it alive.
-void Daemon::drain() {
-    constexpr int kMostChunks = 64;
-    pollfd source{input_, POLLIN, 0};
-    for (int i = 0; i < kMostChunks && poll(&source, 1, 0) > 0 && read(); ++i) {
+    if (sources[1].revents != 0) {
+        watch_.clear();
     }
 }
 
@@ -118,12 +104,12 @@ void Daemon::runTimers() {
     nextTick_ = now + seconds(1);
     receiver_.tick();
     if (now >= nextFlush_) {
-        const bool written = receiver_.flushIfDue();
+        const bool written = receiver_.flush();
         nextFlush_ = Clock::now() + (written ? seconds(options_.flushSeconds) : kRetryFlush);
     }
     if (now >= nextCheck_) {
         housekeeping_.check();
-        receiver_.reportBadLines();
+        receiver_.announceHeldBack();
         nextCheck_ = Clock::now() + seconds(options_.checkSeconds);
     }
 }

@@ -3,6 +3,8 @@
 #include <sys/statvfs.h>
 #include <syslog.h>
 
+#include <string>
+
 #include "base/paths.h"
 #include "dbhandler/session.h"
 #include "logger.h"
@@ -23,7 +25,8 @@ double usedPercent(const std::string& folder) {
     return usable > 0 ? 100 * used / usable : 0;
 }
 
-// A database that was created on a full volume has no tables, and is not created again because it is there.
+// A database of a former version lacks a table; one that was created on a full volume has none. Neither is created
+// again, because it is there.
 void complete(const char* path, const char* schema, const char* table) {
     DbSession db(path, schema);
     if (QLIBCFileExist(path) != 0 && db.connect() && db->DBcheckTableExist(table) == 0) {
@@ -33,23 +36,26 @@ void complete(const char* path, const char* schema, const char* table) {
 
 void completeAll() {
     complete(paths::kEventDb, paths::kEventSchema, "log");
-    complete(paths::kAccountingDb, paths::kAccountingSchema, "histogram");
+    complete(paths::kAccountingDb, paths::kAccountingSchema, "followed");
 }
 
 }  // namespace
 
 void PrepareDatabases() {
     completeAll();
-    constexpr int kTries = 3;  // each waits for a lock
-    for (int i = 0; i < kTries && QLIBCFileExist(paths::kAccountingDb) != 0; ++i) {
-        DbSession db(paths::kAccountingDb, paths::kAccountingSchema);
-        if (db.connect() && db->DBExecute("SELECT 1 FROM histogram") == 0) {
-            return;
-        }
+}
+
+// The oldest events go in time, so that the library never compacts the file to make room: that would hold up whoever
+// adds an event.
+void Housekeeping::trimEvents() {
+    constexpr int kMost = 15000;
+    constexpr int kKept = 10000;
+    if (Logger().LogCount(paths::kEventDb) <= kMost) {
+        return;
     }
-    if (QLIBCFileExist(paths::kAccountingDb) != 0) {
-        syslog(LOG_WARNING, "%s cannot be read: its counts begin again from zero; stop quorlogd to restore it",
-               paths::kAccountingDb);
+    DbSession db(paths::kEventDb, paths::kEventSchema);
+    if (db.connect()) {
+        (void)db->DBExecute("DELETE FROM log WHERE id <= (SELECT max(id) FROM log) - " + std::to_string(kKept));
     }
 }
 
@@ -71,11 +77,12 @@ void Housekeeping::checkVolume() {
 
 void Housekeeping::check() {
     completeAll();
+    trimEvents();
     if (options_.volumeFullPercent > 0) {
         checkVolume();
     }
     if (options_.workingDbMaxKb != 0) {
-        (void)SyslogngWorkingDbCheck(paths::kWorkingDb, options_.workingDbMaxKb);  // there may be none yet
+        (void)SyslogngWorkingDbCheck(options_.db, options_.workingDbMaxKb);  // there may be none yet
     }
 }
 

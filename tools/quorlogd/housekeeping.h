@@ -6,8 +6,7 @@
 
 namespace quor {
 
-// To be called before the accounting starts. Completes databases that a full volume left without their tables. Counts
-// that cannot be read at the start begin again from zero, so a locked database is waited for.
+// To be called before the accounting starts: completes databases that lack tables.
 void PrepareDatabases();
 
 class Housekeeping {
@@ -15,11 +14,12 @@ class Housekeeping {
     explicit Housekeeping(const Options& options) : options_(options) {}
 
     // Raises a notice and an event when the volume fills up, once until it has been below the threshold again, has
-    // an oversized working database replaced, and completes databases that a full volume left without their tables.
+    // an oversized working database replaced, keeps the event log small, and completes databases that lack tables.
     void check();
 
   private:
     void checkVolume();
+    static void trimEvents();
 
     const Options& options_;
     bool full_ = false;

@@ -1,5 +1,4 @@
 #include <syslog.h>
-#include <unistd.h>
 
 #include <CLI/CLI.hpp>
 #include <cstdio>
@@ -8,13 +7,15 @@
 #include "base/paths.h"
 #include "tools/quorlogd/daemon.h"
 #include "tools/quorlogd/housekeeping.h"
+#include "tools/quorlogd/pidfile.h"
 
 namespace {
 
 void setUp(CLI::App& app, quor::Options& options) {
     app.set_version_flag("--version", "quorlogd " QUORLOGD_VERSION);
+    app.add_option("--db", options.db, "Log database to follow")->capture_default_str();
     app.add_option("--flush-interval", options.flushSeconds, "Seconds between two writes of the accounting database")
-        ->check(CLI::Range(6, 3600))
+        ->check(CLI::Range(1, 3600))
         ->capture_default_str();
     app.add_option("--check-interval", options.checkSeconds, "Seconds between two checks of the space that logs take")
         ->check(CLI::Range(1, 86400))
@@ -28,9 +29,6 @@ void setUp(CLI::App& app, quor::Options& options) {
                    "KiB above which the working database is removed and begun anew; 0: not checked")
         ->check(CLI::NonNegativeNumber)
         ->capture_default_str();
-    app.add_option("--max-line", options.maxLineBytes, "Bytes above which a line is cut")
-        ->check(CLI::Range(1024, 16 * 1024 * 1024))
-        ->capture_default_str();
     app.add_option("--max-notices", options.noticesPerMinute, "Notices a minute; more matching logs are only counted")
         ->check(CLI::Range(0, 100000))
         ->capture_default_str();
@@ -38,7 +36,7 @@ void setUp(CLI::App& app, quor::Options& options) {
         ->check(CLI::Range(1, 10000000))
         ->capture_default_str();
     app.add_option("--max-waiting", options.maxWaiting,
-                   "Counts kept in memory while the accounting database cannot be written")
+                   "Counts of devices read ahead while the accounting database cannot be written")
         ->check(CLI::Range(1, 100000000))
         ->capture_default_str();
     app.add_flag("--stderr", options.toStandardError, "Write messages to standard error too");
@@ -46,10 +44,10 @@ void setUp(CLI::App& app, quor::Options& options) {
 
 int run(int argc, char** argv) {
     quor::Options options;
-    options.volume = std::filesystem::path(quor::paths::kWorkingDb).parent_path();
+    options.volume = std::filesystem::path(options.db).parent_path();
     CLI::App app(
-        "Reads the text entries of syslog-ng from standard input, accounts them, checks the notification rules and "
-        "records events. Signals: TERM or INT ends, HUP reads the rules anew, USR1 reports statistics, USR2 writes the "
+        "Follows the log database that syslog-ng writes: accounts every row, checks the notification rules and records "
+        "events. Signals: TERM or INT ends, HUP reads the rules anew, USR1 reports statistics, USR2 writes the "
         "accounting database.",
         "quorlogd");
     setUp(app, options);
@@ -59,8 +57,9 @@ int run(int argc, char** argv) {
         return app.exit(error) == 0 ? 0 : 2;
     }
     openlog("quorlogd", LOG_PID | (options.toStandardError ? LOG_PERROR : 0), LOG_DAEMON);
+    const quor::PidFile only(quor::paths::kReceiverPid);
     quor::PrepareDatabases();
-    return quor::Daemon(options, STDIN_FILENO).run();
+    return quor::Daemon(options).run();
 }
 
 }  // namespace

@@ -5,12 +5,14 @@
 #include <cstdint>
 #include <string>
 
+#include "base/paths.h"
+
 namespace quor {
 
 struct Options {
+    std::string db = paths::kWorkingDb;
     unsigned flushSeconds = 10;
     unsigned checkSeconds = 60;
-    size_t maxLineBytes = 65536;
     unsigned noticesPerMinute = 60;
     size_t maxDevices = 20000;
     unsigned long long maxWaiting = 200000;  // counts of devices in samples that could not be written

@@ -3,22 +3,30 @@
 #include <sys/statvfs.h>
 #include <syslog.h>
 
-#include <cinttypes>
+#include <cstring>
+#include <ctime>
 #include <filesystem>
-#include <thread>
 
+#include "base/numbers.h"
 #include "base/paths.h"
+#include "common/handles.h"
 #include "logger.h"
+#include "store/ask.h"
+#include "store/failure.h"
 #include "tools/quorlogd/noticetext.h"
 
 namespace quor {
 namespace {
 
 using Clock = std::chrono::steady_clock;
+using store::Cause;
+using store::Failure;
 
 constexpr unsigned long long kFlushNeedsBytes = 4ULL * 1024 * 1024;
+constexpr const char kSeverity[] = "QUORSYSLOG_SEV_EXCEED";
+constexpr const char kKeyword[] = "QUORSYSLOG_KEYWORD_MATCH";
 
-// A full volume may fail a transaction only at its very end, when the samples count as written: none is begun then.
+// A full volume may fail a transaction only at its very end: none is begun then.
 bool hasRoomToFlush() {
     const std::string folder = std::filesystem::path(paths::kAccountingDb).parent_path();
     struct statvfs volume {};
@@ -27,108 +35,198 @@ bool hasRoomToFlush() {
 }
 
 // A notice about our own trouble with notices would set off the next one.
-bool isOwnLog(const _SYSLOG_LOG_DATA_tag& record) {
-    return record.prog == "quorlogd" && record.ip == "127.0.0.1";
+bool isOwnLog(const store::Record& record) {
+    return record.prog == "quorlogd" &&
+           (record.ip == "127.0.0.1" || record.ip == "::1" || record.ip == "::ffff:127.0.0.1");
+}
+
+// The second in which the row was received; of former versions only the sender's is known.
+int64_t secondOf(const store::Record& record) {
+    return record.rsec != 0 ? record.rsec : record.utcsec;
+}
+
+// What a person wants to see of a match.
+std::string contentOf(const store::Record& record) {
+    const std::string program = record.prog + (record.pid.empty() ? "" : "[" + record.pid + "]");
+    return FitForNotice(record.ldate + " " + record.ltime + " " + program + ": " + record.msg);
+}
+
+// The filter's least seconds between two notices of a kind.
+int32_t intervalOf(const char* kind) {
+    StringTable section(QLIBCSzHashAlloc(16));
+    const bool read = QLIBCFileGetSection(paths::kNotifyFilter, kind, Adopt(section)) >= 0;
+    return read ? ToInt32(QLIBCSzHashGetValue(section.get(), "interval")) : 0;
+}
+
+// Whether a former version counted rows, and kept no position.
+bool isCountedWithoutPosition() {
+    return !store::Ask(paths::kAccountingDb,
+                       "SELECT 1 FROM histogram WHERE NOT EXISTS (SELECT 1 FROM followed) LIMIT 1", "1")
+                .empty();
 }
 
 }  // namespace
 
 Receiver::Receiver(const Options& options)
-    : maxWaiting_(options.maxWaiting), splitter_(options.maxLineBytes), budget_(options.noticesPerMinute, Clock::now()),
-      devices_(options.maxDevices) {
+    : options_(options), source_(store::ExpectSource(options.db)),
+      follower_(*source_, {}, [this](const std::string& identity) { return start(identity); }),
+      alarms_(options.noticesPerMinute, Clock::now()), devices_(options.maxDevices) {
     for (const QUORLOG_LOG_DEVICE_STATISTIC& row : accounting_.HistogramGet()) {
-        (void)devices_.admit(row.device);
+        devices_.know(row.device);
+    }
+    reloadRules();
+}
+
+// Where the rows of a database go on. Whatever is not known for certain is a Failure, and asked again: a guess would
+// count rows twice, or not at all.
+uint64_t Receiver::start(const std::string& identity) {
+    (void)accounting_.RowsUpdate(INT64_MAX);  // cannot fail
+    if (!follower_.identity().empty() && !flush()) {
+        throw Failure("the rows of the former database wait to be written", Cause::Busy);
+    }
+    if (!store::HasIdentity(identity)) {
+        store::GiveIdentity(options_.db);
+        throw Failure("the database has got its identity", Cause::Busy);
+    }
+    unsigned long long last = 0;
+    judged_ = 0;
+    const int known = accounting_.RowsPositionGet(identity, last, judged_);
+    if (known < 0) {
+        throw Failure(std::string("the position in ") + paths::kAccountingDb + " cannot be read", Cause::Other);
+    }
+    const bool adopted = known == 0 && isCountedWithoutPosition();
+    if (adopted) {
+        last = judged_ = LargestId(*source_, "logs");
+    }
+    accounting_.RowsPositionSet(last);
+    if (adopted && accounting_.RowsFlush2DB(identity, judged_) < 0) {
+        throw Failure(std::string(paths::kAccountingDb) + " cannot be written", Cause::Other);
+    }
+    return last;
+}
+
+bool Receiver::takeRows() {
+    if (accounting_.RowsWaiting() > options_.maxWaiting && !flush()) {
+        return false;
+    }
+    try {
+        const bool more = follower_.poll([this](const store::Record& record) { take(record); });
+        if (matched_) {
+            (void)flush();  // so that a crash repeats no notice
+        }
+        report("");
+        caughtUp_ = !more;
+        return more;
+    } catch (const Failure& failure) {
+        report(failure.what());
+        return false;
     }
 }
 
-void Receiver::take(std::string_view chunk) {
-    splitter_.feed(chunk, [this](const std::string& line) { takeLine(line); });
-}
-
-void Receiver::takeLine(const std::string& line) {
-    ++counters_.lines;
-    if (parser_.ParseSingleEntry(line, record_) < 0) {
-        ++counters_.bad;
-        return;
+// Once for each trouble, not with every look.
+void Receiver::report(const std::string& trouble) {
+    if (!trouble.empty() && trouble != trouble_) {
+        syslog(LOG_WARNING, "Waiting for %s: %s", options_.db.c_str(), trouble.c_str());
     }
-    (void)accounting_.LogInc(devices_.admit(record_.host));  // cannot fail
-    checkRules(record_);
+    trouble_ = trouble;
 }
 
-void Receiver::checkRules(const _SYSLOG_LOG_DATA_tag& record) {
+void Receiver::take(const store::Record& record) {
+    constexpr int64_t kDay = 86400;
+    ++counters_.rows;
+    const int64_t second = secondOf(record);
+    const std::string& device = devices_.admit(record.host, record.ip, second / kDay);
+    (void)accounting_.RowInc(device, second, record.id);  // cannot fail
+    if (record.id > judged_) {
+        judge(record, device);
+        judged_ = record.id;
+    }
+}
+
+void Receiver::judge(const store::Record& record, const std::string& device) {
     const bool severe = rules_.CheckSev(record.prio);
     const std::string keyword = rules_.CheckKeyword(record.msg);
     if ((!severe && keyword.empty()) || isOwnLog(record)) {
         return;
     }
     // The calls report their own failures.
-    const std::string content = FitForNotice(record.msg);
-    if (severe && mayNotify()) {
-        (void)rules_.NotificationSendSev(record.host, PriorTypeToStr(record.prio), content);
-        (void)Logger().LogAddNotifySev(record.prio, EventText(content));
+    if (severe && alarms_.grant(kSeverity, device, Clock::now())) {
+        matched_ = true;
+        (void)rules_.NotificationSendSev(record.host, PriorTypeToStr(record.prio), contentOf(record));
+        (void)Logger().LogAddNotifySev(record.prio, EventText(record.host + ": " + contentOf(record)));
     }
-    if (!keyword.empty() && mayNotify()) {
-        (void)rules_.NotificationSendKeyword(record.host, keyword, content);
-        (void)Logger().LogAddNotifyKw(EventText(keyword), EventText(content));
+    if (!keyword.empty() && alarms_.grant(kKeyword, device, Clock::now())) {
+        matched_ = true;
+        (void)rules_.NotificationSendKeyword(record.host, keyword, contentOf(record));
+        (void)Logger().LogAddNotifyKw(EventText(keyword), EventText(record.host + ": " + contentOf(record)));
     }
 }
 
-bool Receiver::mayNotify() {
-    const bool granted = budget_.take(Clock::now());
-    ++(granted ? counters_.notices : counters_.suppressed);
-    return granted;
+// Rows of a second may come a moment after it.
+void Receiver::tick() {
+    if (caughtUp_) {
+        (void)accounting_.RowsUpdate(time(nullptr) - 1);  // cannot fail
+    }
 }
 
 bool Receiver::flush() {
-    if (hasRoomToFlush() && accounting_.AccoutingFlush2DB() == 0) {
+    if (hasRoomToFlush() && accounting_.RowsFlush2DB(follower_.identity(), judged_) == 0) {
+        matched_ = false;
         return true;
     }
     ++counters_.failedFlushes;
-    const unsigned long long forgotten = accounting_.EpsListTrim(maxWaiting_);
-    counters_.forgottenSamples += forgotten;
-    syslog(LOG_WARNING, "Accounting is kept in memory until %s can be written; %llu samples were dropped",
-           paths::kAccountingDb, forgotten);
+    syslog(LOG_WARNING, "Rows wait to be counted until %s can be written", paths::kAccountingDb);
     return false;
 }
 
-void Receiver::closeSample() {
-    constexpr int kTries = 200;  // a sample ends with its second
-    for (int i = 0; i < kTries && accounting_.CurrentEpsGet() != 0; ++i) {
-        tick();
-        std::this_thread::sleep_for(std::chrono::milliseconds(accounting_.CurrentEpsGet() != 0 ? 10 : 0));
-    }
-}
-
 void Receiver::finish() {
-    splitter_.finish([this](const std::string& line) { takeLine(line); });
-    closeSample();
+    constexpr int kMostPieces = 64;
+    for (int i = 0; i < kMostPieces && takeRows(); ++i) {
+    }
+    (void)accounting_.RowsUpdate(INT64_MAX);  // cannot fail
     (void)flush();
-    reportBadLines();
 }
 
 void Receiver::reloadRules() {
     rules_ = NotificationManager();
     accounting_.RulesReload();
+    for (const char* kind : {kSeverity, kKeyword}) {
+        alarms_.setInterval(kind, intervalOf(kind));
+    }
 }
 
-void Receiver::reportBadLines() {
-    const uint64_t fresh = counters_.bad - counters_.badReported;
-    counters_.badReported = counters_.bad;
-    if (fresh != 0) {
-        syslog(LOG_WARNING, "%" PRIu64 " lines were not log entries: check the template of the destination", fresh);
+void Receiver::announceHeldBack() {
+    constexpr size_t kNamed = 10;
+    const auto counts = alarms_.takeHeldBack();
+    if (counts.empty()) {
+        return;
     }
+    std::string devices;
+    uint64_t total = 0;
+    for (const auto& [device, count] : counts) {
+        total += count;
+    }
+    for (size_t i = 0; i < counts.size() && i < kNamed; ++i) {
+        devices += (i == 0 ? "" : ", ") + counts[i].first + " (" + Decimal(counts[i].second) + ")";
+    }
+    devices += counts.size() > kNamed ? ", ..." : "";
+    const std::string text = "[" + Decimal(total) + "] more logs that match a rule were held back: " + devices;
+    (void)Logger().LogAdd(paths::kEventDb, 1, "SYSTEM", EventText("Event detection: " + text));
+    StringTable values(QLIBCSzHashAlloc(16));
+    (void)QLIBCSzHashSetValue(Adopt(values), "%COUNT%", Decimal(total).c_str());
+    (void)QLIBCSzHashSetValue(Adopt(values), "%DEVICES%", devices.c_str());
+    char tag[] = "QUORSYSLOG_HELD_BACK";
+    (void)rules_.NotificationSend(tag, Adopt(values));  // reports its own failure
 }
 
 std::string Receiver::statistics() const {
     const std::pair<const char*, uint64_t> figures[] = {
-        {" lines, ", counters_.lines},
-        {" bad, ", counters_.bad},
-        {" oversized, ", splitter_.oversized()},
+        {" rows, ", counters_.rows},
         {" devices, ", devices_.count()},
-        {" notices, ", counters_.notices},
-        {" notices suppressed, ", counters_.suppressed},
+        {" notices, ", alarms_.granted()},
+        {" held back, ", alarms_.heldBack()},
         {" flushes failed, ", counters_.failedFlushes},
-        {" samples dropped", counters_.forgottenSamples},
+        {" the last row", follower_.position()},
     };
     std::string text;
     for (const auto& [name, figure] : figures) {

@@ -1,15 +1,16 @@
-// What becomes of each line: it is parsed, accounted and checked against the rules.
+// What becomes of each stored row: it is accounted and checked against the rules, once.
 #ifndef QUORLOGD_RECEIVER_H
 #define QUORLOGD_RECEIVER_H
 
 #include <cstdint>
+#include <memory>
 #include <string>
 
 #include "accounting.h"
 #include "notification.h"
-#include "parser.h"
-#include "tools/quorlogd/bounds.h"
-#include "tools/quorlogd/linesplitter.h"
+#include "store/follower.h"
+#include "tools/quorlogd/alarms.h"
+#include "tools/quorlogd/devices.h"
 #include "tools/quorlogd/options.h"
 
 namespace quor {
@@ -18,44 +19,42 @@ class Receiver {
   public:
     explicit Receiver(const Options& options);
 
-    void take(std::string_view chunk);
-    // Nothing follows: takes the last line, closes the open sample and writes what is there.
-    void finish();
+    // Takes a piece of the rows that have arrived. False when there is no more for now, or when the accounting database
+    // has to be written first. What keeps it from reading is reported, and tried again with the next call.
+    bool takeRows();
     // Closes the open sample when its second has passed.
-    void tick() { (void)accounting_.CurEpsUpdate(); }  // cannot fail
-    // Writes when the library says that it is time to. False when the database did not take it; what waits is then
-    // bounded.
-    bool flushIfDue() { return !accounting_.isNeed2Flush() || flush(); }
+    void tick();
+    // Writes what was counted. False when the database did not take it.
     bool flush();
+    // Takes what is there, and writes it.
+    void finish();
     void reloadRules();
-    // Reports the lines that could not be read since the last report.
-    void reportBadLines();
+    // Records and announces what was held back since the last call.
+    void announceHeldBack();
     std::string statistics() const;
 
   private:
-    void takeLine(const std::string& line);
-    void checkRules(const _SYSLOG_LOG_DATA_tag& record);
-    bool mayNotify();
-    void closeSample();
+    uint64_t start(const std::string& identity);
+    void take(const store::Record& record);
+    void judge(const store::Record& record, const std::string& device);
+    void report(const std::string& trouble);
 
     struct Counters {
-        uint64_t lines = 0;
-        uint64_t bad = 0;
-        uint64_t badReported = 0;
-        uint64_t notices = 0;
-        uint64_t suppressed = 0;
+        uint64_t rows = 0;
         uint64_t failedFlushes = 0;
-        uint64_t forgottenSamples = 0;
     };
 
-    unsigned long long maxWaiting_;
-    LineSplitter splitter_;
-    LogParser parser_;
-    _SYSLOG_LOG_DATA_tag record_;
+    const Options& options_;
+    std::unique_ptr<store::Source> source_;
+    store::Follower follower_;
     AccountingManager accounting_;
     NotificationManager rules_;
-    NoticeBudget budget_;
-    DeviceNames devices_;
+    Alarms alarms_;
+    Devices devices_;
+    unsigned long long judged_ = 0;  // rows up to this one need not be judged any more
+    bool matched_ = false;           // since the position was written
+    bool caughtUp_ = false;
+    std::string trouble_;  // reported last
     Counters counters_;
 };
 

@@ -37,7 +37,7 @@ int run(const OutputOptions& options) {
     Tally tally;
     for (std::string entry; std::getline(std::cin, entry);) {
         ++tally.line;
-        _SYSLOG_LOG_DATA_tag record;
+        store::Record record;
         if (parser.ParseSingleEntry(entry, record) == 0) {
             sink.add(record);
         } else {

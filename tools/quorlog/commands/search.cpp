@@ -107,7 +107,8 @@ int follow(const SearchOptions& options, const store::Source& source, const stor
     follower.last(options.limited ? options.limit : kFollowRows, print);
     sink.flush();
     while (ticker.wait()) {
-        follower.poll(print);
+        while (follower.poll(print)) {
+        }
         sink.flush();
     }
     sink.finish();

@@ -1,0 +1,138 @@
+#!/usr/bin/env bash
+# The receiving chain under bursts, locks, kills and restarts. After each trial every stored row must be counted once; what
+# was lost on the way to the database, or stored twice, is told.
+# Usage: try-faults.sh BUILD_FOLDER [KILLS [LOCK_SECONDS [BURST]]]     KEEP=1: leave the data for a look
+set -euo pipefail
+cd "$(dirname "$0")/.."
+. scripts/receive.sh
+
+build=$(cd "$1" && pwd)
+kills=${2:-5}
+lock_seconds=${3:-5}
+burst=${4:-100000}
+port=${QUOR_FAULTS_PORT:-15914}
+root=$build/root
+db=$root/var/log/quorlog/syslog.db
+accounting=$root/var/log/quorlog/.QUORACCOUNTDB
+run=$(mktemp -d /tmp/quor-faults-XXXXXX)
+syslog_ng=
+quorlogd=
+status=0
+patience=120
+
+fail() {
+    echo "try-faults.sh: $*" >&2
+    exit 1
+}
+finish() {
+    end TERM "$syslog_ng"
+    end TERM "$quorlogd"
+    [ -n "${KEEP:-}" ] || rm -rf "$run"
+}
+trap finish EXIT
+
+start() { start_syslog_ng "$run" "$port" "$db"; }
+follow() { start_quorlogd "$build" "$db"; }
+ask() { sqlite3 -readonly "$1" '.timeout 10000' "$2" 2> /dev/null; }
+now() { date +%s%N; }
+# Milliseconds of processor time so far of a process.
+used() { awk '{ print ($14 + $15) * 10 }' "/proc/$1/stat"; }
+rows() { ask "$db" 'SELECT count(*) FROM logs'; }
+total() { ask "$accounting" 'SELECT ifnull(sum(count), 0) FROM histogram'; }
+samples() { ask "$accounting" 'SELECT ifnull(sum(eps), 0) FROM eps'; }
+of_trial() { ask "$db" "SELECT $1 FROM logs WHERE prog = '$trial'"; }
+quiet() {
+    local before
+    before=$(rows)
+    sleep 2
+    [ "$(rows)" = "$before" ]
+}
+counted() {
+    kill -USR2 "$quorlogd"
+    [ "$(total)" = "$(rows)" ] && [ "$(samples)" = "$(rows)" ]
+}
+send() { python3 scripts/send-numbered.py "$port" "$trial" "$@" > "$run/sent"; }
+shortly() { sleep "0.$((RANDOM % 9))$((RANDOM % 10))"; }
+
+# A line of the table: of one trial, whose name is in $trial.
+report() {
+    local sent stored different note=$1
+    await "the end of $trial" quiet
+    await "the accounting of $trial" counted
+    sent=$(cat "$run/sent") stored=$(of_trial 'count(*)') different=$(of_trial 'count(DISTINCT msg)')
+    printf '%-16s %9d %9d %7d %7d %9d  %s\n' "$trial" "$sent" "$stored" $((sent - different)) $((stored - different)) \
+        "$(total)" "$note"
+    [ "$lossless" != yes ] || [ "$sent/$stored" = "$different/$different" ] || status=1
+}
+
+all_there() { [ "$(of_trial 'count(*)')" -ge "$burst" ]; }
+try_burst() { # CONNECTIONS
+    local begin used_before taken stored
+    trial=burst-$1 begin=$(now) used_before=$(($(used "$syslog_ng") + $(used "$quorlogd")))
+    send "$burst" "$1"
+    taken=$((($(now) - begin) / 1000000))
+    await "the arrival of $trial" all_there
+    stored=$((($(now) - begin) / 1000000))
+    report "taken in $taken ms, stored in $stored ms"
+    echo "                 processor time a message: $(((($(used "$syslog_ng") + $(used "$quorlogd")) - used_before) * 1000 / burst)) us"
+}
+
+try_lock() {
+    trial=lock-${lock_seconds}s
+    send $((2000 * (lock_seconds + 4))) 1 2000 &
+    sleep 1
+    python3 -c 'import sqlite3, sys, time
+db = sqlite3.connect(sys.argv[1], timeout=60, isolation_level=None)
+db.execute("BEGIN EXCLUSIVE")
+time.sleep(float(sys.argv[2]))' "$db" "$lock_seconds"
+    wait %send
+    report "2,000 a second"
+}
+
+# try_ends NAME SIGNAL WHAT...: ends processes again and again while messages arrive, and starts them anew.
+try_ends() {
+    local signal=$2 process=$3
+    trial=$1
+    send $((kills * 8000)) 4 6000 &
+    for _ in $(seq "$kills"); do
+        shortly
+        [ "$process" = quorlogd ] || { end "$signal" "$syslog_ng" && start; }
+        [ "$process" = syslog-ng ] || { end "$signal" "$quorlogd" && follow; }
+    done
+    wait %send
+    report "$kills times"
+}
+
+try_unreadable_counts() {
+    trial=unreadable
+    end TERM "$quorlogd"
+    mv "$accounting" "$run/counts"
+    mkdir "$accounting"
+    follow
+    send 10000 1 5000
+    sleep 1
+    kill -0 "$quorlogd" 2> /dev/null || echo "                 quorlogd ended"
+    rmdir "$accounting"
+    mv "$run/counts" "$accounting"
+    kill -0 "$quorlogd" 2> /dev/null || follow
+    report "counts unreadable at the start, then put back"
+}
+
+rm -rf "$root/var/log/quorlog" "$root/etc/quorsyslog" "$root/usr/quor/etc" "$root/run"
+mkdir -p "$root/var/log/quorlog" "$root/etc/quorsyslog" "$root/usr/quor/etc"
+start
+follow
+printf '%-16s %9s %9s %7s %7s %9s\n' trial sent stored lost twice counted
+lossless=yes
+for connections in 1 10 200; do try_burst $connections; done
+try_lock
+try_ends kill-quorlogd KILL quorlogd
+try_ends stop-quorlogd TERM quorlogd
+try_unreadable_counts
+lossless=
+try_ends kill-syslog-ng KILL syslog-ng
+try_ends kill-both KILL both
+try_ends stop-syslog-ng TERM syslog-ng
+[ "$(ask "$db" 'PRAGMA integrity_check')" = ok ] || fail "the log database is damaged"
+echo "$(rows) rows, $(total) counted, $(samples) in the samples of the rate"
+[ "$status" = 0 ] || fail "messages were lost, stored twice or not counted where that must not happen"
