@@ -1,21 +1,17 @@
 #include <cstdlib>
 
+#include "base/guards.h"
 #include "quor/quorcore.h"
 
 QLIBSZLIST* QLIBCSzListAlloc(int size) {
     if (size < 1) {
         return nullptr;
     }
-    auto* list = static_cast<QLIBSZLIST*>(calloc(1, sizeof(QLIBSZLIST)));
-    if (list == nullptr) {
-        return nullptr;
+    quor::Guard<QLIBSZLIST, QLIBCSzListFree> list(static_cast<QLIBSZLIST*>(calloc(1, sizeof(QLIBSZLIST))));
+    if (list != nullptr) {
+        list->items = static_cast<char**>(calloc(static_cast<size_t>(size), sizeof(char*)));
     }
-    list->items = static_cast<char**>(calloc(static_cast<size_t>(size), sizeof(char*)));
-    if (list->items == nullptr) {
-        free(list);
-        return nullptr;
-    }
-    return list;
+    return list != nullptr && list->items != nullptr ? list.release() : nullptr;
 }
 
 void QLIBCSzListFree(QLIBSZLIST* list) {

@@ -11,10 +11,8 @@
 
 namespace {
 
-constexpr size_t kMaxFileBytes = 1U << 20U;
-
 bool readFile(const char* file, std::string& text) {
-    return quor::ReadTextFile(file, kMaxFileBytes, text) == quor::ReadOutcome::Done;
+    return quor::ReadTextFile(file, quor::kMostSectionBytes, text) == quor::ReadOutcome::Done;
 }
 
 std::vector<std::string_view> sectionNames(const quor::SectionLines& lines) {
@@ -65,11 +63,11 @@ int getSection(const char* file, const char* section, QLIBSZHASH& table) {
 
 int setSection(const char* file, const quor::SectionChange& change) {
     std::string text;
-    if (quor::ReadTextFile(file, kMaxFileBytes, text) == quor::ReadOutcome::Failed) {
+    if (quor::ReadTextFile(file, quor::kMostSectionBytes, text) == quor::ReadOutcome::Failed) {
         return -1;
     }
     const std::optional<std::string> changed = quor::ChangeSection(text, change);
-    const bool fits = changed && changed->size() <= kMaxFileBytes;
+    const bool fits = changed && changed->size() <= quor::kMostSectionBytes;
     return fits && quor::ReplaceTextFile(file, *changed) ? 0 : -1;
 }
 

@@ -11,6 +11,8 @@
 
 namespace quor {
 
+constexpr size_t kMostSectionBytes = 1U << 20U;  // a longer file is not read
+
 // One line; the views point into the text that was read.
 struct SectionLine {
     enum class Kind { Other, Header, Entry };

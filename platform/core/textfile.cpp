@@ -8,6 +8,7 @@
 #include <cstdio>
 #include <filesystem>
 
+#include "base/files.h"
 #include "base/guards.h"
 
 namespace quor {
@@ -27,17 +28,7 @@ class Draft {
         }
     }
 
-    bool write(const std::string& text) const {
-        size_t done = 0;
-        while (done < text.size()) {
-            const ssize_t written = ::write(file_.get(), text.data() + done, text.size() - done);
-            if (written < 0 && errno != EINTR) {
-                return false;
-            }
-            done += written > 0 ? static_cast<size_t>(written) : 0;
-        }
-        return static_cast<bool>(file_);
-    }
+    bool write(const std::string& text) const { return file_ && WriteAll(file_, text); }
 
     bool takeOwnerAndMode(const std::string& original) const {
         struct stat old {};
@@ -81,19 +72,6 @@ void syncFolder(const fs::path& folder) {
     (void)fsync(opened.get());  // some file systems cannot; the file itself is on the disk
 }
 
-bool readAll(int file, size_t size, std::string& text) {
-    text.resize(size);
-    size_t done = 0;
-    while (done < size) {
-        const ssize_t got = read(file, text.data() + done, size - done);
-        if (got == 0 || (got < 0 && errno != EINTR)) {
-            break;
-        }
-        done += got > 0 ? static_cast<size_t>(got) : 0;
-    }
-    return done == size;
-}
-
 }  // namespace
 
 ReadOutcome ReadTextFile(const std::string& path, size_t limit, std::string& text) {
@@ -105,8 +83,9 @@ ReadOutcome ReadTextFile(const std::string& path, size_t limit, std::string& tex
     if (fstat(file.get(), &found) != 0 || !S_ISREG(found.st_mode) || found.st_size > static_cast<off_t>(limit)) {
         return ReadOutcome::Failed;
     }
-    std::string content;
-    if (!readAll(file.get(), static_cast<size_t>(found.st_size), content) || content.find('\0') != std::string::npos) {
+    std::string content(static_cast<size_t>(found.st_size), '\0');
+    const bool whole = ReadAt(file, 0, content.data(), content.size()) == content.size();
+    if (!whole || content.find('\0') != std::string::npos) {
         return ReadOutcome::Failed;
     }
     text.swap(content);

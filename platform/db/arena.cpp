@@ -23,34 +23,30 @@ uint64_t memoryBudget() {
 }
 
 // Large chunks ask for large pages: filling memory page by page costs as much as copying the texts.
-char* allocate(size_t size) {
+CText allocate(size_t size) {
     constexpr size_t kLargePage = 2U << 20U;
-    void* memory = size % kLargePage == 0 ? aligned_alloc(kLargePage, size) : malloc(size);
+    const bool large = size % kLargePage == 0;
+    CText memory(static_cast<char*>(large ? aligned_alloc(kLargePage, size) : malloc(size)));
     if (memory == nullptr) {
         throw std::bad_alloc();
     }
-    if (size % kLargePage == 0) {
-        madvise(memory, size, MADV_HUGEPAGE);
+    if (large) {
+        madvise(memory.get(), size, MADV_HUGEPAGE);
     }
-    return static_cast<char*>(memory);
+    return memory;
 }
 
-char* resize(char* memory, size_t size) {
-    void* moved = realloc(memory, size);
+char* resize(CText& memory, size_t size) {
+    void* moved = realloc(memory.get(), size);
     if (moved == nullptr) {
         throw std::bad_alloc();
     }
-    return static_cast<char*>(moved);
+    (void)memory.release();
+    memory.reset(static_cast<char*>(moved));
+    return memory.get();
 }
 
 }  // namespace
-
-Arena::~Arena() {
-    for (size_t i = 0; i < chunks_.size() && !inFile(i); ++i) {
-        free(chunks_[i].data);
-    }
-    free(buffer_);
-}
 
 bool Arena::grow(size_t kept, size_t size) {
     if (size > UINT32_MAX) {
@@ -60,28 +56,28 @@ bool Arena::grow(size_t kept, size_t size) {
         enlarge(size);
         return true;
     }
-    if (buffer_ != nullptr) {
+    if (spilling()) {
         return moveToFile(kept, size);
     }
     addChunk(kept, size);
     return true;
 }
 
-// Larger and larger, so that a small result stays small.
+// Larger and larger, so that a small result stays small. The first chunk that is too much for memory becomes the buffer
+// of all that follow.
 void Arena::addChunk(size_t kept, size_t size) {
     const size_t next =
         chunks_.empty() ? kFirstChunk : std::min<size_t>(kLargestChunk, chunks_.back().size * size_t{2});
     const size_t taken = std::max(size, next);
     chunks_.reserve(chunks_.size() + 1);
-    char* data = allocate(taken);
+    char* data = memory_.emplace_back(allocate(taken)).get();
     if (kept > 0) {
         memcpy(data, end_, kept);
     }
-    if (memory_ + taken > memoryBudget()) {
+    if (memorySize_ + taken > memoryBudget()) {
         firstInFile_ = chunks_.size();
-        buffer_ = data;
     }
-    memory_ += taken;
+    memorySize_ += taken;
     chunks_.push_back({data, 0, static_cast<uint32_t>(taken)});
     end_ = data;
     room_ = taken;
@@ -91,25 +87,22 @@ void Arena::addChunk(size_t kept, size_t size) {
 void Arena::enlarge(size_t size) {
     Chunk& chunk = chunks_.back();
     const size_t taken = std::max(size, std::min<size_t>(UINT32_MAX, chunk.size * size_t{2}));
-    char* data = resize(chunk.data, taken);
-    if (buffer_ != nullptr) {
-        buffer_ = data;
-    }
-    chunk.data = end_ = data;
+    chunk.data = end_ = resize(memory_.back(), taken);
     chunk.size = static_cast<uint32_t>(taken);
     room_ = taken;
 }
 
 // Writes the full buffer and starts the next chunk in it.
 bool Arena::moveToFile(size_t kept, size_t size) {
+    char* buffer = memory_.back().get();
     Chunk& full = chunks_.back();
-    if (!file_.write(buffer_, full.used)) {
+    if (!file_.write(buffer, full.used)) {
         return false;
     }
-    memmove(buffer_, end_, kept);
+    memmove(buffer, end_, kept);
     full.data = nullptr;
-    chunks_.push_back({buffer_, 0, full.size});
-    end_ = buffer_;
+    chunks_.push_back({buffer, 0, full.size});
+    end_ = buffer;
     room_ = chunks_.back().size;
     return reserve(kept, size);
 }
@@ -128,15 +121,14 @@ bool Arena::finish() {
         return true;
     }
     Chunk& last = chunks_.back();
-    if (buffer_ == nullptr) {
-        last.data = resize(last.data, std::max<size_t>(last.used, 1));
+    if (!spilling()) {
+        last.data = resize(memory_.back(), std::max<size_t>(last.used, 1));
         return true;
     }
-    if (!file_.write(buffer_, last.used)) {
+    if (!file_.write(last.data, last.used)) {
         return false;
     }
-    free(buffer_);
-    buffer_ = nullptr;
+    memory_.pop_back();
     char* data = file_.map();
     for (size_t i = firstInFile_; i < chunks_.size(); ++i) {
         chunks_[i].data = data;

@@ -17,11 +17,6 @@ class Arena {
         uint32_t offset = 0;
     };
 
-    Arena() = default;
-    Arena(const Arena&) = delete;
-    Arena& operator=(const Arena&) = delete;
-    ~Arena();
-
     // The record being built. It moves when reserve() has to.
     char* record() { return end_; }
     // Room for `size` bytes of that record, of which `kept` are written already. False when the temporary file cannot
@@ -49,12 +44,13 @@ class Arena {
     void addChunk(size_t kept, size_t size);
     void enlarge(size_t size);
     bool moveToFile(size_t kept, size_t size);
+    bool spilling() const { return chunks_.size() > firstInFile_; }
     bool inFile(size_t chunk) const { return chunk >= firstInFile_; }
 
     std::vector<Chunk> chunks_;
+    std::vector<CText> memory_;      // of the first chunks; behind them the buffer of those on their way to the file
     size_t firstInFile_ = SIZE_MAX;  // the chunks from this one on
-    uint64_t memory_ = 0;
-    char* buffer_ = nullptr;  // the chunk on its way to the file
+    uint64_t memorySize_ = 0;
     SpillFile file_;
     char* end_ = nullptr;
     size_t room_ = 0;

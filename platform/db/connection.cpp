@@ -4,8 +4,9 @@
 #include <sys/stat.h>
 
 #include <memory>
-#include <new>
 #include <string>
+
+#include "base/guarded.h"
 
 namespace {
 
@@ -27,24 +28,25 @@ bool isFile(const char* path) {
     return stat(path, &status) == 0 && S_ISREG(status.st_mode);
 }
 
+// A file that cannot be written is opened for reading. One thread at a time uses a connection.
+DBConnect_tag* connect(const char* path) {
+    constexpr int kFlags = SQLITE_OPEN_READWRITE | SQLITE_OPEN_NOMUTEX;
+    auto connection = std::make_unique<DBConnect_tag>();
+    if (sqlite3_open_v2(plainName(path).c_str(), quor::Adopt(connection->db), kFlags, nullptr) != SQLITE_OK) {
+        return nullptr;
+    }
+    sqlite3_busy_timeout(connection->db.get(), kBusyMilliseconds);
+    sqlite3_wal_autocheckpoint(connection->db.get(), kCheckpointPages);
+    return connection.release();
+}
+
 }  // namespace
 
-DBConnect_tag* QUORDBConnect(const char* /*host*/, const char* /*user*/, const char* /*password*/,
-                             const char* path) try {
+DBConnect_tag* QUORDBConnect(const char* /*host*/, const char* /*user*/, const char* /*password*/, const char* path) {
     if (path == nullptr || !isFile(path)) {
         return nullptr;
     }
-    auto connection = std::make_unique<DBConnect_tag>();
-    // One thread at a time uses a connection. A file that cannot be written is opened for reading.
-    const int flags = SQLITE_OPEN_READWRITE | SQLITE_OPEN_NOMUTEX;
-    if (sqlite3_open_v2(plainName(path).c_str(), &connection->db, flags, nullptr) != SQLITE_OK) {
-        return nullptr;
-    }
-    sqlite3_busy_timeout(connection->db, kBusyMilliseconds);
-    sqlite3_wal_autocheckpoint(connection->db, kCheckpointPages);
-    return connection.release();
-} catch (const std::bad_alloc&) {
-    return nullptr;
+    return quor::Guarded<DBConnect_tag*>(nullptr, [path] { return connect(path); });
 }
 
 void QUORDBClose(DBConnect_tag* connection) {
@@ -52,9 +54,9 @@ void QUORDBClose(DBConnect_tag* connection) {
 }
 
 const char* QUORDBErrorGet(DBConnect_tag* connection) {
-    return connection != nullptr ? sqlite3_errmsg(connection->db) : "no database connection";
+    return connection != nullptr ? sqlite3_errmsg(connection->db.get()) : "no database connection";
 }
 
 void* QUORDBInternalDBHdlGet(DBConnect_tag* connection) {
-    return connection != nullptr ? connection->db : nullptr;
+    return connection != nullptr ? connection->db.get() : nullptr;
 }

@@ -4,15 +4,17 @@
 
 #include <sqlite3.h>
 
+#include "base/guards.h"
 #include "quor/quordb.h"
 
-struct DBConnect_tag {
-    sqlite3* db = nullptr;
+namespace quor {
 
-    DBConnect_tag() = default;
-    DBConnect_tag(const DBConnect_tag&) = delete;
-    DBConnect_tag& operator=(const DBConnect_tag&) = delete;
-    ~DBConnect_tag() { sqlite3_close_v2(db); }  // also ends a handle with statements of the caller's own
+using Database = Guard<sqlite3, sqlite3_close_v2>;  // statements of its own may still be open
+
+}  // namespace quor
+
+struct DBConnect_tag {
+    quor::Database db;
 };
 
 #endif

@@ -55,9 +55,9 @@ int guarded(DBConnect_tag* connection, const char* sql, DBResult_tag** result, P
         return -1;
     }
     try {
-        return execute(connection->db, prepare(connection->db), result);
+        return execute(connection->db.get(), prepare(connection->db.get()), result);
     } catch (const std::bad_alloc&) {
-        quor::SetError(connection->db, SQLITE_NOMEM, "out of memory");
+        quor::SetError(connection->db.get(), SQLITE_NOMEM, "out of memory");
         return -1;
     }
 }

@@ -5,8 +5,9 @@
 #include <sys/mman.h>
 #include <unistd.h>
 
-#include <cerrno>
 #include <string>
+
+#include "base/files.h"
 
 namespace quor {
 namespace {
@@ -44,17 +45,8 @@ bool SpillFile::write(const char* data, size_t size) {
     if (!file_) {
         file_ = openTemporary();
     }
-    while (size > 0) {
-        const ssize_t written = ::write(file_.get(), data, size);
-        if (written < 0 && errno != EINTR) {
-            return false;
-        }
-        const size_t done = written > 0 ? static_cast<size_t>(written) : 0;
-        data += done;
-        size -= done;
-        size_ += done;
-    }
-    return true;
+    size_ += size;
+    return WriteAll(file_, {data, size});
 }
 
 char* SpillFile::map() {

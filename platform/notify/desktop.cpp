@@ -1,11 +1,10 @@
 #include <fcntl.h>
-#include <sys/file.h>
 #include <sys/stat.h>
-#include <unistd.h>
 
 #include <cerrno>
 #include <cstring>
 
+#include "base/files.h"
 #include "base/paths.h"
 #include "platform/notify/delivery.h"
 #include "platform/notify/message.h"
@@ -19,10 +18,7 @@ constexpr off_t kMostBytes = off_t{1} << 20U;
 
 std::string append(const std::string& path, const std::string& line) {
     const Descriptor file(open(path.c_str(), O_WRONLY | O_APPEND | O_CREAT | O_CLOEXEC | O_NOFOLLOW, 0600));
-    if (!file || write(file.get(), line.data(), line.size()) != static_cast<ssize_t>(line.size())) {
-        return path + ": " + strerror(errno);
-    }
-    return "";
+    return file && WriteAll(file, line) ? "" : path + ": " + strerror(errno);
 }
 
 }  // namespace

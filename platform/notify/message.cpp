@@ -3,8 +3,10 @@
 #include <unistd.h>
 
 #include <algorithm>
-#include <array>
 #include <ctime>
+#include <iomanip>
+#include <locale>
+#include <sstream>
 
 #include "base/json.h"
 #include "base/utf8.h"
@@ -57,19 +59,13 @@ std::string encodedSubject(std::string_view subject) {
 
 // Independent of the locale, in UTC.
 std::string mailDate(int64_t seconds) {
-    static constexpr std::array<const char*, 7> kDays{"Sun", "Mon", "Tue", "Wed", "Thu", "Fri", "Sat"};
-    static constexpr std::array<const char*, 12> kMonths{"Jan", "Feb", "Mar", "Apr", "May", "Jun",
-                                                         "Jul", "Aug", "Sep", "Oct", "Nov", "Dec"};
     const auto clock = static_cast<time_t>(seconds);
     tm utc{};
-    if (gmtime_r(&clock, &utc) == nullptr) {
-        return "Thu, 01 Jan 1970 00:00:00 +0000";
-    }
-    char text[64];
-    (void)snprintf(text, sizeof text, "%s, %02d %s %d %02d:%02d:%02d +0000", kDays[static_cast<size_t>(utc.tm_wday)],
-                   utc.tm_mday, kMonths[static_cast<size_t>(utc.tm_mon)], utc.tm_year + 1900, utc.tm_hour, utc.tm_min,
-                   utc.tm_sec);
-    return text;
+    (void)gmtime_r(&clock, &utc);  // it fails for years that no clock shows
+    std::ostringstream date;
+    date.imbue(std::locale::classic());
+    date << std::put_time(&utc, "%a, %d %b %Y %H:%M:%S +0000");
+    return date.str();
 }
 
 std::string messageId() {

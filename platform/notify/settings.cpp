@@ -17,7 +17,6 @@ namespace {
 
 constexpr std::array<const char*, kSecurities> kSecurityNames{"none", "starttls", "tls"};
 constexpr std::array<int, kSecurities> kDefaultPorts{25, 587, 465};
-constexpr size_t kMostBytes = size_t{1} << 20U;
 constexpr int32_t kDefaultTimeout = 30;
 constexpr int32_t kLongestTimeout = 300;
 
@@ -27,7 +26,7 @@ class Keys {
     // Nothing when the file cannot be read.
     static std::optional<Keys> load() {
         Keys keys;
-        const bool read = ReadTextFile(paths::kSystemSettings, kMostBytes, *keys.text_) == ReadOutcome::Done;
+        const bool read = ReadTextFile(paths::kSystemSettings, kMostSectionBytes, *keys.text_) == ReadOutcome::Done;
         keys.lines_ = ParseSectionLines(*keys.text_);
         return read ? std::optional(std::move(keys)) : std::nullopt;
     }

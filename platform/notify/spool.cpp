@@ -12,6 +12,7 @@
 #include <string>
 #include <vector>
 
+#include "base/files.h"
 #include "base/numbers.h"
 #include "base/paths.h"
 #include "quor/quorfs.h"
@@ -102,8 +103,7 @@ std::optional<Notice> parsed(const std::string& text) {
 std::string readNotice(const std::string& path) {
     const Descriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK));
     std::string text(kMostNoticeBytes, '\0');
-    const ssize_t size = file ? read(file.get(), text.data(), text.size()) : 0;
-    text.resize(size > 0 ? static_cast<size_t>(size) : 0);
+    text.resize(ReadAt(file, 0, text.data(), text.size()));
     return text;
 }
 
@@ -142,8 +142,7 @@ bool Spool::put(const Notice& notice) const {
     const std::string unfinished = below("unfinished");
     const std::string text = serialised(notice);
     const Descriptor file = openOwn(unfinished, O_WRONLY | O_TRUNC);
-    return file && write(file.get(), text.data(), text.size()) == static_cast<ssize_t>(text.size()) &&
-           rename(unfinished.c_str(), path.c_str()) == 0;
+    return file && WriteAll(file, text) && rename(unfinished.c_str(), path.c_str()) == 0;
 }
 
 std::optional<Notice> Spool::take() const {

@@ -5,7 +5,7 @@ namespace {
 
 constexpr uint64_t kLongestRecord = 1000000000;  // SQLite's own limit
 
-// Bytes of a record that stand in its leaf page.
+// Bytes of a record that its leaf page holds.
 uint64_t localSize(uint64_t size, uint32_t usable) {
     const uint64_t most = usable - 35;
     if (size <= most) {

@@ -2,9 +2,8 @@
 
 #include <fcntl.h>
 #include <sys/stat.h>
-#include <unistd.h>
 
-#include <cerrno>
+#include "base/files.h"
 
 namespace quor::salvage {
 
@@ -19,15 +18,7 @@ bool InputFile::open(const std::string& path) {
 }
 
 size_t InputFile::read(uint64_t offset, uint8_t* out, size_t size) const {
-    size_t done = 0;
-    while (done < size) {
-        const ssize_t got = pread(file_.get(), out + done, size - done, static_cast<off_t>(offset + done));
-        if (got == 0 || (got < 0 && errno != EINTR)) {
-            break;
-        }
-        done += got > 0 ? static_cast<size_t>(got) : 0;
-    }
-    return done;
+    return ReadAt(file_, offset, out, size);
 }
 
 }  // namespace quor::salvage

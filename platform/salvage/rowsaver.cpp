@@ -79,7 +79,7 @@ bool RowSaver::visit(uint32_t number, std::vector<uint32_t>& next, const Taker& 
     return tick();
 }
 
-// A page that is no leaf has no rows.
+// Only leaf pages have rows.
 bool RowSaver::readLeaf(const Bytes& page, const TreePage& leaf, const Taker& take) {
     Row row;
     for (uint32_t i = 0; leaf.isLeaf() && i < leaf.cells(); ++i) {
@@ -92,7 +92,7 @@ bool RowSaver::readLeaf(const Bytes& page, const TreePage& leaf, const Taker& ta
     return true;
 }
 
-// The definitions that stand in the file itself: type, name, table, root page, SQL. One that is damaged keeps its root.
+// The definitions in the file itself: type, name, table, root page, SQL. One that is damaged keeps its root.
 bool RowSaver::readSchema() {
     if (file_.encoding() != 1) {
         return false;

@@ -7,11 +7,10 @@
 
 #include <string>
 
+#include "platform/db/connection.h"
 #include "platform/db/statement.h"
 
 namespace quor::salvage {
-
-using Database = Guard<sqlite3, sqlite3_close_v2>;  // tables may still hold statements of theirs
 
 // In memory, and empty.
 Database OpenScratch();

@@ -2,6 +2,7 @@
 #include <sys/wait.h>
 
 #include <chrono>
+#include <regex>
 
 #include "tests/notify/fixture.h"
 
@@ -24,20 +25,25 @@ TEST_F(Delivery, MailsCarryWhatWasReceivedAndNoHeaderOfItsMaking) {
     settings(mailTo(server.port(), "smtp_sender=\"log@example.com\"\n"));
     folder_.write("T.txt", "About %KEYWORD%\n\n%SYSLOG_CONTENT%\n");
     const std::string longWord = "k\xC3\xA4\xE2\x82\xAC" + std::string(100, 'y') + "\xF0\x9F\x98\x80";
-    // keyword, content, subject, body
-    const std::tuple<std::string, std::string, std::string, std::string> cases[]{
-        {"x", "a\\\"b\\\\c\t\x1b[2J .\r\n.\r\nQUIT", "About x", "a\"b\\c\t\x1b[2J .\r\n.\r\nQUIT"},
-        {"x\r\nBcc: evil@example.com\r\n\r\n", "caf\xC3\xA9", "About x  Bcc: evil@example.com    ", "caf\xC3\xA9"},
-        {longWord, "caf\xE9 \xFF\xC3\xA9", "About " + longWord, "caf\xE9 \xFF\xC3\xA9"},
-    };
+    // keyword, content, subject, body, its charset
+    const std::tuple<std::string, std::string, std::string, std::string, const char*> cases[]{
+        {"x", "a\\\"b\\\\c\t\x1b[2J .\r\n.\r\nQUIT", "About x", "a\"b\\c\t\x1b[2J .\r\n.\r\nQUIT", "utf-8"},
+        {"x\r\nBcc: evil@example.com\r\n\r\n", "caf\xC3\xA9", "About x  Bcc: evil@example.com    ", "caf\xC3\xA9",
+         "utf-8"},
+        {longWord, "caf\xE9 \xFF\xC3\xA9", "About " + longWord, "caf\xE9 \xFF\xC3\xA9", "iso-8859-1"}};
     const std::string headers =
         "auto-submitted,content-transfer-encoding,content-type,date,from,message-id,mime-version,subject,to";
+    SetClock(1'700'000'000);
     int mails = 0;
-    for (const auto& [keyword, content, subject, body] : cases) {
+    for (const auto& [keyword, content, subject, body, charset] : cases) {
         ASSERT_EQ(send({{"%KEYWORD%", keyword}, {"%SYSLOG_CONTENT%", content}}), 0);
-        // Sessions at a time, sender, recipients, login, header names, defects, subject.
-        EXPECT_EQ(server.received(++mails),
-                  (Strings{"1", "log@example.com", "one@example.com,two@example.com", "-", headers, "0", subject}));
+        Strings received = server.received(++mails);
+        EXPECT_TRUE(std::regex_match(received.back(), std::regex("<[0-9.]+@quornotify.invalid>"))) << received.back();
+        received.pop_back();
+        // Sessions at a time, sender, recipients, login, header names, defects, and what headers say.
+        EXPECT_EQ(received,
+                  (Strings{"1", "log@example.com", "one@example.com,two@example.com", "-", headers, "0", subject,
+                           "log@example.com", "one@example.com, two@example.com", "1700000000", charset}));
         EXPECT_EQ(server.body(mails), body + "\n");
     }
 }

@@ -165,6 +165,7 @@ TEST_F(Notices, FromManyProcessesAllArrive) {
         EXPECT_EQ(status, 0) << "a call failed";
     }
     arrived(100);
+    EXPECT_EQ(std::filesystem::file_size(kSpool + "/ledger"), 0U) << "without an interval nothing is remembered";
 }
 
 TEST_F(Notices, TheDesktopSpoolIsTurnedOver) {
@@ -210,10 +211,8 @@ TEST_F(Notices, GoWhereTheSettingsSay) {
     }
     for (const char* enabled : {"yes", "no"}) {
         settings(std::string("sms_enabled=") + enabled);
-        QUORSMSCONF* sms = QUORSmsConfGet();
-        ASSERT_NE(sms, nullptr);
-        EXPECT_EQ(sms->enabled, *enabled == 'y' ? 1 : 0);
-        QUORSmsConfFree(sms);
+        const Guard<QUORSMSCONF, QUORSmsConfFree> sms(QUORSmsConfGet());
+        EXPECT_TRUE(sms != nullptr && (sms->enabled != 0) == (*enabled == 'y'));
     }
     std::filesystem::remove(paths::kSystemSettings);
     QUORMAIL mail;

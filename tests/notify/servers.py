@@ -45,7 +45,8 @@ class Mails:
         global sessions
         mail = email.message_from_bytes(envelope.content, policy=email.policy.default)
         keep(most, envelope.mail_from, ",".join(envelope.rcpt_tos), getattr(session, "auth_data", None) or "-",
-             ",".join(sorted(name.lower() for name in mail.keys())), len(mail.defects), mail["Subject"],
+             ",".join(sorted(name.lower() for name in mail.keys())), len(mail.defects), mail["Subject"], mail["From"],
+             mail["To"], int(mail["Date"].datetime.timestamp()), mail.get_content_charset(), mail["Message-ID"],
              body=mail.get_payload(decode=True))
         sessions -= 1
         return "250 OK"

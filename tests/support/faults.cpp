@@ -69,44 +69,27 @@ int open(const char* path, int flags, ...) {
     return fails(Resource::Disk) ? -1 : Real(open, "open64")(path, flags, mode);
 }
 
-int mkostemp(char* name, int flags) {
-    return fails(Resource::Disk) ? -1 : Real(mkostemp, "mkostemp64")(name, flags);
-}
-
-FILE* fopen(const char* path, const char* mode) {
-    return fails(Resource::Disk) ? nullptr : Real(fopen, "fopen64")(path, mode);
-}
-
-ssize_t write(int file, const void* data, size_t size) {
-    return fails(Resource::Disk) ? -1 : Real(write, "write")(file, data, size);
-}
-
-ssize_t pwrite(int file, const void* data, size_t size, off_t offset) {
-    return fails(Resource::Disk) ? -1 : Real(pwrite, "pwrite64")(file, data, size, offset);
-}
-
-int ftruncate(int file, off_t size) noexcept {
-    return fails(Resource::Disk) ? -1 : Real(ftruncate, "ftruncate64")(file, size);
-}
+// A call with these parameters that fails in its place; `frees` as above.
+#define QUOR_FAULTY(type, failure, frees, name, real, parameters, ...)                                                 \
+    type name parameters {                                                                                             \
+        return fails(Resource::Disk, frees) ? (failure) : Real(name, real)(__VA_ARGS__);                               \
+    }
+QUOR_FAULTY(int, -1, false, mkostemp, "mkostemp64", (char* name, int flags), name, flags)
+QUOR_FAULTY(FILE*, nullptr, false, fopen, "fopen64", (const char* path, const char* mode), path, mode)
+QUOR_FAULTY(ssize_t, -1, false, write, "write", (int file, const void* data, size_t size), file, data, size)
+QUOR_FAULTY(ssize_t, -1, false, pwrite, "pwrite64", (int file, const void* data, size_t size, off_t at), file, data,
+            size, at)
+QUOR_FAULTY(int, -1, false, ftruncate, "ftruncate64", (int file, off_t size) noexcept, file, size)
+QUOR_FAULTY(int, -1, false, rename, "rename", (const char* from, const char* to) noexcept, from, to)
+QUOR_FAULTY(int, -1, true, unlink, "unlink", (const char* path) noexcept, path)
+QUOR_FAULTY(int, -1, false, mkdir, "mkdir", (const char* path, mode_t mode) noexcept, path, mode)
 
 int fsync(int /*file*/) {
     return fails(Resource::Disk) ? -1 : 0;
 }
 
-int fdatasync(int /*file*/) {
-    return fails(Resource::Disk) ? -1 : 0;
-}
-
-int rename(const char* from, const char* to) noexcept {
-    return fails(Resource::Disk) ? -1 : Real(rename, "rename")(from, to);
-}
-
-int unlink(const char* path) noexcept {
-    return fails(Resource::Disk, true) ? -1 : Real(unlink, "unlink")(path);
-}
-
-int mkdir(const char* path, mode_t mode) noexcept {
-    return fails(Resource::Disk) ? -1 : Real(mkdir, "mkdir")(path, mode);
+int fdatasync(int file) {
+    return fsync(file);
 }
 
 #ifdef __SANITIZE_ADDRESS__

@@ -33,7 +33,7 @@ void QLIBCSzListFree(QLIBSZLIST* list);
 /* Section files: "[name]" headers, key="value" lines (a value without quotes is read too, without the blanks around it;
  * nothing is escaped inside the quotes, the last quote of the line ends the value), "#" and ";" comment lines. Of
  * several sections with one name, and of several lines with one key in a section, the first counts. Lines after a
- * header that is not closed belong to no section; a line that is nothing of this is ignored. Line ends may be CRLF. A
+ * header that is not closed belong to no section; any other line is ignored. Line ends may be CRLF. A
  * file with a zero byte, one above 1 MiB and anything but a regular file cannot be read. */
 
 /* Appends the section names to `*list` in file order. */

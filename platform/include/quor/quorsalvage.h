@@ -1,7 +1,7 @@
 /* Saves the rows of a damaged SQLite database into a new one.
  *
  * The file is read by the file format itself, not through SQLite, so that a lost header, a missing end or a bad page
- * costs no more than the rows that stood there. The damaged file and its "-wal" companion are only read. */
+ * costs no more than the rows it held. The damaged file and its "-wal" companion are only read. */
 #ifndef QUOR_QUORSALVAGE_H
 #define QUOR_QUORSALVAGE_H
 
