@@ -32,14 +32,10 @@ class Draft {
 
     bool takeOwnerAndMode(const std::string& original) const {
         struct stat old {};
-        struct stat mine {};
         if (stat(original.c_str(), &old) != 0) {
             return errno == ENOENT && fchmod(file_.get(), 0644) == 0;
         }
-        const bool owned =
-            fstat(file_.get(), &mine) == 0 && ((mine.st_uid == old.st_uid && mine.st_gid == old.st_gid) ||
-                                               fchown(file_.get(), old.st_uid, old.st_gid) == 0);
-        return owned && fchmod(file_.get(), old.st_mode & 07777) == 0;
+        return fchown(file_.get(), old.st_uid, old.st_gid) == 0 && fchmod(file_.get(), old.st_mode & 07777) == 0;
     }
 
     bool replace(const std::string& target) {

@@ -165,6 +165,7 @@ TEST_F(Database, FieldsAreTheTextOfAnyValue) {
     for (const auto& [column, text] : cases) {
         EXPECT_EQ(field(0, column), text) << column;
     }
+    EXPECT_EQ(QUORDBExecute(connection_.get(), "UPDATE t SET name = 'x'", nullptr), 0);
     EXPECT_EQ(execute("CREATE TABLE empty(a)"), 0);
     EXPECT_EQ(field(0, "a"), "NULL") << "no columns";
 }
