@@ -18,6 +18,17 @@ class Delivery : public Notify {
         work();
         return std::chrono::duration<double>(std::chrono::steady_clock::now() - begin).count();
     }
+
+    // A process that holds a slot of ours and nothing of its caller's.
+    static bool isCleanWorker(const std::filesystem::path& process) {
+        std::error_code gone;
+        const auto link = [&](const char* name) {
+            return std::filesystem::read_symlink(process / name, gone).string();
+        };
+        return link("fd/3").rfind(paths::kNotifySpool, 0) == 0 && link("fd/1") == "/dev/null" && link("cwd") == "/" &&
+               ReadFile(process / "comm") == "quornotify\n" && getsid(std::stoi(process.filename())) != getsid(0) &&
+               ReadFile(process / "status").find("Umask:\t0077") != std::string::npos;
+    }
 };
 
 TEST_F(Delivery, MailsCarryWhatWasReceivedAndNoHeaderOfItsMaking) {
@@ -27,7 +38,8 @@ TEST_F(Delivery, MailsCarryWhatWasReceivedAndNoHeaderOfItsMaking) {
     const std::string longWord = "k\xC3\xA4\xE2\x82\xAC" + std::string(100, 'y') + "\xF0\x9F\x98\x80";
     // keyword, content, subject, body, its charset
     const std::tuple<std::string, std::string, std::string, std::string, const char*> cases[]{
-        {"x", "a\\\"b\\\\c\t\x1b[2J .\r\n.\r\nQUIT", "About x", "a\"b\\c\t\x1b[2J .\r\n.\r\nQUIT", "utf-8"},
+        {"\xC3\xA4", "a\\\"b\\\\c\t\x1b[2J .\r\n.\r\nQUIT", "About \xC3\xA4", "a\"b\\c\t\x1b[2J .\r\n.\r\nQUIT",
+         "utf-8"},
         {"x\r\nBcc: evil@example.com\r\n\r\n", "caf\xC3\xA9", "About x  Bcc: evil@example.com    ", "caf\xC3\xA9",
          "utf-8"},
         {longWord, "caf\xE9 \xFF\xC3\xA9", "About " + longWord, "caf\xE9 \xFF\xC3\xA9", "iso-8859-1"}};
@@ -110,7 +122,9 @@ TEST_F(Delivery, WebhooksGetValidJsonAndTellTheirFailures) {
     const std::string invalid = "\xED\xA0\x80\xC0\xAF\xF4\x90\x80\x80\xE2\x82" + std::string(2000, '\x02');
     const auto url = [](const std::string& port) { return "http://127.0.0.1:" + port + "/hook"; };
     settings("webhook_url=\"" + url(refusing.port()) + " " + url(good.port()) + "\"\n");
+    setenv("http_proxy", "http://127.0.0.1:9", 1);  // the caller's own
     ASSERT_EQ(send({{"%HOST%", "h\"\x01\xFF"}, {"%SYSLOG_CONTENT%", invalid}}), 0);
+    unsetenv("http_proxy");
     EXPECT_EQ(good.received(1), (Strings{"post", "application/json"}));  // comes only when it is UTF-8 and JSON
     EXPECT_EQ(good.body(1).rfind("{\"tag\":\"T\",", 0), 0U) << good.body(1);
     EXPECT_EQ(systemLog(1)[0], "Failed to send notice. webhook: the server answered 500");
@@ -132,6 +146,10 @@ TEST_F(Delivery, TheCallerNeitherWaitsNorKeepsAnything) {
             ASSERT_EQ(send({}), 0);
         }
     });
+    EXPECT_TRUE(Eventually([] {
+        const std::filesystem::directory_iterator processes("/proc");
+        return std::count_if(begin(processes), end(processes), isCleanWorker) == 3;
+    }));
     EXPECT_LT(seconds, 1.5) << "one answer of the server takes longer than six calls";
     EXPECT_EQ(waitpid(-1, nullptr, WNOHANG), 0) << "a zombie";  // the server alone is a child
 

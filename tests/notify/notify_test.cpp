@@ -56,6 +56,9 @@ TEST_F(Notices, ShowValuesAsTheyWereReceived) {
         EXPECT_EQ(notice["body"].asString(), body) << text;
     }
     EXPECT_EQ(notice["bodyBase64"].asString(), "6XoK");
+    notice = sent({{"%A%", std::string(70000, 'x')}});
+    EXPECT_EQ(notice["subject"].asString().size(), 240U);
+    EXPECT_EQ(notice["body"].asString(), std::string(65536, 'x') + "\n");
 }
 
 TEST_F(Notices, FailWithoutATemplateThatHasASubject) {
@@ -66,6 +69,11 @@ TEST_F(Notices, FailWithoutATemplateThatHasASubject) {
     settings("");
     EXPECT_EQ(send({}), 0);
     EXPECT_FALSE(std::filesystem::exists(kSpool)) << "no channel, nothing to do";
+    settings(kDesktopOn);
+    WriteFile(kSpool + "/ledger", "");
+    const Descriptor ledger(open((kSpool + "/ledger").c_str(), O_RDWR | O_CLOEXEC));
+    ASSERT_EQ(flock(ledger.get(), LOCK_EX), 0);
+    EXPECT_LT(send({}), 0) << "somebody holds the spool";
 }
 
 TEST_F(Notices, TheShippedFilesServeEveryTag) {

@@ -227,7 +227,9 @@ TEST_F(Sections, RefusesWhatWouldNotReadBack) {
     for (const char* key : {"a\nb", "a=b", "#a", ""}) {
         EXPECT_LT(set(file, "s", "s", {{key, "v"}}), 0) << key;
     }
-    EXPECT_LT(set(file, "s", "s", {{"k", "v"}}, "%s=\"%n\"\n"), 0);
+    for (const char* format : {"%s=\"%n\"\n", "%s=\n", "%s=%s", "%s=%s\n\n", "%s=%s%%\n", "%s%s\n"}) {
+        EXPECT_LT(set(file, "s", "s", {{"k", "v"}}, format), 0) << format;
+    }
     EXPECT_EQ(ReadFile(file), before);
 }
 
