@@ -1,4 +1,4 @@
-// No exception leaves a C interface: an allocation that fails gives the operation's failure value.
+// What stands between a C interface and the code behind it: no null pointer gets in, and no exception out.
 #ifndef BASE_GUARDED_H
 #define BASE_GUARDED_H
 
@@ -6,6 +6,12 @@
 
 namespace quor {
 
+template <typename... Pointers>
+bool AnyNull(const Pointers*... pointers) {
+    return ((pointers == nullptr) || ...);
+}
+
+// An allocation that fails gives the operation's failure value.
 template <typename Result, typename Body>
 Result Guarded(Result failure, const Body& body) noexcept {
     try {

@@ -90,7 +90,7 @@ int getKeyValue(const char* file, const char* key, char* out, size_t outSize) {
 }  // namespace
 
 int QLIBCFileEnumSection(const char* file, QLIBSZLIST** list) {
-    if (file == nullptr || list == nullptr || *list == nullptr || (*list)->count < 0) {
+    if (quor::AnyNull(file, list) || *list == nullptr || (*list)->count < 0) {
         return -1;
     }
     return quor::Guarded(-1, [&] {
@@ -100,7 +100,7 @@ int QLIBCFileEnumSection(const char* file, QLIBSZLIST** list) {
 }
 
 int QLIBCFileGetSection(const char* file, const char* section, QLIBSZHASH** hash) {
-    if (file == nullptr || section == nullptr || hash == nullptr || *hash == nullptr) {
+    if (quor::AnyNull(file, section, hash) || *hash == nullptr) {
         return -1;
     }
     return quor::Guarded(-1, [&] { return getSection(file, section, **hash); });
@@ -108,14 +108,14 @@ int QLIBCFileGetSection(const char* file, const char* section, QLIBSZHASH** hash
 
 int QLIBCFileSetSection(const char* file, const char* section, const char* newName, QLIBSZHASH* hash,
                         const char* lineFormat) {
-    if (file == nullptr || section == nullptr || newName == nullptr || hash == nullptr || lineFormat == nullptr) {
+    if (quor::AnyNull(file, section, newName, hash, lineFormat)) {
         return -1;
     }
     return quor::Guarded(-1, [&] { return setSection(file, {section, newName, *hash, lineFormat}); });
 }
 
 int QLIBCFileGetKeyValue(const char* file, const char* key, char* out, int outSize, int /*flags*/) {
-    if (file == nullptr || key == nullptr || out == nullptr || outSize < 1) {
+    if (quor::AnyNull(file, key, out) || outSize < 1) {
         return -1;
     }
     return quor::Guarded(-1, [&] { return getKeyValue(file, key, out, static_cast<size_t>(outSize)); });

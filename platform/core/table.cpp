@@ -7,7 +7,7 @@ QLIBSZHASH* QLIBCSzHashAlloc(int size) {
 }
 
 int QLIBCSzHashSetValue(QLIBSZHASH** hash, const char* key, const char* value) {
-    if (hash == nullptr || *hash == nullptr || key == nullptr || value == nullptr) {
+    if (quor::AnyNull(hash, key, value) || *hash == nullptr) {
         return -1;
     }
     return quor::Guarded(-1, [&] {
@@ -17,7 +17,7 @@ int QLIBCSzHashSetValue(QLIBSZHASH** hash, const char* key, const char* value) {
 }
 
 const char* QLIBCSzHashGetValue(QLIBSZHASH* hash, const char* key) {
-    if (hash == nullptr || key == nullptr) {
+    if (quor::AnyNull(hash, key)) {
         return nullptr;
     }
     const QLIBSZHASH::Entry* found = hash->find(key);

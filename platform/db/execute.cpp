@@ -2,6 +2,7 @@
 #include <memory>
 #include <new>
 
+#include "base/guarded.h"
 #include "platform/db/connection.h"
 #include "platform/db/result.h"
 #include "platform/db/statement.h"
@@ -51,7 +52,7 @@ int guarded(DBConnect_tag* connection, const char* sql, DBResult_tag** result, P
     if (result != nullptr) {
         *result = nullptr;
     }
-    if (connection == nullptr || sql == nullptr) {
+    if (quor::AnyNull(connection, sql)) {
         return -1;
     }
     try {

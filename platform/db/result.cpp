@@ -8,6 +8,8 @@
 #include <limits>
 #include <new>
 
+#include "base/guarded.h"
+
 namespace {
 
 constexpr uint32_t kStride = 64;
@@ -221,11 +223,11 @@ void DBResult_tag::moveTo(Position position) {
 }
 
 int QUORDBFetchRow(DBResult_tag* result, unsigned int* row) {
-    return result != nullptr && row != nullptr && result->next(*row) ? 0 : -1;
+    return !quor::AnyNull(result, row) && result->next(*row) ? 0 : -1;
 }
 
 const char* QUORDBFetchField(DBResult_tag* result, unsigned int row, const char* column) {
-    return result != nullptr && column != nullptr ? result->field(row, column) : nullptr;
+    return quor::AnyNull(result, column) ? nullptr : result->field(row, column);
 }
 
 int QUORDBNumRows(DBResult_tag* result) {

@@ -79,7 +79,7 @@ int test(void (*report)(const char*, int, const char*, void*), void* context) {
 
 int QUORSysNotifySendNotificationCustomized(const char* tag, const char* textsDir, const char* filterFile,
                                             QLIBSZHASH* values, int /*flags*/) {
-    if (tag == nullptr || textsDir == nullptr || values == nullptr) {
+    if (quor::AnyNull(tag, textsDir, values)) {
         return -1;
     }
     return quor::Guarded(-1, [&] { return quor::notify::send(tag, textsDir, filterFile, values); });

@@ -130,7 +130,7 @@ int QUORDBSalvage(const char* damaged, const char* fresh, const char* const* sch
     QUORSALVAGE local = {};
     QUORSALVAGE& out = report != nullptr ? *report : local;
     out = {};
-    if (damaged == nullptr || fresh == nullptr) {
+    if (quor::AnyNull(damaged, fresh)) {
         return quor::salvage::fail(out, "two files are needed");
     }
     (void)snprintf(out.error, sizeof out.error, "out of memory");

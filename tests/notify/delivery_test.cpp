@@ -25,7 +25,7 @@ class Delivery : public Notify {
         const auto link = [&](const char* name) {
             return std::filesystem::read_symlink(process / name, gone).string();
         };
-        return link("fd/3").rfind(paths::kNotifySpool, 0) == 0 && link("fd/1") == "/dev/null" && link("cwd") == "/" &&
+        return link("fd/3").rfind(paths::kNotifySpool, 0) == 0 && link("fd/2") == "/dev/null" && link("cwd") == "/" &&
                ReadFile(process / "comm") == "quornotify\n" && getsid(std::stoi(process.filename())) != getsid(0) &&
                ReadFile(process / "status").find("Umask:\t0077") != std::string::npos;
     }
