@@ -21,6 +21,12 @@ Result Guarded(Result failure, const Body& body) noexcept {
     }
 }
 
+// The same for an operation whose result is negative on failure.
+template <typename Body>
+int Guarded(const Body& body) noexcept {
+    return Guarded(-1, body);
+}
+
 }  // namespace quor
 
 #endif

@@ -47,5 +47,5 @@ int QUORFSMkdirP(const char* path, int /*reserved1*/, int /*reserved2*/, int uid
         return -1;
     }
     const Folder folder{static_cast<uid_t>(uid), static_cast<gid_t>(gid), mode & 07777};
-    return quor::Guarded(-1, [&] { return createAll(path, folder); });
+    return quor::Guarded([&] { return createAll(path, folder); });
 }

@@ -58,7 +58,7 @@ int QLIBServiceReload(const char* service) {
     if (service == nullptr || !isServiceName(service)) {
         return -1;
     }
-    return quor::Guarded(-1, [service] { return reload(service); });
+    return quor::Guarded([service] { return reload(service); });
 }
 
 int QLIBServicectlJobReload(const char* job) {

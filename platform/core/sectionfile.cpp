@@ -93,7 +93,7 @@ int QLIBCFileEnumSection(const char* file, QLIBSZLIST** list) {
     if (quor::AnyNull(file, list) || *list == nullptr || (*list)->count < 0) {
         return -1;
     }
-    return quor::Guarded(-1, [&] {
+    return quor::Guarded([&] {
         std::string text;
         return readFile(file, text) ? appendAll(**list, sectionNames(quor::ParseSectionLines(text))) : -1;
     });
@@ -103,7 +103,7 @@ int QLIBCFileGetSection(const char* file, const char* section, QLIBSZHASH** hash
     if (quor::AnyNull(file, section, hash) || *hash == nullptr) {
         return -1;
     }
-    return quor::Guarded(-1, [&] { return getSection(file, section, **hash); });
+    return quor::Guarded([&] { return getSection(file, section, **hash); });
 }
 
 int QLIBCFileSetSection(const char* file, const char* section, const char* newName, QLIBSZHASH* hash,
@@ -111,12 +111,12 @@ int QLIBCFileSetSection(const char* file, const char* section, const char* newNa
     if (quor::AnyNull(file, section, newName, hash, lineFormat)) {
         return -1;
     }
-    return quor::Guarded(-1, [&] { return setSection(file, {section, newName, *hash, lineFormat}); });
+    return quor::Guarded([&] { return setSection(file, {section, newName, *hash, lineFormat}); });
 }
 
 int QLIBCFileGetKeyValue(const char* file, const char* key, char* out, int outSize, int /*flags*/) {
     if (quor::AnyNull(file, key, out) || outSize < 1) {
         return -1;
     }
-    return quor::Guarded(-1, [&] { return getKeyValue(file, key, out, static_cast<size_t>(outSize)); });
+    return quor::Guarded([&] { return getKeyValue(file, key, out, static_cast<size_t>(outSize)); });
 }

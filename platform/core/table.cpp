@@ -10,7 +10,7 @@ int QLIBCSzHashSetValue(QLIBSZHASH** hash, const char* key, const char* value) {
     if (quor::AnyNull(hash, key, value) || *hash == nullptr) {
         return -1;
     }
-    return quor::Guarded(-1, [&] {
+    return quor::Guarded([&] {
         (*hash)->set(key, value);
         return 0;
     });

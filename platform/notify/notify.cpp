@@ -82,12 +82,12 @@ int QUORSysNotifySendNotificationCustomized(const char* tag, const char* textsDi
     if (quor::AnyNull(tag, textsDir, values)) {
         return -1;
     }
-    return quor::Guarded(-1, [&] { return quor::notify::send(tag, textsDir, filterFile, values); });
+    return quor::Guarded([&] { return quor::notify::send(tag, textsDir, filterFile, values); });
 }
 
 int QUORNotifyTest(void (*report)(const char* channel, int ok, const char* detail, void* context), void* context) {
     if (report == nullptr) {
         return -1;
     }
-    return quor::Guarded(-1, [&] { return quor::notify::test(report, context); });
+    return quor::Guarded([&] { return quor::notify::test(report, context); });
 }

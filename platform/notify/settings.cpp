@@ -106,7 +106,7 @@ std::optional<Settings> LoadSettings() {
 
 int QUORMailGet(QUORMAIL* mail) {
     using quor::notify::Keys;
-    return quor::Guarded(-1, [&] {
+    return quor::Guarded([&] {
         const std::optional<Keys> keys = mail != nullptr ? Keys::load() : std::nullopt;
         if (!keys) {
             return -1;

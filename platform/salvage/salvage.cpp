@@ -135,7 +135,7 @@ int QUORDBSalvage(const char* damaged, const char* fresh, const char* const* sch
     }
     (void)snprintf(out.error, sizeof out.error, "out of memory");
     const int result =
-        quor::Guarded(-1, [&] { return quor::salvage::salvageFile(damaged, fresh, schemas, progress, context, out); });
+        quor::Guarded([&] { return quor::salvage::salvageFile(damaged, fresh, schemas, progress, context, out); });
     if (result == 0) {
         out.error[0] = '\0';
     }
