@@ -46,6 +46,14 @@ TEST_F(Notices, ShowValuesAsTheyWereReceived) {
         {"%A%\n\n%A%\n", {{"%A%", "%HOST%"}, {"%HOST%", "h"}}, "%HOST%", "%HOST%\n"},
         {"S\n\n%SYSLOG_CONTENT%|%A%\n", {{"%SYSLOG_CONTENT%", R"(\"\\n\x)"}, {"%A%", R"(\")"}}, "S", "\"\\n\\x|\\\"\n"},
         {"%A%\n\n%A%\n", {{"%A%", "a\r\nBcc: x\x1b[31m\x7f"}}, "a  Bcc: x [31m ", "a\r\nBcc: x\x1b[31m\x7f\n"},
+        {"S\n\n%A%\n",
+         {{"%A%", "\xF4\x8F\xBF\xBF \xED\x9F\xBF \xEE\x80\x80 \xC2\x80 \xE0\xA0\x80 \xF0\x90\x80\x80"}},
+         "S",
+         "\xF4\x8F\xBF\xBF \xED\x9F\xBF \xEE\x80\x80 \xC2\x80 \xE0\xA0\x80 \xF0\x90\x80\x80\n"},
+        {"S\n\n%A%\n",
+         {{"%A%", "\xF4\x90\x80\x80 \xED\xBF\xBF \xC1\xBF \xE0\x9F\xBF \xF0\x8F\xBF\xBF \xE2\x82"}},
+         "S",
+         "\\xf4\\x90\\x80\\x80 \\xed\\xbf\\xbf \\xc1\\xbf \\xe0\\x9f\\xbf \\xf0\\x8f\\xbf\\xbf \\xe2\\x82\n"},
         {"%A%\n\n%A%\n", {{"%A%", "\xE9z"}}, "\xEF\xBF\xBDz", "\\xe9z\n"},
     };
     Json::Value notice;
