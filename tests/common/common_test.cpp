@@ -42,12 +42,18 @@ TEST(EncodeJson, EscapesQuotesAndBackslashesWithinTheBuffer) {
         EXPECT_EQ(EncodeJson("a\"\\\n\x01", out, size), -1) << size;
     }
     EXPECT_EQ(EncodeJson(out, out, 8), -1) << "in place";
+    EXPECT_EQ(EncodeJson(nullptr, out, 8) + EncodeJson("", nullptr, 8), -2);
+    EXPECT_EQ(EncodeJson("", out, 1), 0);
 }
 
 TEST(ReadFileInReverse, StoresLinesFromTheLast) {
     EXPECT_EQ(reversed("a\nb\n", 4), Strings({"", "b", "a", "(null)"}));
     EXPECT_EQ(reversed("a\nb", 5, 3), Strings({"(null)", "(null)", "(null)", "b", "a"}));
-    EXPECT_EQ(reversed(std::string(1030, 'x'), 1), Strings{std::string(1023, 'x')});
+    EXPECT_EQ(reversed("a\nb\nc", 2), Strings({"c", "b"}));
+    EXPECT_EQ(reversed("", 1), Strings{""});
+    EXPECT_EQ(reversed("", 1, 1), Strings{"(null)"});
+    EXPECT_EQ(reversed("a", 1, 1), Strings{"(null)"});
+    EXPECT_EQ(reversed(std::string("x\0y\n", 4) + std::string(1030, 'x'), 2), Strings({std::string(1023, 'x'), "x"}));
 }
 
 TEST(ReadFileInReverse, LeavesNoArrayForLessThanNoLines) {

@@ -78,20 +78,16 @@ TEST_F(Handle, KeepsTheFlagOfATransaction) {
     EXPECT_EQ(handle_.isInTran(), 1) << "disconnecting changed the flag";
 }
 
-TEST_F(Handle, CountsLogsAndFindsTables) {
-    handle_.DBCon();
-    EXPECT_EQ(handle_.DBInfoCntGet(), 2U);
-    EXPECT_EQ(handle_.DBcheckTableExist("logs"), 1);
-    EXPECT_EQ(handle_.DBcheckTableExist("x'; DROP TABLE logs; --"), 0);
-    EXPECT_EQ(lastMessage(), "Fail to execute SQL command : SELECT count(*) as count_result FROM sqlite_master WHERE "
-                             "type='table' AND name='x'; DROP TABLE logs; --'");
-}
-
 TEST_F(Handle, ChecksPointsTheLogAndRemovesItsFiles) {
     run("PRAGMA journal_mode=WAL");
     handle_.DBCon();
     handle_.DBExecute("DELETE FROM logs WHERE utcsec = 1");
+    SpyOnDb().failing = "PRAGMA wal_checkpoint(FULL);";
+    EXPECT_EQ(handle_.DBWalCheckpoint(true), -1);
+    EXPECT_EQ(lastMessage(), "Fail to force WAL checkpoint(FULL)");
+    SpyOnDb().failing = "";
     for (const bool remove : {false, true}) {
+        EXPECT_TRUE(fs::exists(path_ + "-wal"));
         EXPECT_EQ(handle_.DBWalCheckpoint(remove), 0);
         EXPECT_NE(fs::exists(path_ + "-wal"), remove);
         EXPECT_NE(fs::exists(path_ + "-shm"), remove);
@@ -100,6 +96,10 @@ TEST_F(Handle, ChecksPointsTheLogAndRemovesItsFiles) {
 
 class Metadata : public DatabaseTest {
   protected:
+    Metadata() {
+        FakeServices() = {};
+        SpyOnDb() = {};
+    }
     ~Metadata() override { handle_.DBDiscon(); }
 
     const std::string schema_ = folder_.write(
@@ -113,8 +113,62 @@ TEST_F(Metadata, AMissingDatabaseIsCreatedFromTheSchema) {
     ASSERT_EQ(handle_.DBCon(), 0);
     EXPECT_EQ(SqliteFile(new_).query("PRAGMA journal_mode"), Strings({"wal"}));
     EXPECT_EQ(handle_.DBcheckTableExist("db_info"), 1);
+    EXPECT_EQ(handle_.DBcheckTableExist("nothing"), 0);
+    EXPECT_EQ(handle_.DBInfoCntGet(), 0U);
     expectLog({"create database: " + new_ + " by " + schema_});
-    EXPECT_EQ(DBHandler(path_, folder_.path("none.sql")).DBCreate(), 0) << "the shell ran";
+    const std::string shell = "/bin/sh -c /usr/bin/sqlite3 \"" + new_ + "\" ";
+    EXPECT_EQ(FakeServices().commands, Strings({shell + "< " + schema_, shell + "\"PRAGMA journal_mode=WAL;\""}));
+    EXPECT_EQ(FakeServices().folders, Strings({folder_.path("a b/c d") + " 0 1 -1 -1 511"}));
+}
+
+TEST_F(Metadata, AStepOfTheCreationThatFailsIsReported) {
+    const std::string none = folder_.write("none.sql", "nonsense");
+    const std::string wal = "/usr/bin/sqlite3 \"" + path_ + "\" \"PRAGMA journal_mode=WAL;\"";
+    // The database, the command that fails, the result of connecting and the messages.
+    const std::tuple<std::string, const char*, int, Strings> cases[] = {
+        {"/proc/x/y.db", "", -1, {"Fail to create folder: /proc/x", "Fail to create database: /proc/x/y.db"}},
+        {path_, "<", -1, {"Fail to create database: " + path_ + "," + none, "Fail to create database: " + path_}},
+        {folder_.path(), "", -1, {"Fail to open db: " + folder_.path()}},
+        {path_,
+         "WAL",
+         0,
+         {"create database: " + path_ + " by " + none, "Fail to set jounal mode as WAL, use DELETE by default " + wal}},
+    };
+    for (const auto& [path, failing, result, messages] : cases) {
+        FakeServices().failing = failing;
+        DBHandler handle(path, none);
+        EXPECT_EQ(handle.DBCon(), result) << path;
+        expectLog(messages);
+        handle.DBDiscon();
+    }
+}
+
+TEST_F(Metadata, AStatementThatFailsIsReported) {
+    ASSERT_EQ(handle_.DBCon(), 0);
+    const std::tuple<std::string, long long, long long (*)(DBHandler&)> cases[] = {
+        {"UPDATE db_info SET start_time='0' WHERE id=1", -1,
+         [](auto& db) -> long long { return db.DBInfoStartSet(0); }},
+        {"UPDATE db_info SET end_time='7' WHERE id=1", -1, [](auto& db) -> long long { return db.DBInfoEndSet(7); }},
+        {"UPDATE db_info SET device='x'' WHERE id=1", -1, [](auto& db) -> long long { return db.DBInfoDevSet("x'"); }},
+        {"SELECT * FROM logs ORDER BY utcsec ASC LIMIT 1", 0, [](auto& db) { return db.DBInfoStartGet(); }},
+        {"SELECT * FROM logs ORDER BY utcsec DESC LIMIT 1", 0, [](auto& db) { return db.DBInfoEndGet(); }},
+    };
+    for (const auto& [statement, result, operation] : cases) {
+        SpyOnDb().failing = statement;
+        EXPECT_EQ(operation(handle_), result);
+        EXPECT_EQ(lastMessage(), "Fail to execute SQL command: " + statement);
+    }
+    SpyOnDb().failing = "SELECT";
+    _ARCH_DB_INFO_tag info;
+    info.device = "kept";
+    EXPECT_EQ(handle_.DBInfoGet(info), -1);
+    EXPECT_EQ(lastMessage() + info.device, "Fail to execute SQL command: SELECT * FROM db_infokept");
+    EXPECT_EQ(handle_.DBcheckTableExist("a'b"), 0);
+    EXPECT_EQ(lastMessage(), "Fail to execute SQL command : SELECT count(*) as count_result FROM sqlite_master WHERE "
+                             "type='table' AND name='a'b'");
+    SpyOnDb().failing = "text";
+    EXPECT_EQ(handle_.DBCmdEscape("x"), "");
+    expectLog({"Fail to escapse string"});
 }
 
 TEST_F(Metadata, TheInfoRowIsReadAndWritten) {
@@ -130,22 +184,20 @@ TEST_F(Metadata, TheInfoRowIsReadAndWritten) {
     EXPECT_EQ(info.end_time, 2147483647) << "times are read as 32 bits, saturated";
     EXPECT_EQ(info.log_count, 18446744073709551615ULL);
     EXPECT_EQ(info.device, "O'Neil");
-
-    EXPECT_EQ(handle_.DBInfoDevSet("x'; DELETE FROM db_info; --"), -1);
-    EXPECT_EQ(lastMessage(), "Fail to execute SQL command: UPDATE db_info SET device='x'; DELETE FROM db_info; --' "
-                             "WHERE id=1");
 }
 
 TEST_F(Metadata, TimesComeFromTheLogs) {
     setenv("TZ", "UTC-3", 1);
     tzset();
     ASSERT_EQ(handle_.DBCon(), 0);
+    EXPECT_EQ(handle_.DBInfoStartStrGet(), "1970-01-01");
+    EXPECT_EQ(lastMessage(), "Fail to get database start time");
     EXPECT_EQ(handle_.DBInfoEndStrGet(), "1970-01-01");
     EXPECT_EQ(lastMessage(), "Fail to get database end time");
     handle_.DBExecute("INSERT INTO logs VALUES(1767222000), (1767214800), (4294967296)");  // 23:00, 21:00 in UTC
     EXPECT_EQ(handle_.DBLogStartTimeGet(), 1767214800);
     EXPECT_EQ(handle_.DBInfoEndGet(), 2147483647) << "saturated too";
-    EXPECT_EQ(handle_.DBInfoStartStrGet(), "2026-01-01") << "a local date";
+    EXPECT_EQ(handle_.DBInfoStartStrGet() + handle_.DBInfoEndStrGet(), "2026-01-012038-01-19") << "local dates";
 }
 
 class Failure : public DatabaseTest {
@@ -218,13 +270,20 @@ TEST_F(Failure, OfACorruptDatabaseMovesItAsideAfterTheNotice) {
 }
 
 TEST_F(Failure, OfOneStepOfTheRecoveryLeavesTheOthers) {
+    FakeNotices().tablesFail = true;
+    EXPECT_EQ(DBErrorHandle_SQLITE_CORRUPT(nullptr, folder_.write("log.db", "x")), -1);
+    FakeNotices().tablesFail = false;
+    EXPECT_TRUE(FakeNotices().sent.empty());
     EXPECT_EQ(DBErrorHandle_SQLITE_CORRUPT(nullptr, folder_.path("none.db")), -1);
+    EXPECT_EQ(FakeNotices().sent.size(), 1U);
     EXPECT_TRUE(FakeServices().reloaded.empty());
     FakeServices().fail = true;
     FakeNotices().fail = true;
-    EXPECT_EQ(DBErrorHandle_SQLITE_CORRUPT(nullptr, folder_.write("log.db", "x")), -1);
+    EXPECT_EQ(DBErrorHandle_SQLITE_CORRUPT(nullptr, path_), -1);
     EXPECT_TRUE(fs::exists(path_ + ".corrupt"));
     EXPECT_EQ(lastMessage(), "dbhandler:88 Fail to send HUP signal to syslog-ng");
+    FakeServices().fail = false;
+    EXPECT_EQ(DBErrorHandle_SQLITE_CORRUPT(nullptr, folder_.write("log.db", "x")), 0);
 }
 
 class WorkingDb : public DatabaseTest {
@@ -251,6 +310,14 @@ TEST_F(WorkingDb, HangsUpTheSyslogNgThatIsInCharge) {
     }
 }
 
+TEST_F(WorkingDb, IsSwitchedToAWriteAheadLogByAShell) {
+    EXPECT_EQ(SyslogngWorkingDbSetJouWal("/none/a b"), 0) << "the shell ran";
+    EXPECT_EQ(FakeServices().commands, Strings({"/bin/sh -c /usr/bin/sqlite3 /none/a b \"PRAGMA journal_mode=WAL;\""}));
+    FakeServices().failing = "sqlite3";
+    EXPECT_EQ(SyslogngWorkingDbSetJouWal(path_), -1);
+    expectLog({"Fail to set jounal mode as WAL, use DELETE by default"});
+}
+
 TEST_F(WorkingDb, IsRemovedAboveItsLimitInWholeKibibytes) {
     using Case = std::tuple<uintmax_t, int, bool>;
     for (const auto& [bytes, limitKB, kept] :
@@ -266,6 +333,7 @@ TEST_F(WorkingDb, IsRemovedAboveItsLimitInWholeKibibytes) {
         EXPECT_EQ(FakeServices().reloaded.size(), kept ? 0U : 1U);
         EXPECT_TRUE(fs::exists(path_ + "-wal"));
     }
+    EXPECT_EQ(SyslogngWorkingDbCheck(folder_.path("none.db"), 0), -1);
     EXPECT_EQ(SyslogngWorkingDbCheck(folder_.path(), 0), -1);
     expectLog({"Working database is not regular file"});
 }

@@ -74,11 +74,33 @@ TEST_F(Record, OfTheOtherTablesHasTheirFieldsAlone) {
     EXPECT_EQ(record_.id, 8U);
 }
 
+TEST_F(Record, IsNotMadeOfNothing) {
+    EXPECT_EQ(DBRecToAllLogInfo(nullptr, 0, &record_, false), -1);
+    EXPECT_EQ(DBRecToSysLogInfo(nullptr, 0, &record_), -1);
+    EXPECT_EQ(DBRecToXferLogInfo(nullptr, 0, &record_), -1);
+    EXPECT_EQ(texts(), "A,B,C,D,E,F,G,H,I,J,K,L,M,N,");
+}
+
+// The names of the values from -1 to `last`, each followed by a comma.
+template <typename Value, typename NameOf>
+std::string names(int last, NameOf nameOf) {
+    std::string all;
+    for (int value = -1; value <= last; ++value) {
+        all += std::string(nameOf(static_cast<Value>(value))) + ",";
+    }
+    return all;
+}
+
 TEST(Names, ThatAreUnknownAreRefused) {
+    EXPECT_EQ(
+        names<_SYSLOG_DB_ATTRI_tag>(19, LogAttriStrGet),
+        ",id,host,ip,fac,prio,llevel,tag,utcsec,tzoffset,ldate,ltime,prog,msg,luser,event,isdir,fname,fsize,ip,,");
     EXPECT_EQ(LogAttriType("ip"), SYSLOG_ATTRI_IP) << "not the one of transfers";
     EXPECT_EQ(LogAttriType("IP"), SYSLOG_ATTRI_NONE);
+    EXPECT_EQ(names<_SYSLOG_DB_PRIORITY_tag>(8, PriorTypeToStr), ",emerg,alert,crit,err,warning,notice,info,debug,,");
+    EXPECT_EQ(PriorStrToType("emerg"), SYSLOG_PRIORITY_EMERG);
     EXPECT_EQ(PriorStrToType("ERR"), SYSLOG_PRIORITY_DEBUG);
-    EXPECT_EQ(PriorTypeToStr(static_cast<_SYSLOG_DB_PRIORITY_tag>(-1)), "");
+    EXPECT_EQ(PriorStrToType(nullptr), SYSLOG_PRIORITY_DEBUG);
     EXPECT_EQ(TrimUserName("a:b:c") + TrimUserName("none") + TrimUserName("a:"), "b:cnone");
 }
 
@@ -152,15 +174,19 @@ TEST_F(Select, WithoutAWindowGivesEveryRowThatIsTaken) {
 }
 
 TEST_F(Select, ReportsWhatFailed) {
-    std::string relative = "log.db";
     std::string missing = folder_.path("none.db");
     std::string table = "nowhere";
-    EXPECT_EQ(SyslogDBSelectCount(relative, none_, nullptr, nullptr), -1);
     EXPECT_EQ(SyslogDBSelect(missing, none_, nullptr, nullptr, nullptr, nullptr, false), -1);
     EXPECT_EQ(SyslogDBSelectByTable(path_, table, none_, nullptr, nullptr, nullptr, nullptr, false), -1);
-    expectLog({"dbutil:573 Invalid syslog db path!", "fail to connect database (" + missing + ")",
-               "fail to execute database command (SELECT * FROM nowhere)"});
-    EXPECT_FALSE(std::filesystem::exists(missing));
+    expectLog(
+        {"fail to connect database (" + missing + ")", "fail to execute database command (SELECT * FROM nowhere)"});
+}
+
+TEST_F(Select, DeletesWhatTheConditionsSay) {
+    EXPECT_EQ(SyslogDBDelete(path_, odd_), 0);
+    EXPECT_EQ(query("SELECT DISTINCT host FROM logs"), Strings{"even"});
+    EXPECT_EQ(SyslogDBDelete(path_, none_), 0);
+    expectStatements({"DELETE FROM logs WHERE (host = 'odd')", "DELETE FROM logs"});
 }
 
 TEST_F(Select, CountsByLargestIdUnlessFiltered) {
@@ -207,12 +233,10 @@ TEST(Condition, EscapesTheValueForItsOperator) {
 TEST(Condition, WhoseValueCannotBeEscapedHasAnEmptyOne) {
     const std::string value = "it's " + std::string(100, '*');
     const _SYSLOG_SQL_COND_tag like = cond(SYSLOG_ATTRI_HOST, SYSLOG_OP_LIKE, value);
-    using Case = std::pair<const char*, size_t>;
-    for (const auto& [failing, escapes] : {Case{"quotes", 1}, Case{"backslashes", 2}}) {
-        SpyOnDb() = {};
+    for (const char* const failing : {"quotes", "backslashes"}) {
         SpyOnDb().failing = failing;
         EXPECT_EQ(rendered({like}), "(host LIKE '' escape '\\')");
-        EXPECT_EQ(SpyOnDb().escapes.size(), escapes) << failing;
+        EXPECT_EQ(SpyOnDb().escapes.back(), failing) << "another escape was asked for";
     }
     SpyOnDb() = {};
     for (const int op : {SYSLOG_OP_EQUAL, SYSLOG_OP_NOT_LIKE, SYSLOG_OP_NOT_GLOB}) {
@@ -231,6 +255,10 @@ TEST(Condition, ReplacesTheTextAndJoinsAlternativesOneLevelDeep) {
     std::string text = "replaced";
     EXPECT_EQ(SqlCondToStr(cond(SYSLOG_ATTRI_HOST, 0, "a", {cond(SYSLOG_ATTRI_MSG, 6, "c", never)}), text), 0);
     EXPECT_EQ(text, "((host = 'a') OR (msg LIKE 'c' escape '\\'))");
+    const auto comparison = [](int op) { return rendered({cond(SYSLOG_ATTRI_ID, op, "1")}); };
+    EXPECT_EQ(names<int>(10, comparison),
+              "(id  1),(id = 1),(id != 1),(id < 1),(id <= 1),(id > 1),(id >= 1),(id LIKE 1),"
+              "(id NOT LIKE 1),(id GLOB 1),(id NOT GLOB 1),(id  1),");
 }
 
 TEST(Search, TurnsAFormIntoConditions) {
@@ -240,6 +268,12 @@ TEST(Search, TurnsAFormIntoConditions) {
     Conditions conds;
     LogSearchCondListGen(hosts, any, any, any, any, day, day, conds);
     EXPECT_EQ(rendered(conds), "((host = 'a') OR (host = ' b')) AND (msg GLOB 'any') AND (ldate = '2014/01/02')");
+    conds.clear();
+    std::string unset = "0";
+    LogSearchCondListGen(any, any, any, any, unset, day, unset, conds);
+    LogSearchCondListGen(any, unset, unset, unset, day, unset, hosts, conds);
+    EXPECT_EQ(rendered(conds), "(msg GLOB '0') AND (ldate >= '2014/01/02') AND (llevel = '0') AND (fac = '0') AND "
+                               "(prog = '0') AND (msg GLOB '2014/01/02') AND (ldate <= 'a, b')");
 }
 
 }  // namespace

@@ -2,6 +2,7 @@
 
 #include "tests/support/clock.h"
 #include "tests/support/database.h"
+#include "tests/support/db_spy.h"
 
 using namespace quor::test;
 
@@ -14,6 +15,7 @@ class EventLog : public DatabaseTest {
         WriteFile(quor::paths::kEventSchema, ReadFile(SCHEMA_FOLDER "/quorsyslog.sql"));
         std::filesystem::remove_all(own_.substr(0, own_.rfind('/')));
         path_ = folder_.path("new folder/events.db");
+        SpyOnDb() = {};
     }
     ~EventLog() override { ResetClock(); }
 
@@ -50,8 +52,11 @@ TEST_F(EventLog, EveryEventOfThePackageHasItsLevelAndText) {
 
 TEST(LevelName, IsCutToTheBufferAndEmptyWhenUnknown) {
     char buffer[8] = "?";
+    EXPECT_EQ(szLevelGet(1, buffer, -1), 0);
+    EXPECT_EQ(buffer[0], '?');
     EXPECT_EQ(szLevelGet(1, buffer, 4), 0);
-    EXPECT_EQ(buffer + strLevelGet(0) + strLevelGet(2) + strLevelGet(3), "WarInformationError");
+    EXPECT_EQ(buffer + strLevelGet(-1) + strLevelGet(0) + strLevelGet(2) + strLevelGet(3), "WarInformationError");
+    EXPECT_EQ(szLevelGet(1, nullptr, 4), -1);
 }
 
 TEST_F(EventLog, AddCreatesTheDatabaseAndFailsWithoutATraceOnAnApostrophe) {
@@ -67,13 +72,31 @@ TEST_F(EventLog, AddCreatesTheDatabaseAndFailsWithoutATraceOnAnApostrophe) {
     EXPECT_EQ(lastMessage(), "Fail to connect db");
 }
 
-TEST_F(EventLog, CountNeverCreates) {
-    for (const auto& [path, message] : {std::pair<std::string, const char*>{"events.db", "Invalid syslog db path!"},
-                                        {folder_.path("missing"), "Fail to connect syslog log database"}}) {
+TEST_F(EventLog, CountNeverCreatesAndReportsWhatFails) {
+    ASSERT_EQ(logger_.LogAdd(path_, 0, "u", "e"), 0);
+    const std::string missing = folder_.path("missing");
+    // The database, what fails, the rows that can be fetched before that, and the message.
+    const std::tuple<std::string, const char*, int, const char*> cases[] = {
+        {"events.db", "", -1, "Invalid syslog db path!"},
+        {"", "", -1, "Invalid syslog db path!"},
+        {missing, "", -1, "Fail to connect syslog log database"},
+        {path_, "COUNT", -1, "Fail to select syslog log database"},
+        {path_, "", 0, "Fail to fetch row"},
+    };
+    for (const auto& [path, failing, rowsLeft, message] : cases) {
+        SpyOnDb().failing = failing;
+        SpyOnDb().rowsLeft = rowsLeft;
         EXPECT_EQ(logger_.LogCount(path), -1) << path;
         EXPECT_EQ(lastMessage(), message);
     }
-    EXPECT_FALSE(std::filesystem::exists(folder_.path("missing")));
+    EXPECT_FALSE(std::filesystem::exists(missing));
+}
+
+TEST_F(EventLog, AddDoesNotNeedATransaction) {
+    SpyOnDb().failing = "BEGIN;";
+    EXPECT_EQ(logger_.LogAdd(path_, 0, "u", "e"), 0);
+    EXPECT_EQ(lastMessage(), "Fail to check sanity (DBTranEnd)");
+    EXPECT_EQ(stored(path_).size(), 1U);
 }
 
 TEST_F(EventLog, RotationFrom20000EventsRemovesOnlyThoseWithoutATime) {
@@ -87,9 +110,17 @@ TEST_F(EventLog, RotationFrom20000EventsRemovesOnlyThoseWithoutATime) {
     }
     EXPECT_EQ(query("PRAGMA freelist_count"), Strings({"0"})) << "compacted";
 
-    run("INSERT INTO log VALUES(NULL, 0, 0, '', ''); "
-        "CREATE TRIGGER no BEFORE DELETE ON log BEGIN SELECT RAISE(ABORT, 'no'); END");
-    EXPECT_EQ(logger_.LogAdd(path_, 0, "u", "kept"), 0) << "although rotating fails";
+    ASSERT_EQ(logger_.LogAdd(path_, 0, "u", "e"), 0);
+    for (const std::string statement : {"SELECT time FROM log ORDER BY time DESC LIMIT 1 OFFSET 18000",
+                                        "DELETE FROM log WHERE time <= 0", "VACUUM"}) {
+        SpyOnDb().failing = statement;
+        EXPECT_EQ(logger_.LogRotation(path_), -1);
+        EXPECT_EQ(lastMessage(), "Fail to execute SQL command: " + statement);
+    }
+    EXPECT_EQ(logger_.LogAdd(path_, 0, "u", "kept"), 0);
+    EXPECT_EQ(lastMessage(), "Fail to rotate log database");
+    SpyOnDb() = {};
+    EXPECT_EQ(logger_.LogRotation(path_), 0);
 }
 
 TEST_F(EventLog, ListsNewestFirstAndBoundsNumbers) {
@@ -107,6 +138,8 @@ TEST_F(EventLog, ListsNewestFirstAndBoundsNumbers) {
     }
     EXPECT_EQ(lastMessage(), "Fail to execute SQL command SELECT * FROM log ORDER BY time DESC LIMIT 5 OFFSET "
                              "18446744073709551615");
+    EXPECT_TRUE(logger_.LogEnum("/proc/none/events.db", 0, 0).empty());
+    EXPECT_EQ(lastMessage(), "Fail to connect db");
     run("DELETE FROM log; INSERT INTO log VALUES(4000000000, -9999999999, 9999999999, NULL, NULL)");
     const _SSYSLOG_LOG_LOG_tag event = logger_.LogEnum(path_, 0, 0).front();
     EXPECT_EQ(event.id, INT32_MAX);
@@ -120,7 +153,7 @@ TEST_F(EventLog, HtmlPageIsExactAndUnescaped) {
     tzset();
     logger_.LogAdd(path_, 0, "u", "e");
     run("DELETE FROM log; INSERT INTO log VALUES(1, 1, 4294967296 + 60, 'admin', '<b>&amp;'), (2, 7, 0, '', '')");
-    const std::string page = folder_.path("page.html");
+    const std::string page = folder_.write("page.html", std::string(5000, 'x'));  // replaced
     EXPECT_EQ(logger_.LogHtmlGen(path_, "x", page), 0);
     EXPECT_EQ(ReadFile(page), "<html><head>\n<meta http-equiv=\"Content-Type\" content=\"text/html; charset=utf-8;\">\n"
                               "<title>Syslog Server Log</title>\n</head>\n<body>\n"
@@ -132,9 +165,20 @@ TEST_F(EventLog, HtmlPageIsExactAndUnescaped) {
                               "<td align=\"center\"></td><td align=\"left\"></td></tr>\n"
                               "</table></body></html>\n");
     unsetenv("TZ");
-    EXPECT_EQ(logger_.LogHtmlRemove(page), 0);
-    EXPECT_EQ(logger_.LogHtmlGen(path_, "", page), -1);
-    EXPECT_EQ(logger_.LogHtmlGen("/proc/none/events.db", "x", page), 0);
+    for (const int removed : {0, -1}) {
+        EXPECT_EQ(logger_.LogHtmlRemove(page), removed);
+    }
+    EXPECT_EQ(logger_.LogHtmlRemove(""), -1);
+    const std::tuple<std::string, const char*, std::string, int> cases[] = {
+        {"", "x", page, -1},
+        {path_, "", page, -1},
+        {path_, "x", "", -1},
+        {path_, "x", "/proc/none/page.html", 0},
+        {"/proc/none/events.db", "x", page, 0},
+    };
+    for (const auto& [path, extra, out, result] : cases) {
+        EXPECT_EQ(logger_.LogHtmlGen(path, extra, out), result) << path << " " << extra << " " << out;
+    }
     EXPECT_FALSE(std::filesystem::exists(page)) << "no events, no page";
 }
 
@@ -144,8 +188,10 @@ TEST_F(EventLog, ClearLeavesOnlyWhoDidIt) {
     ASSERT_EQ(reader.query("SELECT count(*) FROM log"), Strings({"1"}));
     SetClock(7);
     EXPECT_EQ(logger_.LogClear(own_, "admin"), 0);
+    EXPECT_EQ(lastMessage().substr(0, 15), "create database");
     EXPECT_EQ(stored(own_), Strings({"0 7 SYSTEM " + own_ + " was cleared by admin"}));
     EXPECT_EQ(logger_.LogClear(own_, "o'brien"), 0);
+    EXPECT_EQ(lastMessage(), "logger:54 Fail to add log [Log was cleared.]");
     EXPECT_EQ(logger_.LogCount(own_), 0);
 }
 

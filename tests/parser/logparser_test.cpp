@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include "tests/support/debug.h"
 #include "tests/support/system_log.h"
 
 namespace {
@@ -27,6 +28,7 @@ TEST(ParseSingleEntry, SplitsAtBlanksAloneAndKeepsTheMessageAsItIs) {
     EXPECT_EQ(log.xsec, 0);
     EXPECT_EQ(parser.ParseSingleEntry("new crit", log), -1);
     EXPECT_EQ(log.fac + log.ldate, "newdate") << "the fields that were found keep their new values";
+    EXPECT_EQ(log.prio, SYSLOG_PRIORITY_CRIT);
 }
 
 TEST(LogParser, TokenizeDropsEmptyPieces) {
@@ -42,6 +44,9 @@ TEST(LogParser, KeepsTheLinesThatParse) {
     EXPECT_EQ(parser.LogAdd(chunk), 0);
     EXPECT_EQ(TakeSystemLogTexts(), Texts{"Fail to parse log"});
     EXPECT_EQ(parser.LogGetCount(), 3);
+    parser.LogDump();
+    const std::string dumped = "2 Log countent: link  is down ";
+    EXPECT_EQ(quor::test::TakeDropped(), (Texts{"2 Log count: 3", dumped, dumped, "2 Log countent: "}));
     const std::list<_SYSLOG_LOG_DATA_tag> logs = parser.LogListGet();
     EXPECT_EQ(parser.LogReset(), 0);
     EXPECT_EQ(parser.LogGetCount(), 0);
@@ -52,7 +57,7 @@ TEST(LogParser, KeepsTheLinesThatParse) {
 TEST(LogParser, RejectsRecordsThatLackWhatIdentifiesALog) {
     LogParser parser;
     _SYSLOG_LOG_DATA_tag whole;
-    whole.host = whole.ip = whole.ldate = whole.ltime = whole.prog = whole.msg = "x";
+    whole.host = "h", whole.ip = "i", whole.ldate = "d", whole.ltime = "t", whole.prog = "p", whole.msg = "m";
     EXPECT_EQ(parser.isValidLog(whole), 1);
     for (const auto field : {&_SYSLOG_LOG_DATA_tag::host, &_SYSLOG_LOG_DATA_tag::ip, &_SYSLOG_LOG_DATA_tag::ldate,
                              &_SYSLOG_LOG_DATA_tag::ltime, &_SYSLOG_LOG_DATA_tag::prog, &_SYSLOG_LOG_DATA_tag::msg}) {
@@ -60,5 +65,11 @@ TEST(LogParser, RejectsRecordsThatLackWhatIdentifiesALog) {
         (record.*field).clear();
         EXPECT_EQ(parser.isValidLog(record), 0);
     }
-    EXPECT_EQ(TakeSystemLogTexts().back(), "Invalid log!!!!!!!!!!!!! (Attention Please)");
+    EXPECT_EQ(TakeSystemLogTexts(), Texts(6, "Invalid log!!!!!!!!!!!!! (Attention Please)"));
+    EXPECT_EQ(parser.LogReset(), 0);
+    parser.PartialLogDump();
+    EXPECT_EQ(quor::test::TakeDropped(),
+              (Texts{"2 Partial log count: 6", "2 Log countent:  i d t p m", "2 Log countent: h  d t p m",
+                     "2 Log countent: h i  t p m", "2 Log countent: h i d  p m", "2 Log countent: h i d t  m",
+                     "2 Log countent: h i d t p "}));
 }

@@ -12,46 +12,50 @@ DbSpy& SpyOnDb() {
 
 }  // namespace quor::test
 
-using quor::test::Real;
 using quor::test::SpyOnDb;
 
 namespace {
 
-// False when it is to fail.
-bool record(std::vector<std::string>& calls, const std::string& call) {
+// Notes the call and makes it, unless it is to fail.
+template <typename Function, typename... Arguments>
+int spied(std::vector<std::string>& calls, const std::string& call, Function* function, const char* name,
+          Arguments... arguments) {
     const std::string& failing = SpyOnDb().failing;
     calls.push_back(call);
-    return failing.empty() || call.find(failing) == std::string::npos;
+    const bool fails = !failing.empty() && call.find(failing) != std::string::npos;
+    return fails ? -1 : quor::test::Real(function, name)(arguments...);
 }
 
 }  // namespace
 
 int QUORDBExecute(DBConnect_tag* connection, const char* sql, DBResult_tag** result) {
-    return record(SpyOnDb().statements, sql) ? Real(QUORDBExecute, "QUORDBExecute")(connection, sql, result) : -1;
+    return spied(SpyOnDb().statements, sql, QUORDBExecute, __func__, connection, sql, result);
 }
 
 int QUORDBSelectLimit(DBConnect_tag* connection, const char* sql, unsigned int count, unsigned int skip,
                       DBResult_tag** result) {
     const std::string window = " [" + std::to_string(count) + "," + std::to_string(skip) + "]";
-    return record(SpyOnDb().statements, sql + window)
-               ? Real(QUORDBSelectLimit, "QUORDBSelectLimit")(connection, sql, count, skip, result)
-               : -1;
+    return spied(SpyOnDb().statements, sql + window, QUORDBSelectLimit, __func__, connection, sql, count, skip, result);
 }
 
-int QUORDBEscapeStringEX2(DBConnect_tag* connection, char* out, unsigned int outSize, const char* in,
-                          unsigned int inLen) {
-    return record(SpyOnDb().escapes, std::string("quotes ") + in)
-               ? Real(QUORDBEscapeStringEX2, "QUORDBEscapeStringEX2")(connection, out, outSize, in, inLen)
-               : -1;
+int QUORDBEscapeStringEX(DBConnect_tag* connection, char* out, unsigned int size, const char* in, unsigned int length) {
+    return spied(SpyOnDb().escapes, "text", QUORDBEscapeStringEX, __func__, connection, out, size, in, length);
 }
 
-int QUORDBEscapeBackslashEX2(DBConnect_tag* connection, char* out, unsigned int outSize, const char* in) {
-    return record(SpyOnDb().escapes, std::string("backslashes ") + in)
-               ? Real(QUORDBEscapeBackslashEX2, "QUORDBEscapeBackslashEX2")(connection, out, outSize, in)
-               : -1;
+int QUORDBEscapeStringEX2(DBConnect_tag* connection, char* out, unsigned int size, const char* in,
+                          unsigned int length) {
+    return spied(SpyOnDb().escapes, "quotes", QUORDBEscapeStringEX2, __func__, connection, out, size, in, length);
+}
+
+int QUORDBEscapeBackslashEX2(DBConnect_tag* connection, char* out, unsigned int size, const char* in) {
+    return spied(SpyOnDb().escapes, "backslashes", QUORDBEscapeBackslashEX2, __func__, connection, out, size, in);
+}
+
+int QUORDBFetchRow(DBResult_tag* result, unsigned int* row) {
+    return SpyOnDb().rowsLeft-- == 0 ? -1 : quor::test::Real(QUORDBFetchRow, __func__)(result, row);
 }
 
 void QUORDBClose(DBConnect_tag* connection) {
     ++SpyOnDb().closed;
-    Real(QUORDBClose, "QUORDBClose")(connection);
+    quor::test::Real(QUORDBClose, __func__)(connection);
 }

@@ -1,4 +1,4 @@
-// The wrapper's calls as the library makes them: recorded, then run for real, or failing on demand.
+// The wrapper's calls as the library makes them: recorded, then made for real, or failing on demand.
 #ifndef TESTS_SUPPORT_DB_SPY_H
 #define TESTS_SUPPORT_DB_SPY_H
 
@@ -9,8 +9,9 @@ namespace quor::test {
 
 struct DbSpy {
     std::vector<std::string> statements;  // a limited select ends in " [COUNT,SKIP]"
-    std::vector<std::string> escapes;     // "quotes TEXT" and "backslashes TEXT"
+    std::vector<std::string> escapes;     // "text", "quotes" and "backslashes"
     std::string failing;                  // a statement or escape that contains this fails unrun, when not empty
+    int rowsLeft = -1;                    // from 0 on, the row after so many others cannot be fetched
     int closed = 0;                       // connections, null ones too
 };
 

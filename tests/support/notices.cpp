@@ -1,5 +1,7 @@
 #include "tests/support/notices.h"
 
+#include "tests/support/real.h"
+
 namespace quor::test {
 
 Notices& FakeNotices() {
@@ -39,4 +41,12 @@ QUORSMSCONF* QUORSmsConfGet() {
 
 void QUORSmsConfFree(QUORSMSCONF* conf) {
     quor::test::FakeNotices().smsLent -= conf != nullptr ? 1 : 0;
+}
+
+QLIBSZHASH* QLIBCSzHashAlloc(int size) {
+    return quor::test::FakeNotices().tablesFail ? nullptr : quor::test::Real(QLIBCSzHashAlloc, __func__)(size);
+}
+
+QLIBSZLIST* QLIBCSzListAlloc(int size) {
+    return quor::test::FakeNotices().tablesFail ? nullptr : quor::test::Real(QLIBCSzListAlloc, __func__)(size);
 }

@@ -1,4 +1,4 @@
-// Service reloads of the test program: recorded, and failing on demand.
+// Service reloads, folders and shell commands of the test program: recorded, and failing on demand.
 #ifndef TESTS_SUPPORT_SERVICES_H
 #define TESTS_SUPPORT_SERVICES_H
 
@@ -10,6 +10,9 @@ namespace quor::test {
 struct Services {
     std::vector<std::string> reloaded;  // "service NAME" or "job NAME", in order
     bool fail = false;
+    std::vector<std::string> commands;  // "PROGRAM OPTION COMMAND", run for real
+    std::vector<std::string> folders;   // the path and the other arguments, created for real
+    std::string failing;                // a command that contains this is not run, when not empty
 };
 
 Services& FakeServices();
