@@ -1,6 +1,8 @@
 #include "accounting.h"
 
 #include "tests/support/clock.h"
+#include "tests/support/db_spy.h"
+#include "tests/support/debug.h"
 #include "tests/support/notices.h"
 #include "tests/support/testing.h"
 
@@ -21,6 +23,7 @@ class Accounting : public testing::Test {
         std::filesystem::remove(paths::kEventDb);
         WriteFile(paths::kNotifyRules, "");
         FakeNotices() = {};
+        SpyOnDb() = {};
         SetClock(1000);
     }
 
@@ -87,9 +90,10 @@ TEST_F(Accounting, AFlushIsDueMoreThanFiveSecondsAfterTheLastQuestion) {
 }
 
 TEST_F(Accounting, ASampleAtTheThresholdIsNotifiedAndRecorded) {
+    AccountingManager accounting;
     WriteFile(paths::kNotifyRules,
               "[rate]\nnotify_type=\"1\"\nnotify_pri=\"0\"\nnotify_eps=\"3\"\nnotify_pat=\"\"\nnotify_enable=\"1\"\n");
-    AccountingManager accounting;
+    accounting.RulesReload();
     sample(accounting, 1000, {"a"});
     sample(accounting, 1001, {"a", "b"});
     EXPECT_TRUE(FakeNotices().sent.empty());
@@ -102,31 +106,44 @@ TEST_F(Accounting, ASampleAtTheThresholdIsNotifiedAndRecorded) {
     EXPECT_EQ(SqliteFile(paths::kEventDb).query("SELECT event FROM log"),
               Strings{"Event detection: EPS is larger than [3]."})
         << "recorded although it was not sent";
+    FakeNotices().fail = false;
+    sample(accounting, 1003, {"a", "b", "a"});
+    EXPECT_EQ(TakeDropped().back(), "2 Send EPS notification");
+    accounting.LogInc("c");
+    accounting.AccountingDump();
+    EXPECT_EQ(TakeDropped(),
+              (Strings{"2 ======Accounting Status dump======", "2 Total: 10", "2 EPS: 1", "2 Device: a, count: 6",
+                       "2 Device: b, count: 3", "2 Device: c, count: 1", "2 =================================="}));
 }
 
 TEST_F(Accounting, AFailedSampleKeepsTheOnesBeforeItAFailedHistogramNone) {
     AccountingManager accounting;
-    create("CREATE TRIGGER t BEFORE INSERT ON eps WHEN NEW.device = 'b' BEGIN SELECT RAISE(ABORT, 'no'); END");
     sample(accounting, 1000, {"a"});
     sample(accounting, 1001, {"b"});
-    TakeSystemLogTexts();
-    EXPECT_EQ(accounting.AccoutingFlush2DB(), -1);
-    EXPECT_EQ(TakeSystemLogTexts().back(),
-              "Fail to execute SQL command: INSERT INTO eps VALUES(NULL, '1002', 'b', '1');");
+    SpyOnDb().failing = "'b'";
+    EXPECT_EQ(Said(accounting.AccoutingFlush2DB()),
+              "-1 Fail to execute SQL command: INSERT INTO eps VALUES(NULL, '1002', 'b', '1');");
     EXPECT_EQ(rows(), (Strings{"1001", "a", "1"}));
-
-    SqliteFile(kDb).run("DELETE FROM eps; DROP TRIGGER t; ALTER TABLE histogram RENAME TO aside");
+    SqliteFile(kDb).run("DELETE FROM eps");
+    SpyOnDb().failing = "REPLACE";
     EXPECT_EQ(accounting.AccoutingFlush2DB(), -1);
+    const Strings log = TakeSystemLogTexts();
+    EXPECT_EQ(log.at(1), "Fail to execute SQL command: INSERT OR REPLACE INTO histogram VALUES(NULL, 'a', 1);");
+    EXPECT_EQ(log.back(), "Fail to check sanity (DBTranEnd)") << "rolled back";
     EXPECT_EQ(rows(), Strings());
-    SqliteFile(kDb).run("ALTER TABLE aside RENAME TO histogram");
+    SpyOnDb() = {};
     EXPECT_EQ(accounting.AccoutingFlush2DB(), 0);
     EXPECT_EQ(rows(), (Strings{"1001", "a", "1", "1002", "b", "1"})) << "all that was kept in memory";
+    SpyOnDb() = {};
+    EXPECT_EQ(accounting.AccoutingFlush2DB(), 0);
+    EXPECT_EQ(SpyOnDb().statements, Strings()) << "there is nothing to write";
 }
 
 TEST_F(Accounting, OldSamplesGoOnceTheFileIsLarge) {
     create("INSERT INTO eps VALUES (NULL, 1000, 'old', 1), (NULL, strftime('%s', 'now') - 3600, 'recent', 1);"
            "CREATE TABLE filler (data BLOB); INSERT INTO filler VALUES (zeroblob(5200000))");
     AccountingManager accounting;
+    const std::string purge = "DELETE FROM eps WHERE stamp < strftime('%s', 'now') - 24*60*60;";
     // The new samples carry stamps of the test's clock.
     for (const auto& [size, left] : {std::pair(5242880, Strings{"new", "old", "recent"}), {5242881, {"recent"}}}) {
         std::filesystem::resize_file(kDb, static_cast<uintmax_t>(size));
@@ -134,6 +151,9 @@ TEST_F(Accounting, OldSamplesGoOnceTheFileIsLarge) {
         ASSERT_EQ(accounting.AccoutingFlush2DB(), 0);
         EXPECT_EQ(SqliteFile(kDb).query("SELECT DISTINCT device FROM eps ORDER BY device"), left);
     }
+    sample(accounting, 2000, {"new"});
+    SpyOnDb().failing = purge;
+    EXPECT_EQ(Said(accounting.AccoutingFlush2DB()), "0 Fail to execute SQL command: " + purge);
 }
 
 TEST_F(Accounting, TrimForgetsTheOldestSamples) {

@@ -176,10 +176,10 @@ TEST_F(Select, WithoutAWindowGivesEveryRowThatIsTaken) {
 TEST_F(Select, ReportsWhatFailed) {
     std::string missing = folder_.path("none.db");
     std::string table = "nowhere";
-    EXPECT_EQ(SyslogDBSelect(missing, none_, nullptr, nullptr, nullptr, nullptr, false), -1);
-    EXPECT_EQ(SyslogDBSelectByTable(path_, table, none_, nullptr, nullptr, nullptr, nullptr, false), -1);
-    expectLog(
-        {"fail to connect database (" + missing + ")", "fail to execute database command (SELECT * FROM nowhere)"});
+    EXPECT_EQ(Said(SyslogDBSelect(missing, none_, nullptr, nullptr, nullptr, nullptr, false)),
+              "-1 fail to connect database (" + missing + ")");
+    EXPECT_EQ(Said(SyslogDBSelectByTable(path_, table, none_, nullptr, nullptr, nullptr, nullptr, false)),
+              "-1 fail to execute database command (SELECT * FROM nowhere)");
 }
 
 TEST_F(Select, DeletesWhatTheConditionsSay) {

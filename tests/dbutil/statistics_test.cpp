@@ -53,8 +53,8 @@ TEST_F(Statistics, AndSelectionsAnswerNothingWithoutAReadableDatabase) {
     std::string relative = "log.db";
     std::string missing = folder_.path("none.db");
     for (const auto& [line, answer, question] : cases) {
-        EXPECT_EQ(question(relative), answer);
-        EXPECT_EQ(lastMessage(), "dbutil:" + std::to_string(line) + " Invalid syslog db path!");
+        EXPECT_EQ(Said(question(relative)),
+                  std::to_string(answer) + " dbutil:" + std::to_string(line) + " Invalid syslog db path!");
         EXPECT_EQ(question(missing), answer) << line;
         SpyOnDb().failing = "FROM";
         EXPECT_EQ(question(path_), answer) << line;
@@ -70,8 +70,7 @@ TEST_F(Statistics, AndSelectionsAnswerNothingWithoutAReadableDatabase) {
 TEST_F(Statistics, TellTheLayoutOfALogDatabase) {
     std::string relative = "log.db";
     std::string missing = folder_.path("none.db");
-    EXPECT_EQ(SyslogDBVersionGet(relative), 1U);
-    expectLog({"dbutil:853 Invalid syslog db path! [log.db]"});
+    EXPECT_EQ(Said(SyslogDBVersionGet(relative)), "1 dbutil:853 Invalid syslog db path! [log.db]");
     EXPECT_EQ(SyslogDBVersionGet(missing), 1U);
     EXPECT_EQ(SyslogDBVersionGet(path_), 2U);
     run("CREATE TABLE db_info (device TEXT)");
@@ -124,9 +123,8 @@ TEST_F(Statistics, NamesOfBothLayouts) {
     ASSERT_EQ(get(path_, SYSLOG_EXTKEY_FAC), 0);
     EXPECT_EQ(names, (Names{{0, ""}, {2, "mail"}, {4294967299, "kern"}}));
     EXPECT_EQ(SyslogDBExtkeyLookupByName(path_, SYSLOG_EXTKEY_FAC, "kern"), 4294967299U);
-    TakeSystemLog();
-    EXPECT_EQ(SyslogDBExtkeyLookupByName(path_, SYSLOG_EXTKEY_HOST, "b"), 0U);  // there is no table hosts
-    expectLog({"dbutil:956 Fail to get foreign key map"});
+    EXPECT_EQ(Said(SyslogDBExtkeyLookupByName(path_, SYSLOG_EXTKEY_HOST, "b")),
+              "0 dbutil:956 Fail to get foreign key map");
     EXPECT_EQ(std::exchange(SpyOnDb().statements, {}).back(), "SELECT * FROM hosts");
     for (const auto& [type, table] : {std::pair(SYSLOG_EXTKEY_PROG, "prog"), {SYSLOG_EXTKEY_TAG, "tag"}}) {
         run(std::string("CREATE TABLE ") + table + "s AS SELECT 7 " + table + "_id, 'x' " + table + "_name");
@@ -142,8 +140,8 @@ TEST_F(Statistics, ValuesOfAnAttributeInAscendingOrder) {
     EXPECT_EQ(SyslogDBAttriValueGet(path_, host, nullptr, values), 0);
     EXPECT_EQ(values, (Values{"old", "a", "b", "", "a", "b", "c"}));
     std::string unknown = "Host";
-    EXPECT_EQ(SyslogDBAttriValueGet(path_, unknown, nullptr, values), -1);
-    expectLog({"dbutil:702 Log attribute type is incorrect!"});
+    EXPECT_EQ(Said(SyslogDBAttriValueGet(path_, unknown, nullptr, values)),
+              "-1 dbutil:702 Log attribute type is incorrect!");
 }
 
 }  // namespace

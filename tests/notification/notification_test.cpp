@@ -1,3 +1,5 @@
+#include <functional>
+#include <sstream>
 #include <tuple>
 
 #include "base/numbers.h"
@@ -46,10 +48,13 @@ TEST_F(Rules, AreWrittenWholeOrReported) {
     ASSERT_EQ(SyslogNotifyConfSet(file_, "r", negative), 0);
     for (_SYSLOG_NOTIFY_RULES_tag bad :
          {rule("r", 0, 0, 0, "a\n[evil]"), rule("r", 0, 0, 0, std::string("a\0b", 3)), rule("", 0, 0, 0, "a")}) {
-        TakeSystemLogTexts();
-        EXPECT_EQ(SyslogNotifyConfSet(file_, "r", bad), -1);
-        EXPECT_EQ(TakeSystemLogTexts(), Strings{"utils:139 Fail set section to file"});
+        EXPECT_EQ(Said(SyslogNotifyConfSet(file_, "r", bad)), "-1 utils:139 Fail set section to file");
     }
+    FakeNotices().tablesFail = true;
+    EXPECT_EQ(Said(SyslogNotifyConfSet(file_, "r", negative)), "-1 utils:124 Fail to allocate memory");
+    EXPECT_EQ(Said(SyslogNotifyConfGet(file_, "r", negative)), "-1 utils:81 Fail to allocate memory");
+    EXPECT_EQ(Said(manager_.ConfigLoad(file_)), "-1 Fail to allocate memory");
+    FakeNotices().tablesFail = false;
     EXPECT_EQ(ReadFile(file_),
               "[r]\nnotify_type=\"18446744073709551614\"\nnotify_eps=\"18446744073709551615\"\nnotify_pri=\"4\"\n"
               "notify_pat=\"p\"\nnotify_enable=\"1\"\n");
@@ -57,12 +62,11 @@ TEST_F(Rules, AreWrittenWholeOrReported) {
 
 TEST_F(Rules, OddValuesReadButAMissingKeyFails) {
     const std::string text = "[r]\nnotify_type=x\nnotify_eps=-5\nnotify_pri=99999999999\nnotify_pat=\n";
-    TakeSystemLogTexts();
     _SYSLOG_NOTIFY_RULES_tag found = rule("before", 2, 4, 9, "before");
     const _SYSLOG_NOTIFY_RULES_tag before = found;
-    EXPECT_EQ(SyslogNotifyConfGet(folder_.write("notify.conf", text), "r", found), -1);
+    EXPECT_EQ(Said(SyslogNotifyConfGet(folder_.write("notify.conf", text), "r", found)),
+              "-1 utils:85 Fail to do QLIBCFileGetSection");
     EXPECT_EQ(fields(found), fields(before));
-    EXPECT_EQ(TakeSystemLogTexts(), Strings{"utils:85 Fail to do QLIBCFileGetSection"});
     EXPECT_EQ(SyslogNotifyConfGet(folder_.write("notify.conf", text + "notify_enable=\" 1\"\n"), "r", found), 0);
     EXPECT_EQ(fields(found), fields(rule("r", 0, INT32_MAX, -5, "", false)));
 }
@@ -90,36 +94,45 @@ TEST_F(Rules, OnlyEnabledOnesOfTheKindCountInFileOrder) {
 }
 
 TEST(IsNotificationSet, AsksEveryChannelUntilOneCannotBeRead) {
-    const std::string all = "smtp_mail_enabled=yes\npushservice_mobile_enabled=no\npushservice_msn_enabled=no\n"
-                            "pushservice_skype_enabled=";
-    // The recipient is null when the mail settings cannot be read, the SMS setting negative when those cannot be.
-    const std::tuple<std::string, const char*, int, bool, Strings> cases[] = {
-        {all + "no", "a@b", 0, true, {}},
-        {all + "yes", "", 0, true, {}},
-        {all + "yes, please", "", 0, false, {}},
-        {"", "a@b", 1, false, {"utils:166 Fail to get smtp mail setting"}},
-        {"smtp_mail_enabled=yes", "a@b", 1, true, {"utils:188 Fail to get mobile setting"}},
-        {all + "yes", nullptr, 1, false, {"utils:161 Fail to get mail setting"}},
-        {all + "yes", "", -1, false, {"utils:178 Fail to get sms setting"}},
+    // The switches of mail, mobile, msn and skype as far as they are there. The recipient is null when the mail
+    // settings cannot be read, the SMS setting negative when those cannot be. The answer and the message.
+    const std::tuple<std::string, const char*, int, std::string> cases[] = {
+        {"yes no no no", "a@b", 0, "1 "},
+        {"yes no no no", "", 0, "0 "},
+        {"yes,please no no no", "a@b", 0, "0 "},
+        {"no yes no no", "a@b", 0, "1 "},
+        {"no no yes no", "a@b", 0, "1 "},
+        {"no no no yes", "a@b", 0, "1 "},
+        {"no no no no", "a@b", 1, "1 "},
+        {"no no no no", "a@b", 0, "0 "},
+        {"", "a@b", 1, "0 utils:166 Fail to get smtp mail setting"},
+        {"yes", "a@b", 1, "1 utils:188 Fail to get mobile setting"},
+        {"no yes", "a@b", 1, "0 utils:196 Fail to get msn setting"},
+        {"no yes yes", "a@b", 1, "0 utils:204 Fail to get skype setting"},
+        {"yes yes yes yes", nullptr, 1, "0 utils:161 Fail to get mail setting"},
+        {"no yes yes yes", "a@b", -1, "0 utils:178 Fail to get sms setting"},
     };
     Notices& service = FakeNotices();
-    for (const auto& [settings, recipient, sms, set, log] : cases) {
-        WriteFile(quor::paths::kSystemSettings, settings + "\n");
+    for (const auto& [switches, recipient, sms, answer] : cases) {
+        std::istringstream words(switches);
+        std::string settings;
+        for (const char* key : {"smtp_mail", "pushservice_mobile", "pushservice_msn", "pushservice_skype"}) {
+            std::string word;
+            settings += words >> word ? key + ("_enabled=" + word) + "\n" : "";
+        }
+        WriteFile(quor::paths::kSystemSettings, settings);
         service = {};
         std::string("mail").copy(service.mail.server, sizeof service.mail.server - 1);
         std::string(quor::OrEmpty(recipient)).copy(service.mail.recipient, sizeof service.mail.recipient - 1);
         service.mailUnreadable = recipient == nullptr;
         service.sms.enabled = sms;
         service.smsUnreadable = sms < 0;
-        TakeSystemLogTexts();
-        EXPECT_EQ(IsNotificationSet(), set) << settings;
-        EXPECT_EQ(TakeSystemLogTexts(), log) << settings;
+        TakeSystemLog();
+        EXPECT_EQ(Said(IsNotificationSet()), answer) << settings;
         EXPECT_EQ(service.smsLent, 0) << settings;
     }
     std::filesystem::remove(quor::paths::kSystemSettings);
 }
-
-using Values = std::map<std::string, std::string>;
 
 class Senders : public testing::Test {
   protected:
@@ -131,41 +144,59 @@ class Senders : public testing::Test {
     NotificationManager manager_;
 };
 
-TEST_F(Senders, FillThePlaceholdersOfTheirTemplates) {
+TEST_F(Senders, FillThePlaceholdersAndReportWhatFails) {
     _SYSLOG_LOG_DATA_tag log;
     log.msg = "a\"b\\c\n%HOST%";
-    EXPECT_EQ(manager_.NotificationSendSev("h\"", SYSLOG_PRIORITY_ERR, log) +
-                  manager_.NotificationSendKeyword("h", "k\"", log) + manager_.NotificationSendEps(UINT64_MAX) +
-                  manager_.NotificationSendVolFull("s\"") + SyslogMailKeywordMatched("m\"", log.msg.c_str()) +
-                  SyslogMailShareRemove("1"),
-              0);
-    const std::pair<const std::string, std::string> escaped{"%SYSLOG_CONTENT%", "a\\\"b\\\\c\n%HOST%"};
-    const std::pair<const std::string, std::string> desktop{"DESKTOP_NOTIFY_CLASSNAME", "QUOR.KVX.Orvane.Instance"};
-    const std::vector<std::pair<std::string, Values>> wanted{
-        {"QUORSYSLOG_SEV_EXCEED", {desktop, {"%HOST%", "h\""}, {"%SEV%", "err"}, escaped}},
-        {"QUORSYSLOG_KEYWORD_MATCH", {desktop, {"%HOST%", "h"}, {"%KEYWORD%", "k\""}, escaped}},
-        {"QUORSYSLOG_EPS_EXCEED", {desktop, {"%EPS%", "18446744073709551615"}}},
-        {"QUORSYSLOG_VOL_FULL", {desktop, {"%SHARED_FOLDER%", "s\""}}},
-        {"QUORSYSLOG_KEYWORD_MATCH", {{"%KEYWORD%", "m\""}, escaped}},
-        {"QUORSYSLOG_ShareRemove", {{"%SHARED_FOLDER%", "1"}}},
+    const char* const text = log.msg.c_str();
+    const std::string desktop = "DESKTOP_NOTIFY_CLASSNAME=QUOR.KVX.Orvane.Instance ";
+    const std::string content = "%SYSLOG_CONTENT%=a\\\"b\\\\c\n%HOST% ";
+    const std::tuple<std::function<int()>, std::string, std::string> cases[] = {
+        {[&] { return manager_.NotificationSendSev("h\"", SYSLOG_PRIORITY_ERR, log); }, "QUORSYSLOG_SEV_EXCEED",
+         "%HOST%=h\" %SEV%=err " + content + desktop},
+        {[&] { return manager_.NotificationSendKeyword("h", "k\"", log); }, "QUORSYSLOG_KEYWORD_MATCH",
+         "%HOST%=h %KEYWORD%=k\" " + content + desktop},
+        {[&] { return manager_.NotificationSendEps(UINT64_MAX); }, "QUORSYSLOG_EPS_EXCEED",
+         "%EPS%=18446744073709551615 " + desktop},
+        {[&] { return manager_.NotificationSendVolFull("s\""); }, "QUORSYSLOG_VOL_FULL",
+         "%SHARED_FOLDER%=s\" " + desktop},
+        {[&] { return SyslogMailKeywordMatched("m\"", text); }, "QUORSYSLOG_KEYWORD_MATCH", "%KEYWORD%=m\" " + content},
+        {[&] { return SyslogMailSeverityExceeded("e", text); }, "QUORSYSLOG_SEV_EXCEED", "%SEV%=e " + content},
+        {[] { return SyslogMailShareRemove("1"); }, "QUORSYSLOG_ShareRemove", "%SHARED_FOLDER%=1 "},
+        {[] { return SyslogMailShareRename("2"); }, "QUORSYSLOG_ShareRename", "%SHARED_FOLDER%=2 "},
+        {[] { return SyslogMailShareEncMount("3"); }, "QUORSYSLOG_ShareEncMount", "%SHARED_FOLDER%=3 "},
+        {[] { return SyslogMailShareEncUnmount("4"); }, "QUORSYSLOG_ShareEncUnmount", "%SHARED_FOLDER%=4 "},
     };
-    std::vector<std::pair<std::string, Values>> sent;
-    for (const Notice& notice : FakeNotices().sent) {
-        sent.emplace_back(notice.tag, notice.values);
-        EXPECT_EQ(notice.textsDir, quor::paths::kNotifyTexts);
-        EXPECT_EQ(notice.filterFile, quor::paths::kNotifyFilter);
+    for (const auto& [send, tag, values] : cases) {
+        const bool managed = values.find(desktop) != std::string::npos;
+        FakeNotices() = {};
+        EXPECT_EQ(Said(send()), "0 ");
+        ASSERT_EQ(FakeNotices().sent.size(), 1U);
+        const Notice notice = FakeNotices().sent[0];
+        std::string sent;
+        for (const auto& [key, value] : notice.values) {
+            sent += key + ("=" + value) + " ";
+        }
+        EXPECT_EQ(notice.tag + " " + sent, tag + " " + values);
+        EXPECT_EQ(notice.textsDir + notice.filterFile,
+                  std::string(quor::paths::kNotifyTexts) + quor::paths::kNotifyFilter);
+        FakeNotices().fail = true;
+        EXPECT_EQ(send(), -1);
+        const Strings second(managed ? 1 : 0, "Fail to send notification");
+        Strings messages{"Fail to send notification: " + tag};
+        messages.insert(messages.end(), second.begin(), second.end());
+        EXPECT_EQ(TakeSystemLogTexts(), messages);
+        FakeNotices().tablesFail = true;
+        EXPECT_EQ(Said(send()), managed ? "-1 Fail to allocation memory" : "-1 ");
     }
-    EXPECT_EQ(sent, wanted);
 }
 
-TEST_F(Senders, ReportAFailedSendAndRefuseNull) {
-    FakeNotices().fail = true;
-    EXPECT_EQ(manager_.NotificationSendVolFull("s"), -1);
-    EXPECT_EQ(SyslogMailShareRename("s"), -1);
-    EXPECT_EQ(TakeSystemLogTexts(),
-              (Strings{"Fail to send notification: QUORSYSLOG_VOL_FULL", "Fail to send notification",
-                       "Fail to send notification: QUORSYSLOG_ShareRename"}));
-    EXPECT_EQ(SyslogMailShareRename(nullptr), -1);
+TEST_F(Senders, RefuseNull) {
+    QLIBSZHASH* table = nullptr;
+    char tag[] = "tag";
+    EXPECT_EQ(manager_.NotificationSend(nullptr, &table) + manager_.NotificationSend(tag, nullptr), -2);
+    EXPECT_EQ(SyslogMailSend(nullptr, &table) + SyslogMailSend(tag, nullptr) + SyslogMailShareRename(nullptr), -3);
+    EXPECT_EQ(SyslogMailSeverityExceeded(nullptr, "") + SyslogMailKeywordMatched("", nullptr), -2);
+    EXPECT_TRUE(FakeNotices().sent.empty());
 }
 
 TEST_F(Senders, GuardAndBoundLogContent) {

@@ -13,13 +13,6 @@ class DatabaseTest : public testing::Test {
     void run(const std::string& sql) const { SqliteFile(path_).run(sql); }
     Strings query(const std::string& sql) const { return SqliteFile(path_).query(sql); }
 
-    // Nothing else was written since the last look.
-    static void expectLog(const Strings& lines) { EXPECT_EQ(TakeSystemLogTexts(), lines); }
-    static std::string lastMessage() {
-        const Strings lines = TakeSystemLogTexts();
-        return lines.empty() ? "" : lines.back();
-    }
-
     const TempFolder folder_;
     std::string path_ = folder_.path("log.db");
 };

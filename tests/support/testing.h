@@ -15,6 +15,15 @@ namespace quor::test {
 
 using Strings = std::vector<std::string>;
 
+// What a call answered and the last message that it left in the system log: "-1 Fail to connect db".
+inline std::string Said(const std::string& answer) {
+    const Strings messages = TakeSystemLogTexts();
+    return answer + " " + (messages.empty() ? "" : messages.back());
+}
+inline std::string Said(long long answer) {
+    return Said(std::to_string(answer));
+}
+
 // Polls for at most ten seconds.
 template <typename Condition>
 bool Eventually(Condition holds) {
