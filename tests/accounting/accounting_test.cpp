@@ -2,7 +2,6 @@
 
 #include "tests/support/clock.h"
 #include "tests/support/db_spy.h"
-#include "tests/support/debug.h"
 #include "tests/support/notices.h"
 #include "tests/support/testing.h"
 

@@ -229,6 +229,7 @@ TEST_F(Failure, OfACorruptDatabaseMovesItAsideAfterTheNotice) {
 }
 
 TEST_F(Failure, OfOneStepOfTheRecoveryLeavesTheOthers) {
+    fs::remove(quor::paths::kNotifyRules);
     const auto recover = [&] { return Said(DBErrorHandle_SQLITE_CORRUPT(nullptr, path_)); };
     FakeServices().fail = true;
     EXPECT_EQ(recover(), "-1 Fail to load configuration") << "there is no file to move";

@@ -1,5 +1,7 @@
 #include "dbutil.h"
 
+#include <sstream>
+
 #include "common/handles.h"
 #include "tests/support/database.h"
 #include "tests/support/db_spy.h"
@@ -11,74 +13,59 @@ namespace {
 
 using Conditions = std::list<_SYSLOG_SQL_COND_tag>;
 
-// The first row of a table, as a record that held other values before.
 class Record : public DatabaseTest {
   protected:
-    int convert(const std::string& schema, std::string table, bool trim) {
+    // What comes of reading the first row of a table into a record that held other values: the result, the numbers and
+    // the texts.
+    std::string read(const std::string& schema, std::string table, bool trim) {
         run(schema);
         const quor::Connection connection(QUORDBConnect(nullptr, nullptr, nullptr, path_.c_str()));
         quor::Result result;
         EXPECT_GE(QUORDBExecute(connection.get(), ("SELECT * FROM " + table).c_str(), quor::Adopt(result)), 0);
-        return DBRecToLogInfo(table, result.get(), 0, &record_, trim);
-    }
-
-    // All texts.
-    std::string texts() const {
-        std::string all;
-        for (const std::string* text : {&record_.tag, &record_.host, &record_.ip, &record_.fac, &record_.tzoffset,
-                                        &record_.ldate, &record_.ltime, &record_.prog, &record_.msg, &record_.luser,
-                                        &record_.event, &record_.xferip, &record_.fname, &record_.fsize}) {
-            all += *text + ",";
+        _SYSLOG_LOG_DATA_tag r{
+            1, 2, 3, SYSLOG_PRIORITY_CRIT, "A", "B", "C", "D", "E", "F", "G", "H", "I", "J", "K", "L", "M", 4, "N"};
+        std::ostringstream all;
+        all << DBRecToLogInfo(table, result.get(), 0, &r, trim) << ": ";
+        all << r.id << ' ' << r.utcsec << ' ' << r.xsec << ' ' << r.prio << ' ' << r.isdir;
+        for (const std::string& text : {r.tag, r.host, r.ip, r.fac, r.tzoffset, r.ldate, r.ltime, r.prog, r.msg,
+                                        r.luser, r.event, r.xferip, r.fname, r.fsize}) {
+            all << ',' << text;
         }
-        return all;
+        return all.str();
     }
-
-    _SYSLOG_LOG_DATA_tag record_{
-        1, 2, 3, SYSLOG_PRIORITY_CRIT, "A", "B", "C", "D", "E", "F", "G", "H", "I", "J", "K", "L", "M", 4, "N"};
 };
 
-TEST_F(Record, OfTableLogsReadsEveryColumnByName) {
-    ASSERT_EQ(
-        convert("CREATE TABLE logs(prio, msg, id, host, ip, fac, tag, utcsec, tzoffset, ldate, ltime, prog);"
-                "INSERT INTO logs VALUES('err', 'bob: hi: x', '18446744073709551615', 'h', '1.2.3.4', 'kern', 't',"
-                "-3000000000, '+01:00', '2026-01-02', '03:04:05', 'p')",
-                "logs", true),
-        0);
-    EXPECT_EQ(texts(), "t,h,1.2.3.4,kern,+01:00,2026-01-02,03:04:05,p, hi: x,J,K,L,M,N,");
-    EXPECT_EQ(record_.id, 18446744073709551615U);
-    EXPECT_EQ(record_.utcsec, -3000000000);
-    EXPECT_EQ(record_.prio, SYSLOG_PRIORITY_ERR);
-    EXPECT_EQ(record_.xsec, 3);
-    ASSERT_EQ(convert("DROP TABLE logs; CREATE TABLE logs(id, prio, msg); INSERT INTO logs VALUES(NULL, NULL, 'a:b')",
-                      "logs", false),
-              0);
-    EXPECT_EQ(texts(), ",,,,,,,,a:b,J,K,L,M,N,") << "missing and null are empty";
-    EXPECT_EQ(record_.id, 0U);
-    EXPECT_EQ(record_.utcsec, 0);
-    EXPECT_EQ(record_.prio, SYSLOG_PRIORITY_DEBUG);
-}
-
-TEST_F(Record, OfTheOtherTablesHasTheirFieldsAlone) {
+TEST_F(Record, HasTheFieldsOfItsTableAlone) {
+    EXPECT_EQ(
+        read("CREATE TABLE logs(prio, msg, id, host, ip, fac, tag, utcsec, tzoffset, ldate, ltime, prog);"
+             "INSERT INTO logs VALUES('err', 'bob: hi: x', '18446744073709551615', 'h', '1.2.3.4', 'kern', 't',"
+             "-3000000000, '+01:00', '2026-01-02', '03:04:05', 'p')",
+             "logs", true),
+        "0: 18446744073709551615 -3000000000 3 3 4,t,h,1.2.3.4,kern,+01:00,2026-01-02,03:04:05,p, hi: x,J,K,L,M,N");
+    EXPECT_EQ(read("DROP TABLE logs; CREATE TABLE logs(id, prio, msg); INSERT INTO logs VALUES(NULL, NULL, 'a:b')",
+                   "logs", false),
+              "0: 0 0 3 7 4,,,,,,,,,a:b,J,K,L,M,N")
+        << "missing and null are empty";
     run("CREATE TABLE general_log(id, host, llevel, prog, ldate, ltime, luser, msg);"
         "INSERT INTO general_log VALUES(9, 'h', 'alert', 'p', 'd', 't', 'u', 'x: y');");
-    ASSERT_EQ(convert("CREATE TABLE connection_log AS SELECT * FROM general_log", "connection_log", true), 0);
-    EXPECT_EQ(texts(), "A,h,C,D,E,d,t,p,I,u,x: y,L,M,N,") << "the message is the event, whole";
-    EXPECT_EQ(record_.prio, SYSLOG_PRIORITY_ALERT);
-    ASSERT_EQ(convert("CREATE TABLE transfer_log(id, host, prog, ldate, ltime, luser, event, fname, isdir, fsize, ip);"
-                      "INSERT INTO transfer_log VALUES(8, 'h', 'p', 'd', 't', 'u', 'e', 'f', 1, '2 KB', '::1')",
-                      "transfer_log", false),
-              0);
-    EXPECT_EQ(texts(), "A,h,C,D,E,d,t,p,I,u,e,::1,f,2 KB,");
-    EXPECT_EQ(record_.isdir, 1U);
-    EXPECT_EQ(convert("CREATE TABLE LOGS(id); INSERT INTO LOGS VALUES(7)", "LOGS", false), -1) << "no other table";
-    EXPECT_EQ(record_.id, 8U);
+    for (const char* table : {"general_log", "connection_log"}) {
+        EXPECT_EQ(read("CREATE TABLE IF NOT EXISTS connection_log AS SELECT * FROM general_log", table, true),
+                  "0: 9 2 3 1 4,A,h,C,D,E,d,t,p,I,u,x: y,L,M,N")
+            << "the message is the event, whole";
+    }
+    EXPECT_EQ(read("CREATE TABLE transfer_log(id, host, prog, ldate, ltime, luser, event, fname, isdir, fsize, ip);"
+                   "INSERT INTO transfer_log VALUES(8, 'h', 'p', 'd', 't', 'u', 'e', 'f', 1, '2 KB', '::1')",
+                   "transfer_log", false),
+              "0: 8 2 3 2 1,A,h,C,D,E,d,t,p,I,u,e,::1,f,2 KB");
+    EXPECT_EQ(read("CREATE TABLE other(id); INSERT INTO other VALUES(7)", "other", false),
+              "-1: 1 2 3 2 4,A,B,C,D,E,F,G,H,I,J,K,L,M,N");
 }
 
 TEST_F(Record, IsNotMadeOfNothing) {
-    EXPECT_EQ(DBRecToAllLogInfo(nullptr, 0, &record_, false), -1);
-    EXPECT_EQ(DBRecToSysLogInfo(nullptr, 0, &record_), -1);
-    EXPECT_EQ(DBRecToXferLogInfo(nullptr, 0, &record_), -1);
-    EXPECT_EQ(texts(), "A,B,C,D,E,F,G,H,I,J,K,L,M,N,");
+    _SYSLOG_LOG_DATA_tag record;
+    EXPECT_EQ(DBRecToAllLogInfo(nullptr, 0, &record, false), -1);
+    EXPECT_EQ(DBRecToSysLogInfo(nullptr, 0, &record), -1);
+    EXPECT_EQ(DBRecToXferLogInfo(nullptr, 0, &record), -1);
 }
 
 // The names of the values from -1 to `last`, each followed by a comma.

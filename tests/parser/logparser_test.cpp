@@ -2,12 +2,11 @@
 
 #include <gtest/gtest.h>
 
-#include "tests/support/debug.h"
 #include "tests/support/system_log.h"
 
 namespace {
 
-using quor::test::TakeSystemLogTexts;
+using namespace quor::test;
 using Texts = std::vector<std::string>;
 
 const std::string kFields = "local0 err 2026-11-21 05:15:54 1795238154 17 +00:00 router1 10.0.0.1 kernel";
@@ -46,7 +45,7 @@ TEST(LogParser, KeepsTheLinesThatParse) {
     EXPECT_EQ(parser.LogGetCount(), 3);
     parser.LogDump();
     const std::string dumped = "2 Log countent: link  is down ";
-    EXPECT_EQ(quor::test::TakeDropped(), (Texts{"2 Log count: 3", dumped, dumped, "2 Log countent: "}));
+    EXPECT_EQ(TakeDropped(), (Texts{"2 Log count: 3", dumped, dumped, "2 Log countent: "}));
     const std::list<_SYSLOG_LOG_DATA_tag> logs = parser.LogListGet();
     EXPECT_EQ(parser.LogReset(), 0);
     EXPECT_EQ(parser.LogGetCount(), 0);
@@ -68,7 +67,7 @@ TEST(LogParser, RejectsRecordsThatLackWhatIdentifiesALog) {
     EXPECT_EQ(TakeSystemLogTexts(), Texts(6, "Invalid log!!!!!!!!!!!!! (Attention Please)"));
     EXPECT_EQ(parser.LogReset(), 0);
     parser.PartialLogDump();
-    EXPECT_EQ(quor::test::TakeDropped(),
+    EXPECT_EQ(TakeDropped(),
               (Texts{"2 Partial log count: 6", "2 Log countent:  i d t p m", "2 Log countent: h  d t p m",
                      "2 Log countent: h i  t p m", "2 Log countent: h i d  p m", "2 Log countent: h i d t  m",
                      "2 Log countent: h i d t p "}));

@@ -1,10 +1,9 @@
-#include "tests/support/debug.h"
-
 #include <syslog.h>
 
 #include <utility>
 
 #include "common.h"
+#include "tests/support/system_log.h"
 
 namespace {
 
