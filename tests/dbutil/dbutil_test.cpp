@@ -91,21 +91,24 @@ TEST(Names, ThatAreUnknownAreRefused) {
     EXPECT_EQ(TrimUserName("a:b:c") + TrimUserName("none") + TrimUserName("a:"), "b:cnone");
 }
 
-// Collects ids, up to `most`.
+// Collects ids until so many are left to take.
 struct Walk {
-    Strings ids;
-    size_t most = 1000;
+    std::string ids;
+    int left;
 
     static int take(_SYSLOG_LOG_DATA_tag& record, void* context) {
         auto& walk = *static_cast<Walk*>(context);
-        walk.ids.push_back(std::to_string(record.id));
-        return walk.ids.size() >= walk.most ? 1 : 0;
+        walk.ids += std::to_string(record.id) + " ";
+        return --walk.left == 0 ? 1 : 0;
     }
 };
 
 // Ids 1 to 10; odd ones are of host "odd".
 class Select : public DatabaseTest {
   protected:
+    using Limit = _SYSLOG_SQL_LIMIT_tag;
+    using Order = _SYSLOG_SQL_ORDER_tag;
+
     Select() {
         run("CREATE TABLE logs(id INTEGER PRIMARY KEY, host, msg);"
             "WITH RECURSIVE n(i) AS (SELECT 1 UNION ALL SELECT i+1 FROM n WHERE i < 10)"
@@ -114,83 +117,63 @@ class Select : public DatabaseTest {
         SpyOnDb() = {};
     }
 
-    // What happened to the statements that were sent since.
-    static void expectStatements(const Strings& statements) {
-        EXPECT_EQ(std::exchange(SpyOnDb().statements, {}), statements);
+    // The result, the ids and the statement.
+    std::string select(Conditions conds, Limit* limit, Order* order, std::string table = "logs", int most = 100) {
+        Walk walk{"", most};
+        const int result = SyslogDBSelectByTable(path_, table, conds, limit, order, Walk::take, &walk, false);
+        return std::to_string(result) + ": " + walk.ids + SpyOnDb().statements.back();
     }
-
-    int select(Conditions conds, _SYSLOG_SQL_LIMIT_tag* limit, _SYSLOG_SQL_ORDER_tag* order) {
-        return SyslogDBSelect(path_, conds, limit, order, Walk::take, &walk_, false);
+    std::string count(Conditions conds, Limit* limit, Order* order, std::string table = "logs") {
+        const int result = SyslogDBSelectCountByTable(path_, table, conds, limit, order);
+        return std::to_string(result) + ": " + SpyOnDb().statements.back();
     }
 
     Conditions none_;
     Conditions all_{{SYSLOG_ATTRI_MSG, 8, "**", {}}};
     Conditions odd_{{SYSLOG_ATTRI_HOST, 0, "odd", {}}};
-    _SYSLOG_SQL_ORDER_tag newest_{0, SYSLOG_ATTRI_ID};
-    Walk walk_;
+    Order newest_{0, SYSLOG_ATTRI_ID};
 };
 
 TEST_F(Select, PagesUnfilteredTablesByIdWindowAndOthersThroughTheLimitedSelect) {
-    _SYSLOG_SQL_LIMIT_tag page{3, 2};
-    _SYSLOG_SQL_LIMIT_tag large{(1ULL << 32) + 2, (1ULL << 33) + 1};  // the limited select takes the low 32 bits
-    ASSERT_EQ(select(none_, &page, &newest_), 0);
-    EXPECT_EQ(walk_.ids, Strings({"8", "7", "6"}));
-    ASSERT_EQ(select(all_, &large, &newest_), 0);
-    ASSERT_EQ(select(odd_, &large, &newest_), 0);
-    EXPECT_EQ(walk_.ids, Strings({"8", "7", "6", "7", "5"}));
+    Limit page{3, 2};
+    Limit large{(1ULL << 32) + 2, (1ULL << 33) + 1};  // the limited select takes the low 32 bits
     const std::string maximum = "SELECT *, (SELECT max(rowid) FROM logs) totalCount FROM logs WHERE ";
-    expectStatements({maximum + "( id > totalCount - 5 AND id <= totalCount - 2) ORDER BY id desc",
-                      maximum + "(msg GLOB '**') AND ( id > totalCount - 12884901891 AND id <= totalCount - "
-                                "8589934593) ORDER BY id desc",
-                      "SELECT * FROM logs WHERE (host = 'odd') ORDER BY id desc [2,1]"});
-}
-
-TEST_F(Select, WithoutAWindowGivesEveryRowThatIsTaken) {
-    _SYSLOG_SQL_LIMIT_tag everything{0, 4};
-    _SYSLOG_SQL_ORDER_tag oldest{7, SYSLOG_ATTRI_HOST};
-    ASSERT_EQ(select(none_, &everything, &oldest), 0);
-    ASSERT_EQ(select(none_, nullptr, nullptr), 0);
-    EXPECT_EQ(walk_.ids.size(), 20U);
-    expectStatements({"SELECT * FROM logs ORDER BY host asc", "SELECT * FROM logs"});
-    std::string other = "other";
-    EXPECT_EQ(SyslogDBSelectByTable(path_, other, none_, nullptr, nullptr, Walk::take, &walk_, false), 0);
-    EXPECT_EQ(walk_.ids.size(), 20U) << "a row of an unknown table was handed over";
-    walk_.most = 21;
-    EXPECT_EQ(select(none_, nullptr, &newest_), 0);
-    EXPECT_EQ(walk_.ids.back(), "10") << "the walk ends when it is asked to";
-}
-
-TEST_F(Select, ReportsWhatFailed) {
-    std::string missing = folder_.path("none.db");
-    std::string table = "nowhere";
-    EXPECT_EQ(Said(SyslogDBSelect(missing, none_, nullptr, nullptr, nullptr, nullptr, false)),
-              "-1 fail to connect database (" + missing + ")");
-    EXPECT_EQ(Said(SyslogDBSelectByTable(path_, table, none_, nullptr, nullptr, nullptr, nullptr, false)),
-              "-1 fail to execute database command (SELECT * FROM nowhere)");
+    EXPECT_EQ(select(none_, &page, &newest_),
+              "0: 8 7 6 " + maximum + "( id > totalCount - 5 AND id <= totalCount - 2) ORDER BY id desc");
+    EXPECT_EQ(select(all_, &large, &newest_), "0: " + maximum +
+                                                  "(msg GLOB '**') AND ( id > totalCount - 12884901891 "
+                                                  "AND id <= totalCount - 8589934593) ORDER BY id desc");
+    EXPECT_EQ(select(odd_, &large, &newest_), "0: 7 5 SELECT * FROM logs WHERE (host = 'odd') ORDER BY id desc [2,1]");
+    Limit everything{0, 4};
+    Order byHost{7, SYSLOG_ATTRI_HOST};
+    EXPECT_EQ(select(none_, &everything, &byHost), "0: 2 4 6 8 10 1 3 5 7 9 SELECT * FROM logs ORDER BY host asc");
+    EXPECT_EQ(select(none_, nullptr, &newest_, "logs", 2), "0: 10 9 SELECT * FROM logs ORDER BY id desc");
+    EXPECT_EQ(select(none_, nullptr, nullptr, "other"), "0: SELECT * FROM other") << "a row of an unknown table";
+    EXPECT_EQ(Said(select(none_, nullptr, nullptr, "nowhere")),
+              "-1: SELECT * FROM nowhere fail to execute database command (SELECT * FROM nowhere)");
+    EXPECT_EQ(SyslogDBSelect(path_, none_, nullptr, nullptr, nullptr, nullptr, false), 0) << "a walk over rows alone";
+    path_ += "x";
+    EXPECT_EQ(Said(SyslogDBSelect(path_, none_, nullptr, nullptr, nullptr, nullptr, false)),
+              "-1 fail to connect database (" + path_ + ")");
 }
 
 TEST_F(Select, DeletesWhatTheConditionsSay) {
     EXPECT_EQ(SyslogDBDelete(path_, odd_), 0);
     EXPECT_EQ(query("SELECT DISTINCT host FROM logs"), Strings{"even"});
     EXPECT_EQ(SyslogDBDelete(path_, none_), 0);
-    expectStatements({"DELETE FROM logs WHERE (host = 'odd')", "DELETE FROM logs"});
+    EXPECT_EQ(SpyOnDb().statements, Strings({"DELETE FROM logs WHERE (host = 'odd')", "DELETE FROM logs"}));
 }
 
 TEST_F(Select, CountsByLargestIdUnlessFiltered) {
     run("DELETE FROM logs WHERE id IN (3, 4, 5)");
-    EXPECT_EQ(SyslogDBSelectCount(path_, none_, nullptr, nullptr), 10);
-    EXPECT_EQ(SyslogDBSelectCount(path_, all_, nullptr, nullptr), 10);
-    EXPECT_EQ(SyslogDBSelectCount(path_, odd_, nullptr, &newest_), 3);
-    expectStatements({"SELECT max(rowid) FROM logs", "SELECT max(rowid) FROM logs WHERE (msg GLOB '**')",
-                      "SELECT COUNT(*) FROM logs WHERE (host = 'odd') ORDER BY id desc"});
-
-    _SYSLOG_SQL_LIMIT_tag beyond{1, 1};
-    EXPECT_EQ(SyslogDBSelectCount(path_, none_, &beyond, nullptr), -1) << "the only row was skipped";
+    EXPECT_EQ(count(none_, nullptr, nullptr), "10: SELECT max(rowid) FROM logs");
+    EXPECT_EQ(count(all_, nullptr, nullptr), "10: SELECT max(rowid) FROM logs WHERE (msg GLOB '**')");
+    EXPECT_EQ(count(odd_, nullptr, &newest_), "3: SELECT COUNT(*) FROM logs WHERE (host = 'odd') ORDER BY id desc");
+    Limit beyond{1, 1};
+    EXPECT_EQ(count(none_, &beyond, nullptr), "-1: SELECT max(rowid) FROM logs [1,1]") << "the only row was skipped";
+    EXPECT_EQ(count(none_, nullptr, nullptr, "logs GROUP BY host").substr(0, 3), "-2:");
     run("UPDATE logs SET id = 7000000000 WHERE id = 10");
     EXPECT_EQ(SyslogDBSelectCount(path_, none_, nullptr, nullptr), -1589934592) << "not the low 32 bits";
-
-    std::string twoRows = "logs GROUP BY host";
-    EXPECT_EQ(SyslogDBSelectCountByTable(path_, twoRows, none_, nullptr, nullptr), -2);
 }
 
 _SYSLOG_SQL_COND_tag cond(_SYSLOG_DB_ATTRI_tag attr, int op, const std::string& value, Conditions orList = {}) {
