@@ -105,14 +105,6 @@ TEST_F(Accounting, ASampleAtTheThresholdIsNotifiedAndRecorded) {
     EXPECT_EQ(SqliteFile(paths::kEventDb).query("SELECT event FROM log"),
               Strings{"Event detection: EPS is larger than [3]."})
         << "recorded although it was not sent";
-    FakeNotices().fail = false;
-    sample(accounting, 1003, {"a", "b", "a"});
-    EXPECT_EQ(TakeDropped().back(), "2 Send EPS notification");
-    accounting.LogInc("c");
-    accounting.AccountingDump();
-    EXPECT_EQ(TakeDropped(),
-              (Strings{"2 ======Accounting Status dump======", "2 Total: 10", "2 EPS: 1", "2 Device: a, count: 6",
-                       "2 Device: b, count: 3", "2 Device: c, count: 1", "2 =================================="}));
 }
 
 TEST_F(Accounting, AFailedSampleKeepsTheOnesBeforeItAFailedHistogramNone) {

@@ -124,10 +124,8 @@ TEST_F(EventLog, ListsNewestFirstAndBoundsNumbers) {
     EXPECT_EQ(times("/proc/none/events.db", 0, 0), " Fail to connect db");
     run("DELETE FROM log; INSERT INTO log VALUES(4000000000, -9999999999, 9999999999, NULL, NULL)");
     const _SSYSLOG_LOG_LOG_tag event = logger_.LogEnum(path_, 0, 0).front();
-    EXPECT_EQ(event.id, INT32_MAX);
-    EXPECT_EQ(event.level, INT32_MIN);
-    EXPECT_EQ(event.time, 9999999999);
-    EXPECT_EQ(event.user + event.event, "");
+    EXPECT_EQ(std::tie(event.id, event.level, event.time, event.user, event.event),
+              std::make_tuple(INT32_MAX, INT32_MIN, 9999999999, "", ""));
 }
 
 TEST_F(EventLog, HtmlPageIsExactAndUnescaped) {

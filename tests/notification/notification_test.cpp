@@ -172,19 +172,16 @@ TEST_F(Senders, FillThePlaceholdersAndReportWhatFails) {
         EXPECT_EQ(Said(send()), "0 ");
         ASSERT_EQ(FakeNotices().sent.size(), 1U);
         const Notice notice = FakeNotices().sent[0];
-        std::string sent;
+        std::string sent = notice.tag + " ";
         for (const auto& [key, value] : notice.values) {
             sent += key + ("=" + value) + " ";
         }
-        EXPECT_EQ(notice.tag + " " + sent, tag + " " + values);
-        EXPECT_EQ(notice.textsDir + notice.filterFile,
-                  std::string(quor::paths::kNotifyTexts) + quor::paths::kNotifyFilter);
+        EXPECT_EQ(sent + notice.textsDir, tag + " " + values + quor::paths::kNotifyTexts);
+        EXPECT_EQ(notice.filterFile, quor::paths::kNotifyFilter);
         FakeNotices().fail = true;
         EXPECT_EQ(send(), -1);
-        const Strings second(managed ? 1 : 0, "Fail to send notification");
-        Strings messages{"Fail to send notification: " + tag};
-        messages.insert(messages.end(), second.begin(), second.end());
-        EXPECT_EQ(TakeSystemLogTexts(), messages);
+        const std::string failed = "Fail to send notification: " + tag;
+        EXPECT_EQ(TakeSystemLogTexts(), managed ? Strings({failed, "Fail to send notification"}) : Strings{failed});
         FakeNotices().tablesFail = true;
         EXPECT_EQ(Said(send()), managed ? "-1 Fail to allocation memory" : "-1 ");
     }

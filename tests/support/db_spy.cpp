@@ -38,10 +38,6 @@ int QUORDBSelectLimit(DBConnect_tag* connection, const char* sql, unsigned int c
     return spied(SpyOnDb().statements, sql + window, QUORDBSelectLimit, __func__, connection, sql, count, skip, result);
 }
 
-int QUORDBEscapeStringEX(DBConnect_tag* connection, char* out, unsigned int size, const char* in, unsigned int length) {
-    return spied(SpyOnDb().escapes, "text", QUORDBEscapeStringEX, __func__, connection, out, size, in, length);
-}
-
 int QUORDBEscapeStringEX2(DBConnect_tag* connection, char* out, unsigned int size, const char* in,
                           unsigned int length) {
     return spied(SpyOnDb().escapes, "quotes", QUORDBEscapeStringEX2, __func__, connection, out, size, in, length);

@@ -9,7 +9,7 @@ namespace quor::test {
 
 struct DbSpy {
     std::vector<std::string> statements;  // a limited select ends in " [COUNT,SKIP]"
-    std::vector<std::string> escapes;     // "text", "quotes" and "backslashes"
+    std::vector<std::string> escapes;     // "quotes" and "backslashes"
     std::string failing;                  // a statement or escape that contains this fails unrun, when not empty
     int rowsLeft = -1;                    // from 0 on, the row after so many others cannot be fetched
     int closed = 0;                       // connections, null ones too

@@ -3,7 +3,6 @@
 #include <cstdarg>
 
 #include "quor/quorcore.h"
-#include "quor/quorfs.h"
 #include "quor/quorservice.h"
 #include "tests/support/real.h"
 
@@ -38,13 +37,4 @@ int QLIBCExec(const char* program, ...) {
     const bool fails = !services.failing.empty() && std::string(command).find(services.failing) != std::string::npos;
     const char* const end = nullptr;
     return fails ? -1 : quor::test::Real(QLIBCExec, __func__)(program, option, command, end);
-}
-
-int QUORFSMkdirP(const char* path, int reserved1, int reserved2, int uid, int gid, unsigned int mode) {
-    std::string call = path;
-    for (const int argument : {reserved1, reserved2, uid, gid, static_cast<int>(mode)}) {
-        call += " " + std::to_string(argument);
-    }
-    quor::test::FakeServices().folders.push_back(call);
-    return quor::test::Real(QUORFSMkdirP, __func__)(path, reserved1, reserved2, uid, gid, mode);
 }

@@ -1,4 +1,4 @@
-// Service reloads, folders and shell commands of the test program: recorded, and failing on demand.
+// Service reloads and shell commands of the test program: recorded, and failing on demand.
 #ifndef TESTS_SUPPORT_SERVICES_H
 #define TESTS_SUPPORT_SERVICES_H
 
@@ -11,7 +11,6 @@ struct Services {
     std::vector<std::string> reloaded;  // "service NAME" or "job NAME", in order
     bool fail = false;
     std::vector<std::string> commands;  // "PROGRAM OPTION COMMAND", run for real
-    std::vector<std::string> folders;   // the path and the other arguments, created for real
     std::string failing;                // a command that contains this is not run, when not empty
 };
 

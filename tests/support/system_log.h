@@ -18,9 +18,6 @@ std::vector<SystemLogLine> TakeSystemLog();
 // The texts alone.
 std::vector<std::string> TakeSystemLogTexts();
 
-// The debug messages that the library drops, "LEVEL MESSAGE" of each since the last call; only with test_debug.
-std::vector<std::string> TakeDropped();
-
 // Lines written from now on also go to this file, which shows those of forked processes; empty ends it.
 void CopySystemLogTo(const std::string& path);
 
