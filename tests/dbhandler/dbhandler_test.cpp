@@ -244,15 +244,10 @@ TEST_F(Failure, OfOneStepOfTheRecoveryLeavesTheOthers) {
     EXPECT_EQ(recover(), "0 Fail to send notification: QUORSYSLOG_DB_CORRUPT");
 }
 
-class WorkingDb : public Handle {
-  protected:
-    ~WorkingDb() override { fs::remove(marker_); }
-
-    const std::string marker_ = quor::paths::kPackageEnabled;
-};
+using WorkingDb = Handle;
 
 TEST_F(WorkingDb, HangsUpTheSyslogNgThatIsInCharge) {
-    WriteFile(marker_, "");
+    WriteFile(quor::paths::kPackageEnabled, "");
     for (const std::string name : {"pkg-Orvane-syslog", "syslog-ng"}) {
         FakeServices() = {};
         EXPECT_EQ(Said(SyslogngHupSignalSend()), "0 ");
@@ -260,7 +255,7 @@ TEST_F(WorkingDb, HangsUpTheSyslogNgThatIsInCharge) {
         EXPECT_EQ(Said(SyslogngHupSignalSend()), "-1 Fail to send HUP signal to " + name);
         const std::string call = (name == "syslog-ng" ? "service " : "job ") + name;
         EXPECT_EQ(FakeServices().reloaded, Strings({call, call}));
-        fs::remove(marker_);
+        fs::remove(quor::paths::kPackageEnabled);
     }
 }
 

@@ -3,30 +3,24 @@
 #include <ctime>
 #include <optional>
 
-namespace quor::test {
 namespace {
 
-std::optional<time_t>& fixedTime() {
-    static std::optional<time_t> fixed;
-    return fixed;
-}
+std::optional<time_t> fixed;
 
 }  // namespace
 
-void SetClock(int64_t now) {
-    fixedTime() = static_cast<time_t>(now);
+void quor::test::SetClock(int64_t now) {
+    fixed = static_cast<time_t>(now);
 }
 
-void ResetClock() {
-    fixedTime().reset();
+void quor::test::ResetClock() {
+    fixed.reset();
 }
-
-}  // namespace quor::test
 
 extern "C" time_t time(time_t* timer) noexcept {
     timespec now{};
     clock_gettime(CLOCK_REALTIME, &now);
-    const time_t seconds = quor::test::fixedTime().value_or(now.tv_sec);
+    const time_t seconds = fixed.value_or(now.tv_sec);
     if (timer != nullptr) {
         *timer = seconds;
     }

@@ -3,15 +3,6 @@
 #include "quor/quordb.h"
 #include "tests/support/real.h"
 
-namespace quor::test {
-
-DbSpy& SpyOnDb() {
-    static DbSpy spy;
-    return spy;
-}
-
-}  // namespace quor::test
-
 using quor::test::SpyOnDb;
 
 namespace {

@@ -15,7 +15,10 @@ struct DbSpy {
     int closed = 0;                       // connections, null ones too
 };
 
-DbSpy& SpyOnDb();
+inline DbSpy& SpyOnDb() {
+    static DbSpy spy;
+    return spy;
+}
 
 }  // namespace quor::test
 

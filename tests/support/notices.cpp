@@ -2,15 +2,6 @@
 
 #include "tests/support/real.h"
 
-namespace quor::test {
-
-Notices& FakeNotices() {
-    static Notices notices;
-    return notices;
-}
-
-}  // namespace quor::test
-
 int QUORSysNotifySendNotificationCustomized(const char* tag, const char* textsDir, const char* filterFile,
                                             QLIBSZHASH* values, int /*flags*/) {
     quor::test::Notice notice{tag, textsDir, filterFile, {}};

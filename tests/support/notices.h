@@ -32,7 +32,10 @@ struct Notices {
     int smsLent = 0;  // settings that were not given back yet
 };
 
-Notices& FakeNotices();
+inline Notices& FakeNotices() {
+    static Notices notices;
+    return notices;
+}
 
 }  // namespace quor::test
 

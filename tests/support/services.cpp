@@ -6,15 +6,6 @@
 #include "quor/quorservice.h"
 #include "tests/support/real.h"
 
-namespace quor::test {
-
-Services& FakeServices() {
-    static Services services;
-    return services;
-}
-
-}  // namespace quor::test
-
 int QLIBServiceReload(const char* service) {
     quor::test::FakeServices().reloaded.push_back(std::string("service ") + service);
     return quor::test::FakeServices().fail ? -1 : 0;

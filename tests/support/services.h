@@ -14,7 +14,10 @@ struct Services {
     std::string failing;                // a command that contains this is not run, when not empty
 };
 
-Services& FakeServices();
+inline Services& FakeServices() {
+    static Services services;
+    return services;
+}
 
 }  // namespace quor::test
 

@@ -10,26 +10,19 @@
 
 namespace {
 
-std::vector<quor::test::SystemLogLine>& written() {
-    static std::vector<quor::test::SystemLogLine> lines;
-    return lines;
-}
-
-std::string& copyPath() {
-    static std::string path;
-    return path;
-}
+std::vector<quor::test::SystemLogLine> written;
+std::string copyPath;
 
 }  // namespace
 
 namespace quor::test {
 
 void CopySystemLogTo(const std::string& path) {
-    copyPath() = path;
+    copyPath = path;
 }
 
 std::vector<SystemLogLine> TakeSystemLog() {
-    return std::exchange(written(), {});
+    return std::exchange(written, {});
 }
 
 std::vector<std::string> TakeSystemLogTexts() {
@@ -51,9 +44,9 @@ extern "C" void syslog(int priority, const char* format, ...) {
     va_end(arguments);
     const quor::CText text(length >= 0 ? raw : nullptr);
     try {
-        written().push_back({priority, text != nullptr ? text.get() : format});
-        if (!copyPath().empty()) {
-            std::ofstream(copyPath(), std::ios::app) << text.get() << std::endl;
+        written.push_back({priority, text != nullptr ? text.get() : format});
+        if (!copyPath.empty()) {
+            std::ofstream(copyPath, std::ios::app) << text.get() << std::endl;
         }
     } catch (const std::bad_alloc&) {
         return;
