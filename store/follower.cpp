@@ -62,23 +62,22 @@ uint64_t Follower::look(const RecordHandler& handler) {
             handler(record);
         }
     });
-    if (same && source_.identity() == identity_) {
+    same = first ? source_.identity() == identity_ : same;
+    if (same) {
         after_ = rows < kPiece ? newest : reached;
     }
     return same ? rows : 0;
 }
 
 bool Follower::poll(const RecordHandler& handler) {
-    if (!enter(source_.identity())) {
-        return false;
-    }
     try {
-        return look(handler) == kPiece;
+        return enter(source_.identity()) && look(handler) == kPiece;
     } catch (const Failure& failure) {
-        if (after_ == 0 && failure.cause() == Cause::Missing) {
-            return false;  // a new database has no table before its first row
+        const bool begins = after_ == 0 && failure.cause() == Cause::Missing;  // no table before its first row
+        if (!begins && failure.cause() != Cause::Busy) {
+            throw;
         }
-        throw;
+        return false;
     }
 }
 

@@ -27,7 +27,7 @@ class Follower {
     void last(uint64_t rows, const RecordHandler& handler) const;
     // Hands over what has arrived since the last look, oldest first: one piece of it. Rows that
     // took the place of those before (the database was removed and begun anew) are followed from their start; while a
-    // new database has no table yet, nothing has arrived. False when there is no more for now.
+    // new database has no table yet, or others lock it, nothing has arrived. False when there is no more for now.
     bool poll(const RecordHandler& handler);
 
     // The rows that it stands in, and the last one that it has looked at.

@@ -200,6 +200,13 @@ TEST_F(Store, AFollowerSeesWhatArrivesAndWhatReplacesIt) {
     begin();
     run("INSERT INTO logs(host) VALUES('a')");
     EXPECT_EQ(poll(follower), Ids{1});
+    {
+        SqliteFile lock(path_);
+        lock.run("BEGIN EXCLUSIVE; INSERT INTO logs(host) VALUES('a')");
+        EXPECT_EQ(poll(follower), Ids{}) << "locked";
+        lock.run("COMMIT");
+    }
+    EXPECT_EQ(poll(follower), Ids{2});
     run("DROP TABLE logs");
     EXPECT_NE(failureOf([&] { poll(follower); }).find("missing: "), std::string::npos) << "the table was there";
 }
