@@ -129,13 +129,26 @@ std::string decimal(double value) {
     return {text, static_cast<size_t>(snprintf(text, sizeof text, "%.2f", value))};
 }
 
-// A sample holds what was counted since the one before it closed, so its rate needs that distance; the first sample
-// shown may have an unknown one.
-void writeSamples(const std::map<int32_t, SYSLOG_LOG_EPS>& samples, const Style& style, Output& out) {
+using Samples = std::map<int32_t, SYSLOG_LOG_EPS>;
+
+unsigned long long largestOf(const Samples& samples) {
     unsigned long long largest = 1;
     for (const auto& [stamp, sample] : samples) {
         largest = std::max(largest, sample.eps);
     }
+    return largest;
+}
+
+// A sample holds what was counted since the one before it closed, so its rate needs that distance: 0 is an unknown one,
+// as that of the first sample shown.
+std::vector<std::string> textsOf(const SYSLOG_LOG_EPS& sample, int64_t seconds, bool table) {
+    const bool known = seconds != 0;
+    return {table ? store::LocalTime(sample.stamp) : std::to_string(sample.stamp), std::to_string(sample.eps),
+            known ? std::to_string(seconds) : "",
+            known ? decimal(static_cast<double>(sample.eps) / static_cast<double>(seconds)) : ""};
+}
+
+void writeSamples(const Samples& samples, const Style& style, Output& out) {
     const bool table = style.format == Format::Table;
     const bool drawn = table && style.terminal;
     Columns columns = {{"stamp", table ? Kind::Text : Kind::Number},
@@ -146,20 +159,15 @@ void writeSamples(const std::map<int32_t, SYSLOG_LOG_EPS>& samples, const Style&
         columns.push_back({"samples"});
     }
     const auto sink = MakeSink(style, columns, out);
-    const int32_t* previous = nullptr;
+    const unsigned long long largest = largestOf(samples);
+    long long previous = samples.empty() ? 0 : samples.begin()->second.stamp;
     for (const auto& [stamp, sample] : samples) {
-        const int64_t seconds = previous == nullptr ? 0 : int64_t{stamp} - *previous;
-        previous = &stamp;
-        const std::string bar(static_cast<size_t>(sample.eps * kBarWidth / largest), '#');
-        const std::string texts[] = {
-            table ? store::LocalTime(stamp) : std::to_string(stamp), std::to_string(sample.eps),
-            seconds == 0 ? "" : std::to_string(seconds),
-            seconds == 0 ? "" : decimal(static_cast<double>(sample.eps) / static_cast<double>(seconds))};
-        Cells cells(std::begin(texts), std::end(texts));
+        std::vector<std::string> texts = textsOf(sample, sample.stamp - previous, table);
         if (drawn) {
-            cells.emplace_back(bar);
+            texts.emplace_back(sample.eps * kBarWidth / largest, '#');
         }
-        sink->row(cells);
+        sink->row(Cells(texts.begin(), texts.end()));
+        previous = sample.stamp;
     }
     sink->finish();
 }
