@@ -91,10 +91,19 @@ TEST(Text, IsShownAndEncodedWithoutAnythingRaw) {
 }
 
 TEST(Text, CsvCellsAreQuotedAndFormulasDefused) {
-    std::string cells;
-    AppendCsvCell(cells, "=1,2", false);
-    AppendCsvCell(cells, "=1,2", true);
-    EXPECT_EQ(cells, "\"=1,2\"\"'=1,2\"");
+    const std::pair<const char*, const char*> cells[] = {
+        {"=1,2", "\"'=1,2\""},  {"+1", "'+1"}, {"-1", "'-1"}, {"@a", "'@a"},    {"\ta", "'\ta"},  {"\ra", "\"'\ra\""},
+        {"\na", "\"'\na\""},    {"'a", "''a"}, {"a=", "a="},  {" a", "\" a\""}, {"a ", "\"a \""}, {"", ""},
+        {"a\"b", "\"a\"\"b\""}, {"a'b", "a'b"}};
+    for (const auto& [text, expected] : cells) {
+        std::string defused;
+        AppendCsvCell(defused, text, true);
+        EXPECT_EQ(defused, expected);
+        std::string plain;
+        AppendCsvCell(plain, text, false);
+        const bool formula = *text != '\0' && strchr("=+-@\t\r\n'", *text) != nullptr;
+        EXPECT_EQ(plain.size(), defused.size() - (formula ? 1 : 0)) << text;
+    }
 }
 
 // 2026-03-30 00:30 local time, 2026-03-29 22:30 UTC

@@ -5,6 +5,7 @@
 #include "base/paths.h"
 #include "dbhandler.h"
 #include "dbhandler/session.h"
+#include "store/ask.h"
 #include "store/databasefile.h"
 #include "store/selection.h"
 #include "tools/quorlog/commands/commands.h"
@@ -49,12 +50,13 @@ int runCreate(const DbOptions& options) {
         throw Failure(db + " exists already; move it away or give another --db");
     }
     if (access(paths::kLogSchema, R_OK) != 0 || access(paths::kSqliteShell, X_OK) != 0) {
-        throw Failure(std::string("needs ") + paths::kLogSchema + " and " + paths::kSqliteShell + "; install them");
+        throw Failure(std::string("needs ") + paths::kLogSchema + " and " + paths::kSqliteShell + "; install them",
+                      store::Cause::Missing);
     }
     DbSession session(db, paths::kLogSchema);
     connect(session, db);
     if (session->DBcheckTableExist("logs") != 1) {
-        throw Failure("could not create the tables of " + db + "; see the system log");
+        throw Failure("could not create the tables of " + db + "; see the system log", store::Cause::Other);
     }
     WriteLine("created " + db);
     return kDone;
@@ -86,7 +88,9 @@ int runCheckpoint(const DbOptions& options) {
     DbSession session(db, paths::kLogSchema);
     connect(session, db);
     if (session->DBWalCheckpoint(false) != 0) {
-        throw Failure("cannot move the write-ahead log into " + db + "; try again when no other program is reading it");
+        (void)store::Ask(db, "SELECT 1 FROM sqlite_schema LIMIT 1", "1");
+        throw Failure("cannot move the write-ahead log into " + db + "; try again when no other program is reading it",
+                      store::Cause::Busy);
     }
     WriteLine("moved the write-ahead log into " + db);
     return kDone;

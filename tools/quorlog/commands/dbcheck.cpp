@@ -69,9 +69,10 @@ int runCheck(const CareOptions& options) {
 int runWal(const CareOptions& options) {
     const std::string db = store::RequireLogDatabase(options.db);
     RequirePlainPath(db, Quoting::None);
-    const bool ran = SyslogngWorkingDbSetJouWal(db) == 0;
-    if (!ran || store::Ask(db, "PRAGMA journal_mode", "journal_mode") != std::vector<std::string>{"wal"}) {
-        throw Failure("cannot switch " + db + " to a write-ahead log; try again when no program uses it");
+    (void)SyslogngWorkingDbSetJouWal(db);  // its result is the shell's; the mode tells
+    if (store::Ask(db, "PRAGMA journal_mode", "journal_mode") != std::vector<std::string>{"wal"}) {
+        throw Failure("cannot switch " + db + " to a write-ahead log; try again when no program is using it",
+                      store::Cause::Busy);
     }
     WriteLine(db + " now has a write-ahead log");
     return kDone;
@@ -90,7 +91,7 @@ int runLimit(const CareOptions& options) {
         return kNothing;
     }
     if (SyslogngWorkingDbCheck(db, static_cast<int>(options.kilobytes)) < 0) {
-        throw Failure("cannot remove " + db + "; see the system log");
+        throw Failure("cannot remove " + db + "; see the system log", store::Cause::Other);
     }
     WriteLine("removed " + db);
     return kDone;

@@ -59,7 +59,7 @@ int run(const SalvageOptions& options) {
         std::cerr << (result == 0 ? "\n" : "\r\x1b[K");
     }
     if (result != 0) {
-        throw Failure(report.error);
+        throw Failure(report.error, store::Cause::Other);
     }
     uint64_t rows = 0;
     const std::string tables = tablesOf(report, rows);

@@ -110,7 +110,7 @@ int runClear(const EventsOptions& options) {
     const int before = Logger().LogCount(db);
     Logger().LogClear(db, user);
     if (std::filesystem::exists(db) && Logger().LogCount(db) > 1 && Logger().LogCount(db) >= before) {
-        throw Failure("cannot clear " + db + "; make sure that you may write its folder");
+        throw Failure("cannot clear " + db + "; make sure that you may write its folder", store::Cause::Denied);
     }
     WriteLine("cleared " + db);
     return kDone;

@@ -24,7 +24,7 @@ std::vector<std::string> ruleNames() {
     StringList list(QLIBCSzListAlloc(16));
     std::vector<std::string> names;
     if (QLIBCFileExist(paths::kNotifyRules) == 1 && QLIBCFileEnumSection(paths::kNotifyRules, Adopt(list)) < 0) {
-        throw Failure("cannot read " + kFile + "; make sure that you may");
+        throw Failure("cannot read " + kFile + "; make sure that you may", store::Cause::Denied);
     }
     names.assign(list->items, list->items + list->count);
     return names;
@@ -143,7 +143,8 @@ int runSet(const SetOptions& options) {
     }
     apply(options, rule);
     if (SyslogNotifyConfSet(kFile, options.name, rule) < 0) {
-        throw Failure("cannot write " + kFile + "; make sure that its folder exists and that you may write it");
+        throw Failure("cannot write " + kFile + "; make sure that its folder exists and that you may write it",
+                      store::Cause::Denied);
     }
     WriteLine("set rule " + options.name + ": " + typeName(rule) + " " + threshold(rule) +
               (rule.notify_enable ? "" : ", disabled"));

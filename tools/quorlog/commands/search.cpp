@@ -85,7 +85,7 @@ class Ticker {
     bool wait() const {
         pollfd watched[] = {{signals_.get(), POLLIN, 0}, {STDOUT_FILENO, 0, 0}};
         if (poll(watched, 2, milliseconds_) > 0 && (watched[1].revents & POLLERR) != 0) {
-            throw Failure("cannot write the output: its reader has gone");
+            throw Failure("cannot write the output: its reader has gone", store::Cause::Other);
         }
         return watched[0].revents == 0;
     }
