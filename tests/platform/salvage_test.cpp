@@ -31,7 +31,7 @@ class Salvaging : public testing::TestWithParam<Case> {
                "'; PRAGMA secure_delete=OFF;" + kLogs +
                "WITH RECURSIVE n(i) AS (SELECT 1 UNION ALL SELECT i + 1 FROM n WHERE i < 12000) "
                "INSERT INTO logs(id, msg, host, utcsec, prog, extra) "
-               "SELECT i, hex(zeroblob(CASE WHEN i % 1000 THEN i % 240 ELSE 20000 END)) || i, 'host' || (i % 50), i * "
+               "SELECT i, hex(zeroblob(CASE WHEN i % 1000 THEN i % 240 ELSE 8190 END)) || i, 'host' || (i % 50), i * "
                "(1 + i % 3 * 3000000000), CASE WHEN i % 9 THEN 'prog' END, "
                "CASE i % 5 WHEN 0 THEN i / 3.0 WHEN 1 THEN zeroblob(i % 7) WHEN 2 THEN i % 3 WHEN 3 THEN -1 << i % 60 "
                "END FROM n;"
