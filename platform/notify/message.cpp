@@ -148,7 +148,7 @@ std::string NoticeAsJson(const Notice& notice) {
                        ",\"subject\":" + JsonString(notice.subject) + ",\"body\":" + JsonString(notice.body) +
                        ",\"suppressed\":" + std::to_string(notice.heldBack);
     if (!IsUtf8(notice.body)) {
-        json += ",\"bodyBase64\":\"" + base64(notice.body) + "\"";
+        json += R"(,"bodyBase64":)" + JsonString(base64(notice.body));
     }
     return json + "}";
 }

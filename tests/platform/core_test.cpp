@@ -19,6 +19,7 @@ constexpr char kLine[] = "%s=\"%s\"\n";
 constexpr pid_t kGone = 4712;
 pid_t hungUp = 0;
 
+// The system's own parameters have reserved names. NOLINTNEXTLINE(readability-inconsistent-declaration-parameter-name)
 extern "C" __attribute__((visibility("default"))) int kill(pid_t process, int number) noexcept {
     hungUp = number == SIGHUP && process != kGone ? process : 0;
     return process != kGone ? 0 : -1;
