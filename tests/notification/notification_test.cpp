@@ -110,8 +110,7 @@ TEST(IsNotificationSet, AsksEveryChannelUntilOneCannotBeRead) {
         {"no yes", "a@b", 1, "0 utils:196 Fail to get msn setting"},
         {"no yes yes", "a@b", 1, "0 utils:204 Fail to get skype setting"},
         {"yes yes yes yes", nullptr, 1, "0 utils:161 Fail to get mail setting"},
-        {"no yes yes yes", "a@b", -1, "0 utils:178 Fail to get sms setting"},
-    };
+        {"no yes yes yes", "a@b", -1, "0 utils:178 Fail to get sms setting"}};
     Notices& service = FakeNotices();
     for (const auto& [switches, recipient, sms, answer] : cases) {
         std::istringstream words(switches);
@@ -190,9 +189,12 @@ TEST_F(Senders, FillThePlaceholdersAndReportWhatFails) {
 TEST_F(Senders, RefuseNull) {
     QLIBSZHASH* table = nullptr;
     char tag[] = "tag";
-    EXPECT_EQ(manager_.NotificationSend(nullptr, &table) + manager_.NotificationSend(tag, nullptr), -2);
-    EXPECT_EQ(SyslogMailSend(nullptr, &table) + SyslogMailSend(tag, nullptr) + SyslogMailShareRename(nullptr), -3);
-    EXPECT_EQ(SyslogMailSeverityExceeded(nullptr, "") + SyslogMailKeywordMatched("", nullptr), -2);
+    for (const int result :
+         {manager_.NotificationSend(nullptr, &table), manager_.NotificationSend(tag, nullptr),
+          SyslogMailSend(nullptr, &table), SyslogMailSend(tag, nullptr), SyslogMailShareRename(nullptr),
+          SyslogMailSeverityExceeded(nullptr, ""), SyslogMailKeywordMatched("", nullptr)}) {
+        EXPECT_EQ(result, -1);
+    }
     EXPECT_TRUE(FakeNotices().sent.empty());
 }
 
