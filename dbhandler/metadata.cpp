@@ -1,9 +1,7 @@
 #include <syslog.h>
 
-#include <array>
-#include <ctime>
-
 #include "common.h"
+#include "common/localtime.h"
 #include "dbhandler.h"
 #include "dbhandler/readers.h"
 #include "dbhandler/shell.h"
@@ -11,22 +9,11 @@
 
 namespace {
 
-// Local date "YYYY-MM-DD" of the low 32 bits of a time.
-std::string localDate(long long seconds) {
-    const auto time = static_cast<time_t>(static_cast<int32_t>(seconds));
-    std::array<char, 1024> text{};
-    const tm* local = localtime(&time);
-    if (local != nullptr) {
-        (void)strftime(text.data(), text.size(), "%Y-%m-%d", local);  // always fits
-    }
-    return text.data();
-}
-
 std::string dateOrReport(long long seconds, const char* unknown) {
     if (seconds == 0) {
         Debuger::MSG(0, unknown);
     }
-    return localDate(seconds);
+    return quor::LocalTimeText(seconds, "%Y-%m-%d");
 }
 
 }  // namespace

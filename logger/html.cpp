@@ -1,10 +1,9 @@
 #include <unistd.h>
 
-#include <array>
 #include <cstdio>
-#include <ctime>
 
-#include "common/handles.h"
+#include "base/guards.h"
+#include "common/localtime.h"
 #include "logger.h"
 
 namespace {
@@ -20,26 +19,13 @@ constexpr char kHead[] = "<html><head>\n"
                          "<th>Type</th><th>Time</th><th>User</th><th>Event</th>"
                          "</tr>\n";
 
-using Text = std::array<char, 1024>;
-
-// Local time of the low 32 bits.
-Text timeText(int64_t seconds) {
-    const time_t when = static_cast<int32_t>(seconds);
-    Text text{};
-    if (const tm* local = localtime(&when)) {
-        (void)strftime(text.data(), text.size(), "%Y-%m-%dT%H:%M:%S", local);
-    }
-    return text;
-}
-
 // Texts go out as they are: the page shows whatever markup an event holds.
 void writeRow(FILE* page, const _SSYSLOG_LOG_LOG_tag& event) {
-    Text level{};
-    (void)szLevelGet(event.level, level.data(), static_cast<int>(level.size()));
+    const std::string time = quor::LocalTimeText(event.time, "%Y-%m-%dT%H:%M:%S");
     (void)fprintf(page,
                   "<tr>\n<td align=\"center\">%s</td>\n<td align=\"center\">%s</td><td align=\"center\">%s</td>"
                   "<td align=\"left\">%s</td></tr>\n",
-                  level.data(), timeText(event.time).data(), event.user.c_str(), event.event.c_str());
+                  strLevelGet(event.level).c_str(), time.c_str(), event.user.c_str(), event.event.c_str());
 }
 
 }  // namespace
