@@ -263,44 +263,43 @@ using Counts = std::map<std::string, unsigned long long>;
 Conditions none;
 std::string host = "host";
 
-long long valuesOf(std::string& db) {
+std::string valuesOf(std::string& db) {
     Values values;
-    return SyslogDBAttriValueGet(db, host, nullptr, values);
+    return std::to_string(SyslogDBAttriValueGet(db, host, nullptr, values));
 }
 
-long long namesOf(std::string& db) {
+std::string namesOf(std::string& db) {
     Names names;
-    return SyslogDBExtkeyMapGet(db, SYSLOG_EXTKEY_HOST, names);
+    return std::to_string(SyslogDBExtkeyMapGet(db, SYSLOG_EXTKEY_HOST, names));
 }
 
 TEST_F(Statistics, AndSelectionsAnswerNothingWithoutAReadableDatabase) {
     run("CREATE TABLE logs (host); INSERT INTO logs VALUES ('a');"
         "INSERT INTO histogram VALUES (1, 'a', 1); INSERT INTO eps VALUES (1, 1, 'a', 1)");
     // The line in messages, what is answered and the question.
-    const std::tuple<int, long long, long long (*)(std::string&)> cases[] = {
-        {464, -1,
-         [](auto& db) -> long long { return SyslogDBSelect(db, none, nullptr, nullptr, nullptr, nullptr, false); }},
-        {573, -1, [](auto& db) -> long long { return SyslogDBSelectCount(db, none, nullptr, nullptr); }},
-        {697, -1, valuesOf},
-        {887, -1, namesOf},
-        {982, 0, [](auto& db) -> long long { return SyslogDBEpsGet(db, 0, 9).size(); }},
-        {1051, 0, [](auto& db) -> long long { return SyslogDBHistTotalGet(db); }},
-        {1092, 0, [](auto& db) -> long long { return SyslogDBHistGetSingle(db, "a"); }},
-        {1134, 0, [](auto& db) -> long long { return SyslogDBHistGet(db, 0).size(); }},
-        {653, -1, [](auto& db) -> long long { return SyslogDBDelete(db, none); }},
+    const std::tuple<int, std::string, std::string (*)(std::string&)> cases[] = {
+        {464, "-1",
+         [](auto& db) { return std::to_string(SyslogDBSelect(db, none, nullptr, nullptr, nullptr, nullptr, false)); }},
+        {573, "-1", [](auto& db) { return std::to_string(SyslogDBSelectCount(db, none, nullptr, nullptr)); }},
+        {697, "-1", valuesOf},
+        {887, "-1", namesOf},
+        {982, "0", [](auto& db) { return std::to_string(SyslogDBEpsGet(db, 0, 9).size()); }},
+        {1051, "0", [](auto& db) { return std::to_string(SyslogDBHistTotalGet(db)); }},
+        {1092, "0", [](auto& db) { return std::to_string(SyslogDBHistGetSingle(db, "a")); }},
+        {1134, "0", [](auto& db) { return std::to_string(SyslogDBHistGet(db, 0).size()); }},
+        {653, "-1", [](auto& db) { return std::to_string(SyslogDBDelete(db, none)); }},
     };
     std::string relative = "log.db";
     std::string missing = folder_.path("none.db");
     for (const auto& [line, answer, question] : cases) {
-        EXPECT_EQ(Said(question(relative)),
-                  std::to_string(answer) + " dbutil:" + std::to_string(line) + " Invalid syslog db path!");
+        EXPECT_EQ(Said(question(relative)), answer + " dbutil:" + std::to_string(line) + " Invalid syslog db path!");
         EXPECT_EQ(question(missing), answer) << line;
         SpyOnDb().failing = "FROM";
         EXPECT_EQ(question(path_), answer) << line;
         SpyOnDb() = {};
         EXPECT_NE(question(path_), answer) << line;
         SpyOnDb().rowsLeft = 0;
-        EXPECT_EQ(question(path_), line == 653 ? 0 : answer) << line;
+        EXPECT_EQ(question(path_), line == 653 ? "0" : answer) << line;
         SpyOnDb() = {};
     }
     EXPECT_FALSE(std::filesystem::exists(missing));
@@ -362,7 +361,7 @@ TEST_F(Statistics, NamesOfBothLayouts) {
     ASSERT_EQ(get(path_, SYSLOG_EXTKEY_FAC), 0);
     EXPECT_EQ(names, (Names{{0, ""}, {2, "mail"}, {4294967299, "kern"}}));
     EXPECT_EQ(SyslogDBExtkeyLookupByName(path_, SYSLOG_EXTKEY_FAC, "kern"), 4294967299U);
-    EXPECT_EQ(Said(SyslogDBExtkeyLookupByName(path_, SYSLOG_EXTKEY_HOST, "b")),
+    EXPECT_EQ(Said(std::to_string(SyslogDBExtkeyLookupByName(path_, SYSLOG_EXTKEY_HOST, "b"))),
               "0 dbutil:956 Fail to get foreign key map");
     EXPECT_EQ(std::exchange(SpyOnDb().statements, {}).back(), "SELECT * FROM hosts");
     for (const auto& [type, table] : {std::pair(SYSLOG_EXTKEY_PROG, "prog"), {SYSLOG_EXTKEY_TAG, "tag"}}) {
