@@ -13,7 +13,7 @@ namespace quor::store {
 
 using Conditions = std::list<_SYSLOG_SQL_COND_tag>;
 
-// As a person gives them; an empty one leaves that filter out. Lists are separated by commas.
+// As a person gives them; the empty text leaves a filter out. The names of a list are separated by commas.
 struct FilterOptions {
     std::string host;
     std::string level;
@@ -27,8 +27,8 @@ struct FilterOptions {
 
 struct Filter {
     Conditions conditions;
-    // The conditions take "*" and "?" of a keyword for any one character, because a pattern cannot quote them. A
-    // message counts only when it contains this text; empty when the conditions are exact.
+    // What a message must contain besides meeting the conditions, or empty when those are exact. A pattern cannot quote
+    // "*" and "?": the conditions take them for any one character.
     std::string literal;
 
     bool accepts(const _SYSLOG_LOG_DATA_tag& record) const;
@@ -38,11 +38,12 @@ struct Filter {
 // Failures name the filters as options of a command line.
 Filter BuildFilter(const FilterOptions& options, const std::string& table, time_t now);
 
-// Each filter that can be told apart cheaply, alone, with the words for "no row ...".
+// One of several filters by itself, and what follows "no row" when nothing meets it.
 struct Probe {
     std::string words;
     Conditions conditions;
 };
+// Of the filters that were given, those whose columns are cheap to look at: not the keyword and the pattern.
 std::vector<Probe> BuildProbes(const FilterOptions& options, const std::string& table, time_t now);
 
 // A condition on the id; `op` is one of SYSLOG_OP_....

@@ -48,18 +48,18 @@ class Tally {
     uint64_t taken_ = 0;
 };
 
-// The ids that are still to be looked at, taken off from one end or the other.
+// The ids that are still to be looked at; the walk goes from one end to the other.
 class Remainder {
   public:
     Remainder(const Span& all, bool fromBelow) : left_(all), fromBelow_(fromBelow) {}
 
-    // At most `width` ids of the end where the walk is.
+    // The next ids, at most `width` of them.
     Span next(uint64_t width) const {
         const uint64_t reach = std::min(width - 1, left_.last - left_.first);
         return fromBelow_ ? Span{left_.first, left_.first + reach} : Span{left_.last - reach, left_.last};
     }
-    // Everything up to and with `id` is done; false when nothing is left.
-    bool done(uint64_t id) {
+    // Drops everything up to and including `id`; false when nothing is left.
+    bool drop(uint64_t id) {
         if (id == (fromBelow_ ? left_.last : left_.first)) {
             return false;
         }
@@ -90,7 +90,7 @@ uint64_t selectInPieces(const Source& source, const Selection& selection, const 
         const uint64_t rows = source.read(selection.table, within(selection.filter.conditions, span), {kPiece, 0},
                                           selection.oldestFirst, take);
         const uint64_t end = selection.oldestFirst ? span.last : span.first;
-        more = remainder.done(rows == kPiece ? reached : end);
+        more = remainder.drop(rows == kPiece ? reached : end);
         width = rows < kPiece / 4 ? std::min(width * 2, kMaxSpan) : kPiece;
     }
     return tally.taken();

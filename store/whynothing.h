@@ -1,4 +1,4 @@
-// Which part of a question left nothing.
+// Why a question has no answer.
 #ifndef STORE_WHYNOTHING_H
 #define STORE_WHYNOTHING_H
 
@@ -8,7 +8,7 @@
 
 namespace quor::store {
 
-// The reason in words, as far as it can be told without reading every message. `options` are what the selection's
+// The reason in words, as far as it shows without reading every message. `options` are what the selection's
 // filter was built from; `below` is the id that rows had to stay below, or 0.
 std::string WhyNothing(const Source& source, const Selection& selection, const FilterOptions& options, uint64_t below);
 

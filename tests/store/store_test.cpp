@@ -161,6 +161,7 @@ TEST_F(Store, EveryRowOfALargeTableComesInOrder) {
     std::reverse(all.begin(), all.end());
     EXPECT_EQ(select({}), all);
     EXPECT_EQ(select({"logs", {{}, "m?"}, 9000, 100}), Ids(all.begin() + 100, all.begin() + 9100));
+    EXPECT_EQ(select({"logs", {{}, "m?"}, 1, 3}), Ids{all[3]});
     FilterOptions rare;
     rare.host = "rare";
     rare.keyword = "m?";
@@ -172,7 +173,7 @@ TEST_F(Store, AFollowerSeesWhatArrivesAndWhatReplacesIt) {
     wanted.host = "a";
     run("INSERT INTO logs(host) VALUES('a'), ('b'), ('a'), ('a')");
     const auto source = OpenSource(path_);
-    Follower follower(*source, {"logs", BuildFilter(wanted, "logs", 0)});
+    Follower follower(*source, {"logs", BuildFilter(wanted, "logs", 0), 1, 7, true});
     run("INSERT INTO logs(host) VALUES('a'), ('b')");
     for (const auto& [rows, expected] : std::map<uint64_t, Ids>{{0, {1, 3, 4}}, {2, {3, 4}}}) {
         Ids ids;
