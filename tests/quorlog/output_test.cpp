@@ -99,9 +99,11 @@ TEST(Text, IsShownAndEncodedWithoutAnythingRaw) {
 
 TEST(Text, CsvCellsAreQuotedAndFormulasDefused) {
     const std::pair<const char*, const char*> cells[] = {
-        {"=1,2", "\"'=1,2\""},  {"+1", "'+1"}, {"-1", "'-1"}, {"@a", "'@a"},    {"\ta", "'\ta"},  {"\ra", "\"'\ra\""},
-        {"\na", "\"'\na\""},    {"'a", "''a"}, {"a=", "a="},  {" a", "\" a\""}, {"a ", "\"a \""}, {"", ""},
-        {"a\"b", "\"a\"\"b\""}, {"a'b", "a'b"}};
+        {"=1,2", R"("'=1,2")"},  {"+1", "'+1"},     {"-1", "'-1"},
+        {"@a", "'@a"},           {"\ta", "'\ta"},   {"\ra", "\"'\ra\""},
+        {"\na", "\"'\na\""},     {"'a", "''a"},     {"a=", "a="},
+        {" a", R"(" a")"},       {"a ", R"("a ")"}, {"", ""},
+        {R"(a"b)", R"("a""b")"}, {"a'b", "a'b"}};
     for (const auto& [text, expected] : cells) {
         std::string defused;
         AppendCsvCell(defused, text, true);
