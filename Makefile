@@ -64,7 +64,7 @@ fuzz:           ## every fuzz target on its corpus and on new inputs, for FUZZ_S
 	scripts/build.sh fuzz
 	scripts/fuzz.sh $(BUILD)/fuzz $(FUZZ_SECONDS) $(FUZZ_SEED)
 
-soak:           ## the real syslog-ng beside searchers, a deleter and a checkpointer, for ten minutes
+soak:           ## the real syslog-ng beside searchers, a deleter, a checkpointer, bursts and kills of quorlogd, for ten minutes
 	scripts/install-deps.sh build run bench
 	scripts/build.sh bench
 	scripts/soak-database.sh $(BUILD)/bench

@@ -1,5 +1,6 @@
 #!/bin/sh
-# Installs the packages in a clean Debian, receives and finds a log, removes and purges them, and looks for what is left.
+# Installs the packages in a clean Debian over what a former version left, counts on from there, removes and purges them,
+# and looks for what is left.
 # Needs root. Usage: try-packages.sh FOLDER_OF_PACKAGES NEW_FOLDER_FOR_THE_ROOT
 set -eu
 packages=$1
@@ -21,12 +22,36 @@ rm -rf "$root"
 debootstrap --variant=minbase "$suite" "$root" "$mirror" > "$packages/debootstrap.log" ||
     fail "debootstrap failed; see $packages/debootstrap.log"
 mount -t proc proc "$root/proc" 2> /dev/null || true
-trap 'umount "$root/proc" 2> /dev/null || true' EXIT
+finish() {
+    for name in syslog-ng quorlogd; do inside invoke-rc.d "$name" stop > /dev/null 2>&1 || true; done
+    umount "$root/proc" 2> /dev/null || true
+}
+trap finish EXIT
 inside apt-get update -qq
 inside apt-get install -y -qq --no-install-recommends syslog-ng-core syslog-ng-mod-sql libdbd-sqlite3 sqlite3 \
     libjsoncpp25 libcurl4 g++ pkg-config > "$packages/install.log" 2>&1
 listing > "$packages/before.txt"
 
+# A former version: quorlogd was started by syslog-ng, with options, and a port of the site's own; three rows are counted.
+former=$root/tmp/former
+mkdir -p "$former/DEBIAN" "$former/etc/quorsyslog" "$former/var/log/quorlog" "$former/usr/bin"
+printf '@define quor_address "0.0.0.0"\n@define quor_port "514"\n@define quor_database "/var/log/quorlog/syslog.db"\n%s\n' \
+    '@define quor_receiver "/usr/bin/quorlogd --max-line 9000 --check-interval 300"' > "$former/etc/quorsyslog/syslog-ng.conf"
+echo /etc/quorsyslog/syslog-ng.conf > "$former/DEBIAN/conffiles"
+printf 'Package: quorsyslog\nVersion: 0.1\nArchitecture: %s\nMaintainer: none\nDescription: former\n' "$arch" \
+    > "$former/DEBIAN/control"
+chmod 0750 "$former/var/log/quorlog"
+dpkg-deb --root-owner-group --build "$former" "$former.deb" > /dev/null
+inside dpkg -i /tmp/former.deb >> "$packages/install.log"
+sed -i 's/"514"/"5514"/' "$root/etc/quorsyslog/syslog-ng.conf"
+inside sqlite3 /var/log/quorlog/syslog.db "CREATE TABLE logs (id INTEGER PRIMARY KEY AUTOINCREMENT, msg TEXT, prio TEXT,
+    llevel TEXT GENERATED ALWAYS AS (prio) VIRTUAL, ldate TEXT, host TEXT, prog TEXT, fac TEXT, ltime TEXT, ip TEXT,
+    tag TEXT, utcsec INTEGER, tzoffset TEXT); INSERT INTO logs (host, utcsec) VALUES ('nas', 1), ('nas', 1), ('nas', 1)"
+inside sqlite3 /var/log/quorlog/.QUORACCOUNTDB "CREATE TABLE eps (id INTEGER PRIMARY KEY, stamp INTEGER, device TEXT,
+    eps INTEGER); CREATE TABLE histogram (id INTEGER PRIMARY KEY, device TEXT UNIQUE, count INTEGER);
+    INSERT INTO histogram (device, count) VALUES ('nas', 3)"
+
+rm -rf "$former" "$former.deb"
 cp "$packages"/*_"$arch".deb "$root/tmp/"
 inside sh -c 'apt-get install -y -qq --no-install-recommends /tmp/*.deb' >> "$packages/install.log" 2>&1 ||
     fail "the packages do not install; see $packages/install.log"
@@ -34,14 +59,21 @@ inside sh -c 'apt-get install -y -qq --no-install-recommends /tmp/*.deb' >> "$pa
 echo "== runs"
 inside quorlogd --version
 inside syslog-ng --syntax-only --no-caps || fail "syslog-ng refuses its configuration"
-inside sh -c 'printf "user err 2026-01-02 10:00:00 1 1 +00:00 nas 10.0.0.1 app t hello\n" | quorlogd'
-inside quorlog stats total | grep -q 1 || fail "the log was not counted"
+for value in '@define quor_port "5514"' 'QUORLOGD_OPTIONS="--check-interval 300"'; do
+    inside grep -qxF "$value" /etc/quorsyslog/receiving.conf /etc/default/quorlogd || fail "not carried on: $value"
+done
+inside pidof -c quorlogd > /dev/null || fail "quorlogd does not run"
+inside sqlite3 /var/log/quorlog/syslog.db "INSERT INTO logs (host, utcsec) VALUES ('nas', 1), ('switch', 1)"
+inside invoke-rc.d quorlogd stop
+[ "$(inside quorlog stats total --format csv | tail -n 1 | tr -d '\r')" = 5 ] || fail "the rows were not counted once"
+! inside find /var/log/quorlog /usr/quor/etc -type f -perm /007 | grep . || fail "everybody may read logs"
 inside quorlog events list | grep -qi start || fail "the start was not recorded"
 printf '#include <quorsyslog/common.h>\nint main() { return ullNumberToString(7) != "7"; }\n' > "$root/tmp/user.cpp"
 inside sh -c 'cd /tmp && g++ user.cpp $(pkg-config --cflags --libs quorsyslog) -o user && ./user' ||
     fail "a program of a user does not build"
 
 echo "== goes"
+echo smtp_password=x > "$root/etc/quorinfo.conf"
 inside apt-get remove -y -qq quorsyslog libquorsyslog-dev libquorsyslog1 >> "$packages/install.log" 2>&1
 inside syslog-ng --syntax-only --no-caps || fail "syslog-ng refuses its configuration after the removal"
 inside dpkg --purge quorsyslog libquorsyslog-dev libquorsyslog1 >> "$packages/install.log" 2>&1
