@@ -1,5 +1,5 @@
-"""Sends numbered lines over TCP and prints how many were sent. A connection that breaks is made again; what was handed to
-the broken one is not repeated.
+"""Sends numbered lines over TCP and prints how many were sent. A connection that was closed is made again; what was handed
+to it is not repeated.
 Usage: send-numbered.py PORT NAME LINES [CONNECTIONS [LINES_A_SECOND]]   (0: as fast as they are taken)"""
 import socket
 import sys
@@ -25,6 +25,15 @@ def connect():
             time.sleep(0.02)
 
 
+def is_closed(connection):
+    try:
+        return connection.recv(1, socket.MSG_DONTWAIT) == b""
+    except BlockingIOError:
+        return False
+    except OSError:
+        return True
+
+
 def send(first, end):
     pieces = [text(i, min(i + PIECE, end)) for i in range(first, end, PIECE)]
     connection = connect()
@@ -32,11 +41,13 @@ def send(first, end):
     for number, piece in enumerate(pieces):
         if rate:
             time.sleep(max(0, begin + number * PIECE * connections / rate - time.monotonic()))
+        if is_closed(connection):
+            connection.close()
+            connection = connect()
         try:
             connection.sendall(piece)
         except OSError:
-            connection.close()
-            connection = connect()
+            pass  # noticed before the next piece
     connection.close()
 
 

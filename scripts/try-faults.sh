@@ -2,6 +2,7 @@
 # The receiving chain under bursts, locks, kills and restarts. After each trial every stored row must be counted once; what
 # was lost on the way to the database, or stored twice, is told.
 # Usage: try-faults.sh BUILD_FOLDER [KILLS [LOCK_SECONDS [BURST]]]     KEEP=1: leave the data for a look
+# ONLY="NAME..." runs those trials alone.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 . scripts/receive.sh
@@ -68,7 +69,7 @@ report() {
 all_there() { [ "$(of_trial 'count(*)')" -ge "$burst" ]; }
 try_burst() { # CONNECTIONS
     local begin used_before taken stored
-    trial=burst-$1 begin=$(now) used_before=$(($(used "$syslog_ng") + $(used "$quorlogd")))
+    begin=$(now) used_before=$(($(used "$syslog_ng") + $(used "$quorlogd")))
     send "$burst" "$1"
     taken=$((($(now) - begin) / 1000000))
     await "the arrival of $trial" all_there
@@ -78,7 +79,6 @@ try_burst() { # CONNECTIONS
 }
 
 try_lock() {
-    trial=lock-${lock_seconds}s
     send $((2000 * (lock_seconds + 4))) 1 2000 &
     sleep 1
     python3 -c 'import sqlite3, sys, time
@@ -89,11 +89,10 @@ time.sleep(float(sys.argv[2]))' "$db" "$lock_seconds"
     report "2,000 a second"
 }
 
-# try_ends NAME SIGNAL WHAT...: ends processes again and again while messages arrive, and starts them anew.
+# try_ends SIGNAL PROCESS: ends it (or both) again and again while messages arrive, and starts it anew.
 try_ends() {
-    local signal=$2 process=$3
-    trial=$1
-    send $((kills * 8000)) 4 6000 &
+    local signal=$1 process=$2
+    send $((kills * 1500)) 4 2000 &
     for _ in $(seq "$kills"); do
         shortly
         [ "$process" = quorlogd ] || { end "$signal" "$syslog_ng" && start; }
@@ -104,7 +103,6 @@ try_ends() {
 }
 
 try_unreadable_counts() {
-    trial=unreadable
     end TERM "$quorlogd"
     mv "$accounting" "$run/counts"
     mkdir "$accounting"
@@ -118,21 +116,28 @@ try_unreadable_counts() {
     report "counts unreadable at the start, then put back"
 }
 
+# try NAME COMMAND...
+try() {
+    trial=$1
+    shift
+    [[ " ${ONLY:-$trial} " != *" $trial "* ]] || "$@"
+}
+
 rm -rf "$root/var/log/quorlog" "$root/etc/quorsyslog" "$root/usr/quor/etc" "$root/run"
 mkdir -p "$root/var/log/quorlog" "$root/etc/quorsyslog" "$root/usr/quor/etc"
 start
 follow
 printf '%-16s %9s %9s %7s %7s %9s\n' trial sent stored lost twice counted
 lossless=yes
-for connections in 1 10 200; do try_burst $connections; done
-try_lock
-try_ends kill-quorlogd KILL quorlogd
-try_ends stop-quorlogd TERM quorlogd
-try_unreadable_counts
+for connections in 1 10 200; do try "burst-$connections" try_burst $connections; done
+try "lock-${lock_seconds}s" try_lock
+try kill-quorlogd try_ends KILL quorlogd
+try stop-quorlogd try_ends TERM quorlogd
+try unreadable try_unreadable_counts
 lossless=
-try_ends kill-syslog-ng KILL syslog-ng
-try_ends kill-both KILL both
-try_ends stop-syslog-ng TERM syslog-ng
+try kill-syslog-ng try_ends KILL syslog-ng
+try kill-both try_ends KILL both
+try stop-syslog-ng try_ends TERM syslog-ng
 [ "$(ask "$db" 'PRAGMA integrity_check')" = ok ] || fail "the log database is damaged"
 echo "$(rows) rows, $(total) counted, $(samples) in the samples of the rate"
 [ "$status" = 0 ] || fail "messages were lost, stored twice or not counted where that must not happen"

@@ -32,6 +32,8 @@ inside apt-get install -y -qq --no-install-recommends syslog-ng-core syslog-ng-m
     libjsoncpp25 libcurl4 g++ pkg-config > "$packages/install.log" 2>&1
 listing > "$packages/before.txt"
 
+printf '#!/bin/sh\nexit 0\n' > "$root/usr/sbin/policy-rc.d" # services start in this chroot too
+chmod +x "$root/usr/sbin/policy-rc.d"
 # A former version: quorlogd was started by syslog-ng, with options, and a port of the site's own; three rows are counted.
 former=$root/tmp/former
 mkdir -p "$former/DEBIAN" "$former/etc/quorsyslog" "$former/var/log/quorlog" "$former/usr/bin"
@@ -77,6 +79,7 @@ echo smtp_password=x > "$root/etc/quorinfo.conf"
 inside apt-get remove -y -qq quorsyslog libquorsyslog-dev libquorsyslog1 >> "$packages/install.log" 2>&1
 inside syslog-ng --syntax-only --no-caps || fail "syslog-ng refuses its configuration after the removal"
 inside dpkg --purge quorsyslog libquorsyslog-dev libquorsyslog1 >> "$packages/install.log" 2>&1
+rm "$root/usr/sbin/policy-rc.d"
 listing > "$packages/after.txt"
 echo "== left behind"
 diff "$packages/before.txt" "$packages/after.txt" | grep '^[<>]' | tee "$packages/left.txt" || true
