@@ -3,7 +3,7 @@ BUILD := build
 FUZZ_SECONDS := 60
 FUZZ_SEED := 0
 
-.PHONY: run test bench check format tidy asan fuzz soak try-full-disk powerpc package try-package linking docs release install clean
+.PHONY: run test bench check format tidy asan fuzz soak try-faults try-full-disk powerpc package try-package linking docs release install clean
 
 run:            ## start the real receiving chain on loopback and show what it received
 	scripts/install-deps.sh build run
@@ -68,6 +68,11 @@ soak:           ## the real syslog-ng beside searchers, a deleter, a checkpointe
 	scripts/install-deps.sh build run bench
 	scripts/build.sh bench
 	scripts/soak-database.sh $(BUILD)/bench
+
+try-faults:     ## the receiving chain under bursts, locks, kills and restarts: sent, stored and counted must be equal
+	scripts/install-deps.sh build run
+	scripts/build.sh run
+	scripts/try-faults.sh $(BUILD)/run
 
 try-full-disk:  ## the receiving chain on a small disk that fills up and is freed again (root)
 	scripts/install-deps.sh build run
