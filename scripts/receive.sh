@@ -42,6 +42,7 @@ start_quorlogd() {
     mkdir -p "$1/root/run"
     "$1/tools/quorlogd/quorlogd" --db "$2" --stderr >> "$1/root/run/quorlogd.log" 2>&1 &
     quorlogd=$!
+    await "the start of quorlogd" grep -q "^quorlogd\[$quorlogd\]: Started" "$1/root/run/quorlogd.log"
 }
 
 # end SIGNAL PROCESS...: and waits for it.

@@ -33,6 +33,7 @@ trap finish EXIT
 
 ask() { sqlite3 -readonly "$1" '.timeout 5000' "$2" 2> /dev/null; }
 send() { python3 scripts/send-numbered.py "$port" "$@" >> "$folder/sent"; }
+has_rows() { [ "$(ask "$db" 'SELECT max(id) > 0 FROM logs')" = 1 ]; }
 sent() { awk '{ sum += $1 } END { print sum + 0 }' "$folder/sent"; }
 all_stored() { [ "$(ask "$db" 'SELECT max(id) FROM logs')" -ge "$(sent)" ]; }
 counted() { ask "$accounting" 'SELECT sum(count) FROM histogram'; }
@@ -41,7 +42,7 @@ all_counted() {
     [ "$(counted)" = "$(ask "$db" 'SELECT max(id) FROM logs')" ]
 }
 keep_following() {
-    while sleep $((RANDOM % 8 + 2)); do
+    while sleep $((RANDOM % 12 + 8)); do
         end KILL "$quorlogd"
         start_quorlogd "$build" "$db"
     done
@@ -55,7 +56,7 @@ keep_following &
 disturber=$!
 send steady $((seconds * 1000)) 1 1000 &
 steady=$!
-await "the first message" [ -s "$db" ]
+await "the first message" has_rows
 for ((i = 0; i < seconds / 20; i++)); do
     sleep 20
     send "burst-$i" "$burst" 10
