@@ -7,6 +7,7 @@
 
 #include <csignal>
 #include <stdexcept>
+#include <utility>
 
 #include "logger.h"
 
@@ -18,8 +19,9 @@ using std::chrono::seconds;
 constexpr seconds kRetryFlush{60};  // each failed one may have waited for a lock, with input waiting meanwhile
 constexpr char kEventText[] = "quorlogd " QUORLOGD_VERSION;
 
-// A descriptor that reads the signals; nothing runs in a handler.
-Descriptor openSignals() {
+}  // namespace
+
+Descriptor OpenSignals() {
     (void)signal(SIGPIPE, SIG_IGN);
     (void)signal(SIGXFSZ, SIG_IGN);  // a full database is not the end
     sigset_t answered;
@@ -35,10 +37,8 @@ Descriptor openSignals() {
     return descriptor;
 }
 
-}  // namespace
-
-Daemon::Daemon(const Options& options)
-    : options_(options), signals_(openSignals()), watch_(options.db), receiver_(options), housekeeping_(options) {
+Daemon::Daemon(const Options& options, Descriptor signals)
+    : options_(options), signals_(std::move(signals)), watch_(options.db), receiver_(options), housekeeping_(options) {
     nextTick_ = nextCheck_ = Clock::now();
     nextFlush_ = nextTick_ + seconds(options.flushSeconds);
 }

@@ -12,10 +12,15 @@
 
 namespace quor {
 
+// Blocks the signals that the process answers, and reads them instead: nothing runs in a handler. To be called before
+// anything that takes time, since a signal before it ends the process. Throws std::runtime_error when that cannot be
+// done.
+Descriptor OpenSignals();
+
 class Daemon {
   public:
-    // Blocks the signals that it answers.
-    explicit Daemon(const Options& options);
+    // `signals` is what OpenSignals() gave.
+    Daemon(const Options& options, Descriptor signals);
     Daemon(const Daemon&) = delete;
     Daemon& operator=(const Daemon&) = delete;
 

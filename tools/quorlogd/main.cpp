@@ -1,3 +1,4 @@
+#include <sys/stat.h>
 #include <syslog.h>
 
 #include <CLI/CLI.hpp>
@@ -57,9 +58,11 @@ int run(int argc, char** argv) {
         return app.exit(error) == 0 ? 0 : 2;
     }
     openlog("quorlogd", LOG_PID | (options.toStandardError ? LOG_PERROR : 0), LOG_DAEMON);
+    quor::Descriptor signals = quor::OpenSignals();
+    (void)umask(027);  // what is written holds log content
     const quor::PidFile only(quor::paths::kReceiverPid);
     quor::PrepareDatabases();
-    return quor::Daemon(options).run();
+    return quor::Daemon(options, std::move(signals)).run();
 }
 
 }  // namespace
