@@ -188,6 +188,7 @@ TEST_F(Database, AnySizeOfResultIsReadBackWhole) {
         const char* text = QUORDBFetchField(result_.get(), i, "text");
         ASSERT_EQ(strlen(text), lengthOf(i));
         ASSERT_EQ(atoi(text + lengthOf(i) - 9), static_cast<int>(i));
+        ASSERT_EQ(atoi(QUORDBFetchField(result_.get(), i, "i")), static_cast<int>(i));
         if (const unsigned int other = i * 7919 % kRows; i % 64 < 2) {
             ASSERT_EQ(field(other, "i"), std::to_string(other));
         }

@@ -103,10 +103,11 @@ TEST_P(Salvaging, KeepsTheRowsOfEveryUndamagedPageAndNoOther) {
     db.run("ATTACH '" + path_ + "' AS whole");
     const uint64_t saved = std::stoull(db.query("SELECT count(*) FROM logs").at(0));
     const bool whole = GetParam().damage == Damage::None && report.schemaRead != 0;
-    EXPECT_GE(saved, whole ? expected : expected * 99 / 100);
+    const bool pointer = GetParam().damage == Damage::Pointer;
+    const bool pagesLost = lost_ != "0" && GetParam().damage != Damage::FirstPage;  // some of them of long rows
+    EXPECT_GE(saved, pagesLost ? expected * 99 / 100 : expected - (pointer ? 1 : 0));
     EXPECT_STREQ(report.error, "");
     EXPECT_GE(report.tables[0].rows, saved);
-    const bool pointer = GetParam().damage == Damage::Pointer;
     EXPECT_EQ(report.badPages == 0, whole || pointer || GetParam().damage == Damage::Header);
     EXPECT_TRUE(!pointer || report.badRows == 1);
     EXPECT_TRUE(!whole || report.badRows + report.strayRows + report.duplicates + report.unknownRows == 0);
