@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <csignal>
+#include <cstring>
 #include <map>
 
 #include "common/handles.h"
@@ -258,6 +259,7 @@ TEST_F(Sections, KeyValueIsTheFirstInTheFileCutToFit) {
     char out[8] = "";
     EXPECT_EQ(QLIBCFileGetKeyValue(file.c_str(), "b", out, 3, 0), 0);
     EXPECT_STREQ(out, "fi");
+    EXPECT_EQ(QLIBCFileGetKeyValue(file.c_str(), "b", out, 1, 0) + static_cast<int>(strlen(out)), 0);
     EXPECT_EQ(QLIBCFileGetKeyValue(file.c_str(), "c", out, 8, 0), -1);
 }
 
