@@ -241,10 +241,11 @@ TEST(Search, TurnsAFormIntoConditions) {
     EXPECT_EQ(rendered(conds), "((host = 'a') OR (host = ' b')) AND (msg GLOB 'any') AND (ldate = '2014/01/02')");
     conds.clear();
     std::string unset = "0";
+    std::string last = "2014/02/03";
     LogSearchCondListGen(any, any, any, any, unset, day, unset, conds);
-    LogSearchCondListGen(any, unset, unset, unset, day, unset, hosts, conds);
+    LogSearchCondListGen(any, unset, unset, unset, day, unset, last, conds);
     EXPECT_EQ(rendered(conds), "(msg GLOB '0') AND (ldate >= '2014/01/02') AND (llevel = '0') AND (fac = '0') AND "
-                               "(prog = '0') AND (msg GLOB '2014/01/02') AND (ldate <= 'a, b')");
+                               "(prog = '0') AND (msg GLOB '2014/01/02') AND (ldate <= '2014/02/03')");
 }
 
 class Statistics : public DatabaseTest {
