@@ -173,9 +173,10 @@ TEST_F(Senders, FillThePlaceholdersAndReportWhatFails) {
         const Notice notice = FakeNotices().sent[0];
         std::string sent = notice.tag + " ";
         for (const auto& [key, value] : notice.values) {
-            sent += key + ("=" + value) + " ";
+            sent.append(key).append("=").append(value).append(" ");
         }
-        EXPECT_EQ(sent + notice.textsDir, tag + " " + values + quor::paths::kNotifyTexts);
+        EXPECT_EQ(sent, std::string(tag).append(" ").append(values));
+        EXPECT_EQ(notice.textsDir, quor::paths::kNotifyTexts);
         EXPECT_EQ(notice.filterFile, quor::paths::kNotifyFilter);
         FakeNotices().fail = true;
         EXPECT_EQ(send(), -1);

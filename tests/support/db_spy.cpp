@@ -29,13 +29,13 @@ int QUORDBSelectLimit(DBConnect_tag* connection, const char* sql, unsigned int c
     return spied(SpyOnDb().statements, sql + window, QUORDBSelectLimit, __func__, connection, sql, count, skip, result);
 }
 
-int QUORDBEscapeStringEX2(DBConnect_tag* connection, char* out, unsigned int size, const char* in,
-                          unsigned int length) {
-    return spied(SpyOnDb().escapes, "quotes", QUORDBEscapeStringEX2, __func__, connection, out, size, in, length);
+int QUORDBEscapeStringEX2(DBConnect_tag* connection, char* out, unsigned int outSize, const char* in,
+                          unsigned int inLen) {
+    return spied(SpyOnDb().escapes, "quotes", QUORDBEscapeStringEX2, __func__, connection, out, outSize, in, inLen);
 }
 
-int QUORDBEscapeBackslashEX2(DBConnect_tag* connection, char* out, unsigned int size, const char* in) {
-    return spied(SpyOnDb().escapes, "backslashes", QUORDBEscapeBackslashEX2, __func__, connection, out, size, in);
+int QUORDBEscapeBackslashEX2(DBConnect_tag* connection, char* out, unsigned int outSize, const char* in) {
+    return spied(SpyOnDb().escapes, "backslashes", QUORDBEscapeBackslashEX2, __func__, connection, out, outSize, in);
 }
 
 int QUORDBFetchRow(DBResult_tag* result, unsigned int* row) {
