@@ -59,7 +59,7 @@ TEST_P(Session, PrintsWhatIsWritten) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Quorlog, Session,
-                         testing::Values("databases", "events", "failures", "help", "parse", "rules", "search",
+                         testing::Values("databases", "events", "failures", "forms", "help", "parse", "rules", "search",
                                          "statistics", "terminal"),
                          [](const auto& test) { return test.param; });
 
