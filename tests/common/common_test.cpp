@@ -58,15 +58,11 @@ TEST(ReadFileInReverse, StoresLinesFromTheLast) {
 }
 
 TEST(ReadFileInReverse, LeavesNoArrayForLessThanNoLines) {
-    for (const int maxLines : {-1, INT32_MIN}) {
-        testing::internal::CaptureStderr();
-        char* uninitialised = nullptr;
-        char** lines = &uninitialised;
-        int count = 0;
-        EXPECT_EQ(readfileinreverse(stdin, &lines, count, maxLines), -1);
-        EXPECT_EQ(lines, nullptr);
-        EXPECT_EQ(testing::internal::GetCapturedStderr(), "calloc: Cannot allocate memory\n");
-    }
+    char* uninitialised = nullptr;
+    char** lines = &uninitialised;
+    int count = 0;
+    EXPECT_EQ(readfileinreverse(stdin, &lines, count, -1), -1);
+    EXPECT_EQ(lines, nullptr);
 }
 
 TEST(CmdParser, CutsAfterEveryClosingBraceAndStopsAtTheFirstFailure) {

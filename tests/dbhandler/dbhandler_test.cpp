@@ -231,11 +231,6 @@ TEST_F(Failure, OfOneStepOfTheRecoveryLeavesTheOthers) {
     EXPECT_EQ(recover(), "-1 Fail to load configuration") << "there is no file to move";
     EXPECT_EQ(FakeNotices().sent.size(), 1U);
     folder_.write("log.db", "x");
-    FakeNotices().tablesFail = true;
-    EXPECT_EQ(recover(), "-1 Fail to load configuration");
-    EXPECT_EQ(FakeNotices().sent.size(), 1U) << "nothing happens without memory";
-    EXPECT_TRUE(FakeServices().reloaded.empty());
-    FakeNotices().tablesFail = false;
     FakeNotices().fail = true;
     EXPECT_EQ(recover(), "-1 dbhandler:88 Fail to send HUP signal to syslog-ng");
     EXPECT_TRUE(fs::exists(path_ + ".corrupt"));

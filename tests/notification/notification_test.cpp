@@ -50,11 +50,6 @@ TEST_F(Rules, AreWrittenWholeOrReported) {
          {rule("r", 0, 0, 0, "a\n[evil]"), rule("r", 0, 0, 0, std::string("a\0b", 3)), rule("", 0, 0, 0, "a")}) {
         EXPECT_EQ(Said(SyslogNotifyConfSet(file_, "r", bad)), "-1 utils:139 Fail set section to file");
     }
-    FakeNotices().tablesFail = true;
-    EXPECT_EQ(Said(SyslogNotifyConfSet(file_, "r", negative)), "-1 utils:124 Fail to allocate memory");
-    EXPECT_EQ(Said(SyslogNotifyConfGet(file_, "r", negative)), "-1 utils:81 Fail to allocate memory");
-    EXPECT_EQ(Said(manager_.ConfigLoad(file_)), "-1 Fail to allocate memory");
-    FakeNotices().tablesFail = false;
     EXPECT_EQ(ReadFile(file_),
               "[r]\nnotify_type=\"18446744073709551614\"\nnotify_eps=\"18446744073709551615\"\nnotify_pri=\"4\"\n"
               "notify_pat=\"p\"\nnotify_enable=\"1\"\n");
@@ -182,8 +177,6 @@ TEST_F(Senders, FillThePlaceholdersAndReportWhatFails) {
         EXPECT_EQ(send(), -1);
         const std::string failed = "Fail to send notification: " + tag;
         EXPECT_EQ(TakeSystemLogTexts(), managed ? Strings({failed, "Fail to send notification"}) : Strings{failed});
-        FakeNotices().tablesFail = true;
-        EXPECT_EQ(Said(send()), managed ? "-1 Fail to allocation memory" : "-1 ");
     }
 }
 

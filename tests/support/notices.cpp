@@ -1,7 +1,5 @@
 #include "tests/support/notices.h"
 
-#include "tests/support/real.h"
-
 int QUORSysNotifySendNotificationCustomized(const char* tag, const char* textsDir, const char* filterFile,
                                             QLIBSZHASH* values, int /*flags*/) {
     quor::test::Notice notice{tag, textsDir, filterFile, {}};
@@ -32,12 +30,4 @@ QUORSMSCONF* QUORSmsConfGet() {
 
 void QUORSmsConfFree(QUORSMSCONF* conf) {
     quor::test::FakeNotices().smsLent -= conf != nullptr ? 1 : 0;
-}
-
-QLIBSZHASH* QLIBCSzHashAlloc(int size) {
-    return quor::test::FakeNotices().tablesFail ? nullptr : quor::test::Real(QLIBCSzHashAlloc, __func__)(size);
-}
-
-QLIBSZLIST* QLIBCSzListAlloc(int size) {
-    return quor::test::FakeNotices().tablesFail ? nullptr : quor::test::Real(QLIBCSzListAlloc, __func__)(size);
 }

@@ -22,7 +22,6 @@ struct Notice {
 struct Notices {
     std::vector<Notice> sent;
     bool fail = false;
-    bool tablesFail = false;       // there is no memory for a table or a list
     std::function<void()> onSend;  // called for each notice, to look at the world at that moment
 
     QUORMAIL mail{};
