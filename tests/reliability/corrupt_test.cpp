@@ -1,13 +1,9 @@
 // Damaged databases through every function that reads or writes one: it answers, and with no more than there was.
-#include <gtest/gtest.h>
-
 #include <random>
 
 #include "dbhandler.h"
 #include "dbutil.h"
-#include "tests/support/sqlite_file.h"
-#include "tests/support/system_log.h"
-#include "tests/support/temp_folder.h"
+#include "tests/support/testing.h"
 
 namespace quor::test {
 namespace {
