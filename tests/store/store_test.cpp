@@ -4,7 +4,6 @@
 #include <numeric>
 
 #include "store/ask.h"
-#include "store/databasefile.h"
 #include "store/failure.h"
 #include "store/follower.h"
 #include "store/selection.h"
@@ -189,9 +188,6 @@ TEST_F(Store, FailuresSayWhyAndWhatToDo) {
         {ask("text.db"), "damaged: *: file is not a database; run quorlog db check on it"},
         {ask("none.db"), "missing: cannot open *; make sure that it is a database and that you may read it"},
         {ask(""), "denied: cannot open *; make sure that it is a database and that you may read it"},
-        {[&] { RequireTable(path_, "other"); }, "missing: *: no such table: other; choose another --table or --db"},
-        {[&] { RequireDatabase(folder_.path("none.db"), "make it"); }, "missing: no database *; make it"},
-        {[&] { RequireDatabase(folder_.path(), "make it"); }, "missing: * is not a file; give the path of a database"},
         {[&] { OpenSource(path_)->count("general_log", {}); }, "missing: *no such table: general_log;*"},
         {[&] { OpenSource(path_)->values(SYSLOG_ATTRI_FSIZE, {}); }, "missing: *no such column: fsize;*"},
         {[&] { OpenSource(folder_.path("db check.db"))->remove({}); },
