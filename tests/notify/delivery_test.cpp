@@ -1,4 +1,4 @@
-#include <sys/stat.h>
+#include <poll.h>
 #include <sys/wait.h>
 
 #include <chrono>
@@ -9,22 +9,12 @@
 namespace quor::test {
 namespace {
 
-constexpr const char kAbsentPort[] = "9";  // nothing listens there
-
 class Delivery : public Notify {
   protected:
-    static double secondsOf(const std::function<void()>& work) {
-        const auto begin = std::chrono::steady_clock::now();
-        work();
-        return std::chrono::duration<double>(std::chrono::steady_clock::now() - begin).count();
-    }
-
     // A process that holds a slot of ours and nothing of its caller's.
     static bool isCleanWorker(const std::filesystem::path& process) {
         std::error_code gone;
-        const auto link = [&](const char* name) {
-            return std::filesystem::read_symlink(process / name, gone).string();
-        };
+        const auto link = [&](auto name) { return std::filesystem::read_symlink(process / name, gone).string(); };
         return link("fd/3").rfind(paths::kNotifySpool, 0) == 0 && link("fd/2") == "/dev/null" && link("cwd") == "/" &&
                ReadFile(process / "comm") == "quornotify\n" && getsid(std::stoi(process.filename())) != getsid(0) &&
                ReadFile(process / "status").find("Umask:\t0077") != std::string::npos;
@@ -38,10 +28,8 @@ TEST_F(Delivery, MailsCarryWhatWasReceivedAndNoHeaderOfItsMaking) {
     const std::string longWord = "k\xC3\xA4\xE2\x82\xAC" + std::string(100, 'y') + "\xF0\x9F\x98\x80";
     // keyword, content, subject, body, its charset
     const std::tuple<std::string, std::string, std::string, std::string, const char*> cases[]{
-        {"\xC3\xA4", "a\\\"b\\\\c\t\x1b[2J .\r\n.\r\nQUIT", "About \xC3\xA4", "a\"b\\c\t\x1b[2J .\r\n.\r\nQUIT",
-         "utf-8"},
-        {"x\r\nBcc: evil@example.com\r\n\r\n", "caf\xC3\xA9", "About x  Bcc: evil@example.com    ", "caf\xC3\xA9",
-         "utf-8"},
+        {"\xC3\xA4", "a\\\"b\\\\c\t\x1b[2J .\r\n.\r\nEND", "About \xC3\xA4", "a\"b\\c\t\x1b[2J .\r\n.\r\nEND", "utf-8"},
+        {"x\r\nBcc: evil@a.com\r\n\r\n", "caf\xC3\xA9", "About x  Bcc: evil@a.com    ", "caf\xC3\xA9", "utf-8"},
         {longWord, "caf\xE9 \xFF\xC3\xA9", "About " + longWord, "caf\xE9 \xFF\xC3\xA9", "iso-8859-1"}};
     const std::string headers =
         "auto-submitted,content-transfer-encoding,content-type,date,from,message-id,mime-version,subject,to";
@@ -63,13 +51,13 @@ TEST_F(Delivery, MailsCarryWhatWasReceivedAndNoHeaderOfItsMaking) {
 TEST_F(Delivery, EncryptedMailLogsInAndChecksTheCertificate) {
     const std::string key = folder_.path("key.pem");
     const std::string certificate = folder_.path("cert.pem");
-    const std::string files = certificate + " " + key;
-    std::string command = "openssl req -x509 -newkey rsa:2048 -nodes -subj /CN=127.0.0.1 2>/dev/null";
-    command.append(" -addext subjectAltName=IP:127.0.0.1 -keyout ").append(key).append(" -out ").append(certificate);
+    const std::string command = "openssl req -x509 -newkey rsa:2048 -nodes -subj /CN=127.0.0.1 2>/dev/null "
+                                "-addext subjectAltName=IP:127.0.0.1 -keyout " +
+                                key + " -out " + certificate;
     ASSERT_EQ(system(command.c_str()), 0);
     for (const std::string security : {"starttls", "tls"}) {
         SCOPED_TRACE(security);
-        const Server server("smtp-" + security + " good", files);
+        const Server server("smtp-" + security + " good", certificate + " " + key);
         const auto with = [&](const std::string& more) {
             std::string text = mailTo(server.port(), "smtp_user=\"user\"\nsmtp_password=\"pass\"word\"\n" + more);
             settings(text.replace(text.find("none"), 4, security));
@@ -95,10 +83,8 @@ TEST_F(Delivery, MailThatFailsIsToldInTheSystemLog) {
     for (size_t i = 0; i < cases.size(); ++i) {
         settings(cases[i].first);
         ASSERT_EQ(send({}), 0);
-        const auto lines = systemLog(i + 1);
-        ASSERT_EQ(lines.size(), i + 1);
-        EXPECT_EQ(lines[i].rfind("Failed to send email.", 0), 0U) << lines[i];
-        EXPECT_NE(lines[i].find(cases[i].second), std::string::npos) << lines[i];
+        const std::string line = systemLog(i + 1)[i];
+        EXPECT_TRUE(std::regex_match(line, std::regex("Failed to send email\\..*" + cases[i].second + ".*"))) << line;
     }
 }
 
@@ -141,29 +127,29 @@ TEST_F(Delivery, TheCallerNeitherWaitsNorKeepsAnything) {
     settings(mailTo(server.port()));
     int ends[2];
     ASSERT_EQ(pipe(ends), 0);
-    const double seconds = secondsOf([&] {
-        for (int i = 0; i < 6; ++i) {
-            ASSERT_EQ(send({}), 0);
-        }
-    });
+    const auto begun = std::chrono::steady_clock::now();
+    for (int i = 0; i < 6; ++i) {
+        ASSERT_EQ(send({}), 0);
+    }
+    const std::chrono::duration<double> passed = std::chrono::steady_clock::now() - begun;
     EXPECT_TRUE(Eventually([] {
         const std::filesystem::directory_iterator processes("/proc");
         return std::count_if(begin(processes), end(processes), isCleanWorker) == 3;
     }));
-    EXPECT_LT(seconds, 1.5) << "one answer of the server takes longer than six calls";
+    EXPECT_LT(passed.count(), 1.5) << "one answer of the server takes longer than six calls";
     EXPECT_EQ(waitpid(-1, nullptr, WNOHANG), 0) << "a zombie";  // the server alone is a child
 
     close(ends[1]);
-    char end = 0;
-    EXPECT_LT(secondsOf([&] { EXPECT_EQ(read(ends[0], &end, 1), 0); }), 1.0) << "a worker holds the caller's pipe";
+    pollfd end{ends[0], POLLIN, 0};
+    EXPECT_EQ(poll(&end, 1, 1000), 1) << "a worker holds the caller's pipe";
     close(ends[0]);
     EXPECT_EQ(server.received(6)[0], "3") << "deliveries at a time";
 }
 
 TEST_F(Delivery, TheTestNoticeTellsTheOutcomeOfEachChannel) {
     const Server server("http good");
-    settings(mailTo(kAbsentPort,
-                    "desktop_notify_enabled=\"yes\"\nwebhook_url=\"http://127.0.0.1:" + server.port() + "\"\n"));
+    const std::string webhook = "webhook_url=\"http://127.0.0.1:" + server.port() + "\"\n";
+    settings(mailTo("9", "desktop_notify_enabled=\"yes\"\n" + webhook));  // nobody listens there
     Strings heard;
     const auto report = [](const char* channel, int ok, const char* detail, void* context) {
         static_cast<Strings*>(context)->push_back(std::string(channel) + (ok != 0 ? " ok" : " failed") +

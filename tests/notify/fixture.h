@@ -94,17 +94,14 @@ class Notify : public ::testing::Test {
         return taken;
     }
 
-    // The lines of a file that workers append to, once there are that many.
+    // The lines of a file that workers append to, at least `count`: those that do not come are empty.
     static Strings awaitLines(const std::string& path, size_t count) {
-        Eventually([&] { return linesOf(ReadFile(path)).size() >= count; });
-        return linesOf(ReadFile(path));
-    }
-    // At least `count` lines, the missing ones empty.
-    Strings systemLog(size_t count) {
-        Strings lines = awaitLines(folder_.path("syslog"), count);
+        Strings lines;
+        Eventually([&] { return (lines = linesOf(ReadFile(path))).size() >= count; });
         lines.resize(std::max(lines.size(), count));
         return lines;
     }
+    Strings systemLog(size_t count) { return awaitLines(folder_.path("syslog"), count); }
 
     TempFolder folder_;
     std::string texts_ = folder_.path();

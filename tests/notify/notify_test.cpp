@@ -24,7 +24,6 @@ class Notices : public Notify {
             EXPECT_TRUE(reader.parse(line, notices.emplace_back())) << line;
         }
         EXPECT_EQ(notices.size(), count);
-        notices.resize(count);
         return notices;
     }
 
@@ -39,23 +38,21 @@ class Notices : public Notify {
 };
 
 TEST_F(Notices, ShowValuesAsTheyWereReceived) {
-    const std::tuple<const char*, Values, const char*, const char*> cases[]{
+    // The first and last characters of each length, and what lies just beyond.
+    const std::string utf8 = "\xF4\x8F\xBF\xBF \xED\x9F\xBF \xEE\x80\x80 \xC2\x80 \xE0\xA0\x80 \xF0\x90\x80\x80";
+    const std::string other = "\xF4\x90\x80\x80 \xED\xBF\xBF \xC1\xBF \xE0\x9F\xBF \xF0\x8F\xBF\xBF \xE2\x82";
+    const std::string shown =
+        "\\xf4\\x90\\x80\\x80 \\xed\\xbf\\xbf \\xc1\\xbf \\xe0\\x9f\\xbf \\xf0\\x8f\\xbf\\xbf \\xe2\\x82";
+    const std::tuple<const char*, Values, const char*, std::string> cases[]{
         // template, values, subject, body
         {"%A% of %\n\n100%%A%% %B\n", {{"%A%", "x"}}, "x of %", "100%x% %B\n"},
         {"S\r\n\r\nHost: %HOST%\r\nEnd", {}, "S", "End\n"},
         {"%A%\n\n%A%\n", {{"%A%", "%HOST%"}, {"%HOST%", "h"}}, "%HOST%", "%HOST%\n"},
         {"S\n\n%SYSLOG_CONTENT%|%A%\n", {{"%SYSLOG_CONTENT%", R"(\"\\n\x)"}, {"%A%", R"(\")"}}, "S", "\"\\n\\x|\\\"\n"},
         {"%A%\n\n%A%\n", {{"%A%", "a\r\nBcc: x\x1b[31m\x7f"}}, "a  Bcc: x [31m ", "a\r\nBcc: x\x1b[31m\x7f\n"},
-        {"S\n\n%A%\n",
-         {{"%A%", "\xF4\x8F\xBF\xBF \xED\x9F\xBF \xEE\x80\x80 \xC2\x80 \xE0\xA0\x80 \xF0\x90\x80\x80"}},
-         "S",
-         "\xF4\x8F\xBF\xBF \xED\x9F\xBF \xEE\x80\x80 \xC2\x80 \xE0\xA0\x80 \xF0\x90\x80\x80\n"},
-        {"S\n\n%A%\n",
-         {{"%A%", "\xF4\x90\x80\x80 \xED\xBF\xBF \xC1\xBF \xE0\x9F\xBF \xF0\x8F\xBF\xBF \xE2\x82"}},
-         "S",
-         "\\xf4\\x90\\x80\\x80 \\xed\\xbf\\xbf \\xc1\\xbf \\xe0\\x9f\\xbf \\xf0\\x8f\\xbf\\xbf \\xe2\\x82\n"},
-        {"%A%\n\n%A%\n", {{"%A%", "\xE9z"}}, "\xEF\xBF\xBDz", "\\xe9z\n"},
-    };
+        {"S\n\n%A%\n", {{"%A%", utf8}}, "S", utf8 + "\n"},
+        {"S\n\n%A%\n", {{"%A%", other}}, "S", shown + "\n"},
+        {"%A%\n\n%A%\n", {{"%A%", "\xE9z"}}, "\xEF\xBF\xBDz", "\\xe9z\n"}};
     Json::Value notice;
     for (const auto& [text, values, subject, body] : cases) {
         folder_.write("T.txt", text);
@@ -88,11 +85,10 @@ TEST_F(Notices, TheShippedFilesServeEveryTag) {
     texts_ = SOURCE_FOLDER "/texts";
     filter_ = SOURCE_FOLDER "/etc/notify.filter";
     settings(ReadFile(SOURCE_FOLDER "/etc/quorinfo.conf.example"));
-    const Values values{{"DESKTOP_NOTIFY_CLASSNAME", "App"},
-                        {"%EPS%", "<value>"},
-                        {"%SYSLOG_CONTENT%", "<value>"},
-                        {"%SHARED_FOLDER%", "<value>"},
-                        {"%DBPATH%", "<value>"}};
+    Values values{{"DESKTOP_NOTIFY_CLASSNAME", "App"}};
+    for (const char* key : {"%EPS%", "%SYSLOG_CONTENT%", "%SHARED_FOLDER%", "%DBPATH%"}) {
+        values[key] = "<value>";
+    }
     for (const char* name : {"EPS_EXCEED", "SEV_EXCEED", "KEYWORD_MATCH", "VOL_FULL", "DB_CORRUPT", "ShareRemove",
                              "ShareRename", "ShareEncMount", "ShareEncUnmount"}) {
         const Json::Value notice = sent(values, std::string("QUORSYSLOG_") + name);
@@ -111,15 +107,13 @@ TEST_F(Notices, KeepTheIntervalOfTheirTagAndHost) {
         {1000, "a", 0},      {1059, "a", -1}, {1059, "b", 0},  {1059, "", 0}, {1001, hostile, 0},
         {1002, hostile, -1}, {1060, "a", 1},  {1061, "a", -1}, {500, "a", 1} /* the clock was set back */};
     for (const auto& [now, host, suppressed] : steps) {
-        SCOPED_TRACE(now);
         SetClock(now);
         const Values values = host.empty() ? Values{} : Values{{"%HOST%", host}};
         if (suppressed < 0) {
             ASSERT_EQ(send(values), 0);
         } else {
             const Json::Value notice = sent(values);
-            EXPECT_EQ(notice["time"].asInt64(), now);
-            EXPECT_EQ(notice["suppressed"].asInt(), suppressed);
+            EXPECT_TRUE(notice["time"].asInt64() == now && notice["suppressed"].asInt() == suppressed) << now;
         }
         ASSERT_EQ(send({}, "M"), 0) << "a channel that is not set up";
     }
@@ -170,11 +164,11 @@ TEST_F(Notices, PastTheBoundOfTheQueueAreCounted) {
 TEST_F(Notices, FromManyProcessesAllArrive) {
     for (int caller = 0; caller < 4; ++caller) {
         if (fork() == 0) {
-            int failed = 0;
-            for (int i = 0; i < 25; ++i) {
-                failed += send({}) != 0 ? 1 : 0;
+            int sent = 0;
+            while (sent < 25 && send({}) == 0) {
+                ++sent;
             }
-            _exit(failed);
+            _exit(25 - sent);
         }
     }
     for (int status = 0; wait(&status) > 0;) {
@@ -196,7 +190,6 @@ TEST_F(Notices, TheDesktopSpoolIsTurnedOver) {
 TEST_F(Notices, GoWhereTheSettingsSay) {
     // Security, port, time-out, verified.
     const std::tuple<const char*, int, int, int32_t, bool> cases[]{
-        {"", 1, 587, 30, true},
         {"smtp_security=none\nnotify_timeout=0\nwebhook_tls_verify=yes\nsmtp_tls_verify=yes\n", 0, 25, 30, true},
         {"smtp_security=tls\nnotify_timeout=1\nwebhook_tls_verify=no\nsmtp_tls_verify=no\n", 2, 465, 1, false},
         {"smtp_security=TLS\nsmtp_port=1\nnotify_timeout=300\n", 1, 1, 300, true},

@@ -2,8 +2,7 @@
 
 MOOD is good, slow (1.5 s before an answer), stuck (never answers) or refuse. Prints its port, ends with its standard
 input, and writes what real parsers made of each message to FOLDER/1, FOLDER/2 ... with the most sessions at a time, its
-body to FOLDER/1.body ...
-"""
+body to FOLDER/1.body ..."""
 import asyncio, email, email.policy, json, os, ssl, sys
 from aiosmtpd.smtp import SMTP, AuthResult
 
@@ -29,11 +28,10 @@ async def session_begins():
 
 
 class Mails:
-    async def handle_EHLO(self, server, session, envelope, hostname, responses):
-        if not session.host_name:
-            await session_begins()
-        session.host_name = hostname
-        return responses
+    async def handle_MAIL(self, server, session, envelope, address, options):
+        await session_begins()
+        envelope.mail_from = address
+        return "250 OK"
 
     async def handle_RCPT(self, server, session, envelope, address, options):
         if mood == "refuse" or address.startswith("unknown@"):
@@ -71,20 +69,18 @@ async def answer_http(reader, writer):
 
 async def main():
     loop = asyncio.get_running_loop()
-    context = None
-    if len(sys.argv) > 4:
+    context, options = None, {}
+    if kind.startswith("smtp-"):
         context = ssl.SSLContext(ssl.PROTOCOL_TLS_SERVER)
-        context.load_cert_chain(sys.argv[4], sys.argv[5])
+        context.load_cert_chain(*sys.argv[4:6])
+        options = {"auth_required": True, "authenticator": login, "auth_require_tls": kind == "smtp-starttls"}
+    if kind == "smtp-starttls":
+        options.update(tls_context=context, require_starttls=True)
+        context = None
     if kind == "http":
         server = await asyncio.start_server(answer_http, "127.0.0.1", 0)
     else:
-        options = {}
-        if context:
-            options = {"auth_required": True, "authenticator": login, "auth_require_tls": kind == "smtp-starttls"}
-        if kind == "smtp-starttls":
-            options.update(tls_context=context, require_starttls=True)
-        server = await loop.create_server(lambda: SMTP(Mails(), loop=loop, **options), "127.0.0.1", 0,
-                                          ssl=context if kind == "smtp-tls" else None)
+        server = await loop.create_server(lambda: SMTP(Mails(), loop=loop, **options), "127.0.0.1", 0, ssl=context)
     print(server.sockets[0].getsockname()[1], end="", flush=True)
     await loop.run_in_executor(None, sys.stdin.read)
     os._exit(0)
