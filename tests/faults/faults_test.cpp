@@ -12,9 +12,7 @@
 #include "dbhandler.h"
 #include "logger.h"
 #include "logger/eventdb.h"
-#include "parser.h"
 #include "platform/notify/spool.h"
-#include "quor/quorfs.h"
 #include "quor/quorsalvage.h"
 #include "tests/support/clock.h"
 #include "tests/support/faults.h"
@@ -78,11 +76,9 @@ std::string files(const std::string& folder) {
 
 constexpr const char* kLogs =
     "CREATE TABLE logs(id INTEGER PRIMARY KEY, host TEXT, utcsec INTEGER, prio TEXT, msg TEXT);"
-    "CREATE TABLE db_info(id INTEGER PRIMARY KEY, start_time, end_time, log_count, device);"
-    "INSERT INTO db_info VALUES(1, 1, 2, 3, 'd');"
     "WITH RECURSIVE n(i) AS (SELECT 1 UNION ALL SELECT i + 1 FROM n WHERE i < 300) INSERT INTO logs(host, utcsec, "
     "prio, msg) SELECT 'h' || (i % 3), i, 'info', hex(zeroblob(100)) FROM n;";
-constexpr const char* kLogState = "SELECT COUNT(*), SUM(id) FROM logs UNION ALL SELECT end_time, 0 FROM db_info";
+constexpr const char* kLogState = "SELECT COUNT(*), SUM(id) FROM logs";
 constexpr const char* kEventState = "SELECT user, event FROM log";
 
 int remove(Place& place) {
@@ -97,11 +93,6 @@ int search(Place& place) {
         return 0;
     };
     return SyslogDBSelect(place.db, conditions, nullptr, nullptr, take, &place.seen, true);
-}
-
-int setEnd(Place& place) {
-    EventDb db(place.db);
-    return db.connect() ? db->DBInfoEndSet(77) : -1;
 }
 
 int checkpoint(Place& place) {
@@ -141,21 +132,6 @@ int selectMuch(Place& place) {
     return status;
 }
 
-int parse(Place& place) {
-    LogParser parser;
-    std::string chunk = "user err 2026-01-02 10:00:00 1 1 +00:00 nas 10.0.0.1 app t hello\nuser err 2026";
-    const int result = parser.LogAdd(chunk);
-    place.seen = std::to_string(parser.LogGetCount());
-    return result;
-}
-
-int createFolders(Place& place) {
-    const std::string path = place.folder.path("a/b/c");
-    const int result = QUORFSMkdirP(path.c_str(), 0, 0, -1, -1, 0700);
-    place.seen = access(path.c_str(), F_OK) == 0 ? "made" : "";
-    return result;
-}
-
 void logs(Place& place) {
     SqliteFile(place.db).run(kLogs);
 }
@@ -185,19 +161,16 @@ void counts(Place& place) {
     place.accounting->CurEpsUpdate();
 }
 
-void nothing(Place& /*place*/) {}
-
 constexpr Operation kOperations[] = {
     {"delete", logs, remove, kLogState},
     {"delete from a write-ahead log", walLogs, remove, kLogState},
     {"search", logs, search, kLogState},
-    {"set the end time", walLogs, setEnd, kLogState},
     {"move a corrupt database aside", logs,
      [](Place& place) { return DBErrorHandle_SQLITE_CORRUPT(nullptr, place.db); }, nullptr},
     {"checkpoint", unfinishedLogs, checkpoint, kLogState},
     {"record an event", [](Place& place) { SqliteFile(place.db).run(ReadFile(paths::kEventSchema)); }, addEvent,
      kEventState, Promise::CommitUnasked},
-    {"record the first event", nothing, addEvent, kEventState, Promise::CommitUnasked, true},
+    {"record the first event", [](Place&) {}, addEvent, kEventState, Promise::CommitUnasked, true},
     {"flush the accounting", counts, [](Place& place) { return place.accounting->AccoutingFlush2DB(); },
      "SELECT device, count FROM histogram UNION SELECT device, eps FROM eps ORDER BY 1", Promise::Repeats},
     {"set a rule", [](Place& place) { (void)place.folder.write("rules", "[a]\nb=\"c\"\n[old]\nd=\"e\"\n"); }, setRule,
@@ -205,8 +178,6 @@ constexpr Operation kOperations[] = {
     {"queue a notice", [](Place&) { std::filesystem::remove_all(paths::kNotifySpool); }, queueNotice, nullptr},
     {"salvage", walLogs, salvage, nullptr},
     {"select more than memory holds", logs, selectMuch, kLogState, Promise::AllOrNothing, true},
-    {"parse", nothing, parse, nullptr},
-    {"create folders", nothing, createFolders, kLogState},
 };
 
 int64_t openFiles() {

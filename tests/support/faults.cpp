@@ -23,7 +23,7 @@ bool lasting;
 bool hit;
 int left;
 Resource failing;
-[[maybe_unused]] int64_t blocks;
+int64_t blocks;
 
 // `frees`: a full disk does not keep anyone from it.
 bool fails(Resource resource, bool frees = false) {
@@ -34,6 +34,11 @@ bool fails(Resource resource, bool frees = false) {
     hit = true;
     errno = resource == Resource::Memory ? ENOMEM : lasting ? ENOSPC : EIO;
     return true;
+}
+
+[[maybe_unused]] void* counted(void* block) {
+    blocks += block != nullptr ? 1 : 0;
+    return block;
 }
 
 }  // namespace
@@ -54,6 +59,10 @@ Fault::~Fault() {
 
 bool Fault::struck() {
     return hit;
+}
+
+int64_t LiveBlocks() {
+    return blocks;
 }
 
 }  // namespace quor::test
@@ -94,10 +103,6 @@ int fdatasync(int file) {
 
 #ifdef __SANITIZE_ADDRESS__
 
-int64_t quor::test::LiveBlocks() {
-    return 0;
-}
-
 void* operator new(size_t size) {
     void* block = fails(Resource::Memory) ? nullptr : malloc(size);
     if (block == nullptr) {
@@ -116,19 +121,6 @@ void operator delete(void* block, size_t /*size*/) noexcept {
 
 #else
 
-int64_t quor::test::LiveBlocks() {
-    return blocks;
-}
-
-namespace {
-
-void* counted(void* block) {
-    blocks += block != nullptr ? 1 : 0;
-    return block;
-}
-
-}  // namespace
-
 extern "C" {
 
 void* __libc_malloc(size_t size);
@@ -146,11 +138,7 @@ void* calloc(size_t count, size_t size) noexcept {
 }
 
 void* realloc(void* block, size_t size) noexcept {
-    if (fails(Resource::Memory)) {
-        return nullptr;
-    }
-    void* moved = __libc_realloc(block, size);
-    return block == nullptr ? counted(moved) : moved;
+    return block == nullptr ? malloc(size) : fails(Resource::Memory) ? nullptr : __libc_realloc(block, size);
 }
 
 void* aligned_alloc(size_t alignment, size_t size) noexcept {
