@@ -115,9 +115,8 @@ TEST_P(Salvaging, KeepsTheRowsOfEveryUndamagedPageAndNoOther) {
     EXPECT_EQ(!db.query("SELECT id FROM logs EXCEPT SELECT id FROM whole.logs").empty(),
               GetParam().damage == Damage::FirstPage)
         << "deleted rows return only when the definitions and the list of free pages are lost";
-    EXPECT_EQ(db.query("SELECT count(*) FROM (SELECT * FROM logs WHERE id NOT BETWEEN 5000 AND 6999 EXCEPT "
-                       "SELECT * FROM whole.logs)"),
-              Strings{"0"});
+    EXPECT_EQ(db.query("SELECT * FROM logs WHERE id NOT BETWEEN 5000 AND 6999 EXCEPT SELECT * FROM whole.logs"),
+              Strings());
     EXPECT_EQ(db.query("PRAGMA integrity_check; PRAGMA journal_mode"), (Strings{"ok", "wal"}));
     EXPECT_EQ(ReadFile(damaged_), before);
 }
