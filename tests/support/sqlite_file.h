@@ -4,10 +4,11 @@
 
 #include <sqlite3.h>
 
-#include <memory>
 #include <stdexcept>
 #include <string>
 #include <vector>
+
+#include "base/guards.h"
 
 namespace quor::test {
 
@@ -15,11 +16,9 @@ class SqliteFile {
   public:
     // Creates the file when it is missing.
     explicit SqliteFile(const std::string& path) {
-        sqlite3* handle = nullptr;
-        const int status = sqlite3_open(path.c_str(), &handle);
-        db_.reset(handle);
+        const int status = sqlite3_open(path.c_str(), Adopt(db_));
         check(status);
-        sqlite3_busy_timeout(handle, 5000);  // programs under test write at the same time
+        sqlite3_busy_timeout(db_.get(), 5000);  // programs under test write at the same time
     }
 
     // Any number of statements.
@@ -46,10 +45,7 @@ class SqliteFile {
         }
     }
 
-    struct Closer {
-        void operator()(sqlite3* db) const { sqlite3_close(db); }
-    };
-    std::unique_ptr<sqlite3, Closer> db_;
+    Guard<sqlite3, sqlite3_close> db_;
 };
 
 }  // namespace quor::test
