@@ -22,6 +22,7 @@ namespace {
 __attribute__((format(printf, 2, 3))) int fail(QUORSALVAGE& report, const char* format, ...) {
     va_list arguments;
     va_start(arguments, format);
+    // NOLINTNEXTLINE(clang-analyzer-valist.Uninitialized): va_start() is above
     (void)vsnprintf(report.error, sizeof report.error, format, arguments);
     va_end(arguments);
     return -1;

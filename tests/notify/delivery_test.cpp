@@ -55,9 +55,10 @@ TEST_F(Delivery, EncryptedMailLogsInAndChecksTheCertificate) {
                                 "-addext subjectAltName=IP:127.0.0.1 -keyout " +
                                 key + " -out " + certificate;
     ASSERT_EQ(system(command.c_str()), 0);
+    const std::string files = certificate + " " + key;
     for (const std::string security : {"starttls", "tls"}) {
         SCOPED_TRACE(security);
-        const Server server("smtp-" + security + " good", certificate + " " + key);
+        const Server server(std::string("smtp-").append(security).append(" good"), files);
         const auto with = [&](const std::string& more) {
             std::string text = mailTo(server.port(), "smtp_user=\"user\"\nsmtp_password=\"pass\"word\"\n" + more);
             settings(text.replace(text.find("none"), 4, security));

@@ -41,8 +41,7 @@ TEST_F(Notices, ShowValuesAsTheyWereReceived) {
     // The first and last characters of each length, and what lies just beyond.
     const std::string utf8 = "\xF4\x8F\xBF\xBF \xED\x9F\xBF \xEE\x80\x80 \xC2\x80 \xE0\xA0\x80 \xF0\x90\x80\x80";
     const std::string other = "\xF4\x90\x80\x80 \xED\xBF\xBF \xC1\xBF \xE0\x9F\xBF \xF0\x8F\xBF\xBF \xE2\x82";
-    const std::string shown =
-        "\\xf4\\x90\\x80\\x80 \\xed\\xbf\\xbf \\xc1\\xbf \\xe0\\x9f\\xbf \\xf0\\x8f\\xbf\\xbf \\xe2\\x82";
+    const std::string shown = R"(\xf4\x90\x80\x80 \xed\xbf\xbf \xc1\xbf \xe0\x9f\xbf \xf0\x8f\xbf\xbf \xe2\x82)";
     const std::tuple<const char*, Values, const char*, std::string> cases[]{
         // template, values, subject, body
         {"%A% of %\n\n100%%A%% %B\n", {{"%A%", "x"}}, "x of %", "100%x% %B\n"},
@@ -200,7 +199,7 @@ TEST_F(Notices, GoWhereTheSettingsSay) {
     QUORMAIL mail;
     for (const auto& [text, security, port, timeout, verify] : cases) {
         SCOPED_TRACE(text);
-        settings("smtp_server=" + longest + "\nsmtp_user=too" + longest + "\n" + text);
+        settings(std::string("smtp_server=").append(longest).append("\nsmtp_user=too").append(longest + "\n" + text));
         ASSERT_EQ(QUORMailGet(&mail), 0);
         const auto read = notify::LoadSettings();
         EXPECT_EQ(std::tie(mail.security, mail.port, read->timeout, read->webhookVerify),
