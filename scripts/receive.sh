@@ -16,7 +16,7 @@ listening() { (exec 3<> "/dev/tcp/127.0.0.1/$1") 2> /dev/null; }
 # start_syslog_ng FOLDER PORT DATABASE: its process is then in $syslog_ng, its messages in $syslog_ng_log. Started again
 # in the same folder it goes on with what waits there. $buffer_size and $buffer_folder may be set.
 start_syslog_ng() {
-    local buffer=${buffer_folder:-$1/buffer}
+    local buffer=${buffer_folder:-$1/buffer} size=${buffer_size:-268435456}
     mkdir -p "$buffer"
     cat > "$1/receiving.conf" << CONF
 @define quor_ip_protocol "4"
@@ -25,7 +25,8 @@ start_syslog_ng() {
 @define quor_port_framed "$(($2 + 1))"
 @define quor_database "$3"
 @define quor_buffer "$buffer"
-@define quor_buffer_size "${buffer_size:-268435456}"
+@define quor_buffer_size "$size"
+@define quor_buffer_rest "$((size / 4))"
 CONF
     sed "s|/etc/quorsyslog/receiving|$1/receiving|" etc/syslog-ng/quorsyslog.conf > "$1/quorsyslog.conf"
     printf '@version: 3.38\n@include "%s"\n' "$1/quorsyslog.conf" > "$1/syslog-ng.conf"
@@ -34,7 +35,7 @@ CONF
         --pidfile "$1/pid" >> "$syslog_ng_log" 2>&1 &
     syslog_ng=$!
     await "the start of syslog-ng on port $2" listening "$2"
-    packaging/reserve-buffer "$buffer" "${buffer_size:-268435456}"
+    packaging/reserve-buffer "$buffer" "$size"
 }
 
 # start_quorlogd BUILD DATABASE: its process is then in $quorlogd, its messages in BUILD/root/run/quorlogd.log.
@@ -47,7 +48,7 @@ start_quorlogd() {
 
 # end SIGNAL PROCESS...: and waits for it.
 end() {
-    local signal=$1
+    local signal=$1 process
     shift
     for process in "$@"; do
         [ -z "$process" ] || kill "-$signal" "$process" 2> /dev/null || true

@@ -16,7 +16,10 @@ db=$disk/log/quorlog/syslog.db
 quorlog=$build/tools/quorlog/quorlog
 run=$(mktemp -d /tmp/quor-full-disk-XXXXXX)
 syslog_ng=
+quorlogd=
 sent=0
+buffer_folder=$disk/log/quorlog/buffer # on the disk that fills up
+buffer_size=8388608
 
 fail() {
     echo "try-full-disk.sh: $*" >&2
@@ -24,23 +27,18 @@ fail() {
     exit 1
 }
 finish() {
-    [ -z "$syslog_ng" ] || { kill "$syslog_ng" && wait "$syslog_ng"; } 2> /dev/null || true
+    end TERM "$syslog_ng"
+    end TERM "$quorlogd"
     rm -rf "$run"
 }
 trap finish EXIT
 
-# send COUNT: each message with a number of its own.
-send() {
-    for _ in $(seq "$1"); do
-        sent=$((sent + 1))
-        printf '<11>%s full-disk test: number %05d %s\n' "$(date '+%b %e %T')" "$sent" "$(printf '%0200d' 0)"
-    done > "/dev/tcp/127.0.0.1/$port"
-}
+send() { python3 scripts/send-numbered.py "$port" "$1" "$2" > /dev/null; } # NAME COUNT
 rows() { "$quorlog" count --format csv 2> /dev/null | tail -n 1 | tr -d '\r'; }
 all_stored() { [ "$(rows)" = "$sent" ]; }
 total() { "$quorlog" stats total --format csv | tail -n 1 | tr -d '\r'; }
 all_counted() {
-    pkill -USR2 -P "$syslog_ng" quorlogd
+    kill -USR2 "$quorlogd"
     [ "$(total)" = "$sent" ] && [ "$(samples)" = "$sent" ]
 }
 samples() { "$quorlog" stats eps --last 1h --format csv | awk -F, 'NR > 1 { sum += $2 } END { print sum + 0 }'; }
@@ -49,25 +47,30 @@ mkdir -p "$disk" "$build/root/usr/quor/etc"
 rm -rf "$build/root/etc/quorsyslog" "$build/root/usr/quor/etc/quorsyslog.db"*
 mount -t tmpfs -o size=48m none "$disk"
 mkdir -p "$disk/log/quorlog"
-start_syslog_ng "$run" "$port" "$db" "$build/tools/quorlogd/quorlogd"
+start_syslog_ng "$run" "$port" "$db"
+start_quorlogd "$build" "$db"
 
-send 1000
+send before 1000
+sent=1000
 await "the arrival of 1,000 messages" all_stored
 await "their accounting" all_counted
 dd if=/dev/zero of="$disk/ballast" bs=1k count=100000 2> /dev/null || true
-send 4000
-sleep 5
+send meanwhile 40000 & # more than the disk-buffer holds: the sender has to wait
+sent=$((sent + 40000))
+sleep 10
 echo "full disk: $(df --output=avail -k "$disk" | tail -n 1 | tr -d ' ') KiB free, $(rows) of $sent messages stored"
 [ "$(rows)" -lt "$sent" ] || fail "the disk was not full"
 "$quorlog" search --limit 2 > /dev/null || fail "a full disk cannot be searched"
-pkill -USR2 -P "$syslog_ng" quorlogd
+kill -USR2 "$quorlogd"
 
 rm "$disk/ballast"
-send 1
+wait %send
+send after 1
+sent=$((sent + 1))
 await "the arrival of $sent messages" all_stored
 await "their accounting" all_counted
 echo "space again: $(rows) of $sent messages stored, $(total) counted, $(samples) in the samples of the rate"
-different=$(sqlite3 "$db" "SELECT count(DISTINCT substr(msg, 1, 12)) FROM logs")
+different=$(sqlite3 "$db" "SELECT count(DISTINCT prog || msg) FROM logs")
 [ "$different" = "$sent" ] || fail "only $different messages differ"
 for file in "$db" "$disk/log/quorlog/.QUORACCOUNTDB" "$build/root/usr/quor/etc/quorsyslog.db"; do
     [ "$(sqlite3 "$file" 'PRAGMA integrity_check')" = ok ] || fail "$file is damaged"
