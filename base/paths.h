@@ -26,6 +26,8 @@ constexpr const char kSystemSettings[] = QUOR_ROOT "/etc/quorinfo.conf";
 // Service control.
 constexpr const char kPackageEnabled[] = QUOR_ROOT "/var/packages/Orvane/enabled";
 constexpr const char kReceiverPid[] = QUOR_ROOT "/run/quorlogd.pid";
+constexpr const char kReceiverValues[] = QUOR_ROOT "/etc/quorsyslog";  // receiving*.conf
+constexpr const char kReceiverControl[] = QUOR_ROOT "/var/lib/syslog-ng/syslog-ng.ctl";
 constexpr const char kRunFolder[] = QUOR_ROOT "/run";
 
 // Programs: never below QUOR_ROOT.

@@ -19,18 +19,19 @@ enum class Kind {
     Level,   // a severity's name
 };
 
-// The text of a number, kept by the caller until it is written.
-using Digits = std::array<char, 24>;
+// Columns for where there is little room, for where everything is wanted, and for both.
+enum class Shown { Always, InFull, InBrief };
 
 // One column of a table and how a record fills it.
 struct Column {
     const char* name;
     Kind kind;
-    bool brief;  // shown where there is little room
-    std::string_view (*read)(const Record& record, Digits& digits);
+    Shown shown;
+    // The text, which may be made in `scratch` and then lasts as long as that.
+    std::string_view (*read)(const Record& record, std::string& scratch);
 };
 
-std::vector<Column> ColumnsOf(const std::string& table);
+std::vector<Column> ColumnsOf(const std::string& table, bool brief);
 
 bool HasColumn(const std::string& table, _SYSLOG_DB_ATTRI_tag attribute);
 

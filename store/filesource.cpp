@@ -12,9 +12,26 @@ namespace {
 
 const std::string kNoIdentity = "file ";
 
+std::string quoted(const std::string& text) {
+    const _SYSLOG_SQL_COND_tag value{SYSLOG_ATTRI_HOST, SYSLOG_OP_EQUAL, text, {}};
+    return "'" + CondValueEscape(&value) + "'";
+}
+
+std::string rendered(const ColumnCondition& condition) {
+    std::string values;
+    for (const std::string& value : condition.values) {
+        values += (values.empty() ? "" : ", ") + quoted(value);
+    }
+    const std::string column = condition.column;
+    return condition.isPart ? "instr(" + column + ", " + values + ")" : column + " IN (" + values + ")";
+}
+
 std::string where(Conditions conditions) {
     std::string text;
-    (void)SqlCondListToStr(conditions, text);  // cannot fail
+    (void)SqlCondListToStr(conditions.attributes, text);  // cannot fail
+    for (const ColumnCondition& condition : conditions.columns) {
+        text += (text.empty() ? "" : " AND ") + rendered(condition);
+    }
     return text.empty() ? text : " WHERE " + text;
 }
 
@@ -66,9 +83,13 @@ class FileSource : public Source {
     }
 
     void remove(const Conditions& conditions) const override {
+        if (!conditions.columns.empty()) {
+            (void)Ask(path_, "DELETE FROM logs" + where(conditions), "");
+            return;
+        }
         std::string db = path_;
         Conditions doomed = conditions;
-        if (SyslogDBDelete(db, doomed) < 0) {
+        if (SyslogDBDelete(db, doomed.attributes) < 0) {
             (void)Ask(path_, "DELETE FROM logs WHERE 0", "");
             throw Failure("cannot delete from " + path_ + "; see the system log", Cause::Other);
         }

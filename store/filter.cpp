@@ -18,24 +18,48 @@ constexpr size_t kMaxPattern = 15000;  // the database refuses longer ones, brac
 // A filter of the command line: the option, its value, the column that answers it.
 struct Given {
     const char* option;
-    const std::string FilterOptions::*value;
+    std::string FilterOptions::*value;
     _SYSLOG_DB_ATTRI_tag attribute;
+    bool isName;  // cheap to look for by itself
 };
 
 constexpr Given kFilters[] = {
-    {"--host", &FilterOptions::host, SYSLOG_ATTRI_HOST},
-    {"--level", &FilterOptions::level, SYSLOG_ATTRI_LLEVEL},
-    {"--facility", &FilterOptions::facility, SYSLOG_ATTRI_FAC},
-    {"--program", &FilterOptions::program, SYSLOG_ATTRI_PROG},
-    {"--keyword", &FilterOptions::keyword, SYSLOG_ATTRI_MSG},
-    {"--glob", &FilterOptions::glob, SYSLOG_ATTRI_MSG},
-    {"--from", &FilterOptions::from, SYSLOG_ATTRI_LDATE},
-    {"--to", &FilterOptions::to, SYSLOG_ATTRI_LDATE},
+    {"--host", &FilterOptions::host, SYSLOG_ATTRI_HOST, true},
+    {"--level", &FilterOptions::level, SYSLOG_ATTRI_LLEVEL, true},
+    {"--facility", &FilterOptions::facility, SYSLOG_ATTRI_FAC, true},
+    {"--program", &FilterOptions::program, SYSLOG_ATTRI_PROG, true},
+    {"--keyword", &FilterOptions::keyword, SYSLOG_ATTRI_MSG, false},
+    {"--glob", &FilterOptions::glob, SYSLOG_ATTRI_MSG, false},
+    {"--from", &FilterOptions::from, SYSLOG_ATTRI_LDATE, false},
+    {"--to", &FilterOptions::to, SYSLOG_ATTRI_LDATE, false},
 };
 
-void checkColumns(const FilterOptions& options, const std::string& table) {
-    for (const Given& given : kFilters) {
-        if (!(options.*given.value).empty() && !HasColumn(table, given.attribute)) {
+// Those on columns that the library does not know.
+struct GivenColumn {
+    const char* option;
+    std::string FilterOptions::*value;
+    const char* column;
+    bool isPart;
+};
+
+constexpr GivenColumn kColumnFilters[] = {
+    {"--pid", &FilterOptions::pid, "pid", false},
+    {"--msgid", &FilterOptions::msgid, "msgid", false},
+    {"--sdata", &FilterOptions::sdata, "sdata", true},
+};
+
+// Only table logs, to which the columns were added, has them.
+bool hasColumn(const std::string& table, const Given& given) {
+    return HasColumn(table, given.attribute);
+}
+bool hasColumn(const std::string& table, const GivenColumn& /*given*/) {
+    return table == "logs";
+}
+
+template <typename Filters>
+void checkColumns(const Filters& filters, const FilterOptions& options, const std::string& table) {
+    for (const auto& given : filters) {
+        if (!(options.*given.value).empty() && !hasColumn(table, given)) {
             throw Failure(std::string(given.option) + ": table " + table + " has no column for it; leave it out");
         }
     }
@@ -120,16 +144,31 @@ void checkDates(const std::string& from, const std::string& to) {
 }
 
 void check(const FilterOptions& options, const std::string& table) {
-    checkColumns(options, table);
+    checkColumns(kFilters, options, table);
+    checkColumns(kColumnFilters, options, table);
     checkNames("--host", options.host);
     checkNames("--facility", options.facility);
     checkNames("--program", options.program);
+    checkNames("--pid", options.pid);
+    checkNames("--msgid", options.msgid);
     if (std::max(options.keyword.size(), options.glob.size()) > kMaxPattern) {
         throw Failure("the text to search for is too long; give at most " + std::to_string(kMaxPattern) + " bytes");
     }
     if (!comparesExactly(options.glob)) {
         throw Failure("--glob: the pattern is not UTF-8; give --keyword, which takes any bytes");
     }
+}
+
+std::list<ColumnCondition> columnConditions(const FilterOptions& options) {
+    std::list<ColumnCondition> conditions;
+    for (const GivenColumn& given : kColumnFilters) {
+        const std::string& value = options.*given.value;
+        if (!value.empty() && value != "any") {
+            conditions.push_back(
+                {given.column, given.isPart ? std::list<std::string>{value} : Tokenize(value, ","), given.isPart});
+        }
+    }
+    return conditions;
 }
 
 std::string datesInWords(const std::string& from, const std::string& to) {
@@ -159,7 +198,8 @@ Filter BuildFilter(const FilterOptions& options, const std::string& table, time_
     std::string pattern = patternOf(options);
     Filter filter;
     LogSearchCondListGen(checked.host, checked.level, checked.facility, checked.program, pattern, checked.from,
-                         checked.to, filter.conditions);
+                         checked.to, filter.conditions.attributes);
+    filter.conditions.columns = columnConditions(options);
     const bool literal = holdsWildcard(options.keyword) || !comparesExactly(options.keyword);
     filter.literal = literal ? options.keyword : "";
     return filter;
@@ -173,14 +213,17 @@ std::vector<Probe> BuildProbes(const FilterOptions& options, const std::string& 
             probes.push_back({words, std::move(conditions)});
         }
     };
-    for (const auto member :
-         {&FilterOptions::host, &FilterOptions::level, &FilterOptions::facility, &FilterOptions::program}) {
-        const auto* given = std::find_if(std::begin(kFilters), std::end(kFilters),
-                                         [&](const Given& entry) { return entry.value == member; });
+    const auto addNamed = [&](const auto& given) {
         FilterOptions alone;
-        alone.*member = options.*member;
-        add("has " + std::string(given->option) + " " + options.*member, alone);
+        alone.*given.value = options.*given.value;
+        add("has " + std::string(given.option) + " " + options.*given.value, alone);
+    };
+    for (const Given& given : kFilters) {
+        if (given.isName) {
+            addNamed(given);
+        }
     }
+    std::for_each(std::begin(kColumnFilters), std::end(kColumnFilters), addNamed);
     FilterOptions dates;
     dates.from = ParseDate(options.from, "--from", now);
     dates.to = ParseDate(options.to, "--to", now);

@@ -11,7 +11,20 @@
 
 namespace quor::store {
 
-using Conditions = std::list<_SYSLOG_SQL_COND_tag>;
+// A condition on a column that is no attribute of the library: it is one of the values, or the one value is part of it.
+struct ColumnCondition {
+    const char* column;
+    std::list<std::string> values;
+    bool isPart;
+};
+
+// All of them hold.
+struct Conditions {
+    std::list<_SYSLOG_SQL_COND_tag> attributes;
+    std::list<ColumnCondition> columns;
+
+    bool empty() const { return attributes.empty() && columns.empty(); }
+};
 
 // As a person gives them; the empty text leaves a filter out. The names of a list are separated by commas.
 struct FilterOptions {
@@ -19,6 +32,9 @@ struct FilterOptions {
     std::string level;
     std::string facility;
     std::string program;
+    std::string pid;
+    std::string msgid;
+    std::string sdata;  // a part of the structured data
     std::string keyword;
     std::string glob;
     std::string from;

@@ -17,7 +17,7 @@ Follower::Follower(const Source& source, Selection selection, Start start)
 
 void Follower::last(uint64_t rows, const RecordHandler& handler) const {
     Selection before = selection_;
-    before.filter.conditions.push_back(IdCondition(SYSLOG_OP_AT_MOST, after_));
+    before.filter.conditions.attributes.push_back(IdCondition(SYSLOG_OP_AT_MOST, after_));
     before.limit = rows;
     before.offset = 0;
     before.oldestFirst = rows == 0;  // all of them need no turning round
@@ -51,7 +51,7 @@ uint64_t Follower::look(const RecordHandler& handler) {
         return 0;
     }
     Selection arrived = selection_;
-    arrived.filter.conditions.push_back(IdCondition(SYSLOG_OP_AT_MOST, newest));
+    arrived.filter.conditions.attributes.push_back(IdCondition(SYSLOG_OP_AT_MOST, newest));
     uint64_t reached = after_;
     bool first = true;
     bool same = true;

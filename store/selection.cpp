@@ -15,8 +15,8 @@ struct Span {
 
 Conditions within(const Conditions& conditions, const Span& span) {
     Conditions both = conditions;
-    both.push_back(IdCondition(SYSLOG_OP_AT_LEAST, span.first));
-    both.push_back(IdCondition(SYSLOG_OP_AT_MOST, span.last));
+    both.attributes.push_back(IdCondition(SYSLOG_OP_AT_LEAST, span.first));
+    both.attributes.push_back(IdCondition(SYSLOG_OP_AT_MOST, span.last));
     return both;
 }
 
@@ -110,7 +110,7 @@ uint64_t Select(const Source& source, const Selection& selection, const RecordHa
 
 uint64_t SelectAfter(const Source& source, const Selection& selection, uint64_t& after, const RecordHandler& handler) {
     Conditions conditions = selection.filter.conditions;
-    conditions.push_back(IdCondition(SYSLOG_OP_ABOVE, after));
+    conditions.attributes.push_back(IdCondition(SYSLOG_OP_ABOVE, after));
     return source.read(selection.table, conditions, {kPiece, 0}, true, [&](const Record& record) {
         after = record.id;
         if (selection.filter.accepts(record)) {

@@ -11,7 +11,7 @@ std::string WhyNothing(const Source& source, const Selection& selection, const F
     if (none({})) {
         return "table " + selection.table + " is empty";
     }
-    if (below != 0 && none({IdCondition(SYSLOG_OP_BELOW, below)})) {
+    if (below != 0 && none({{IdCondition(SYSLOG_OP_BELOW, below)}, {}})) {
         return "no row has an id below " + Decimal(below);
     }
     const std::vector<Probe> probes = BuildProbes(options, selection.table, time(nullptr));

@@ -7,6 +7,7 @@
 #include <cstdint>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "platform/notify/notice.h"
 #include "platform/notify/settings.h"
@@ -15,8 +16,9 @@ namespace quor::notify {
 
 struct Channel {
     const char* name;
-    bool (*configured)(const Settings& settings);
-    // The cause of the failure; empty when it was delivered.
+    // The places that get a notice of their own, since each may fail by itself; none when the channel is not set up.
+    std::vector<std::string> (*targets)(const Settings& settings);
+    // To the notice's target. The cause of the failure; empty when it was delivered.
     std::string (*deliver)(const Settings& settings, const Notice& notice);
     const char* failure;  // what the system log says, followed by the cause
 };
@@ -24,12 +26,10 @@ struct Channel {
 constexpr size_t kChannelCount = 3;
 const std::array<Channel, kChannelCount>& Channels();
 
-// A bit for each channel that is set up.
-uint32_t ConfiguredChannels(const Settings& settings);
-// The bits of a comma list of names; unknown names are ignored.
+// A bit for each entry of Channels() in a comma list of names; unknown names are ignored.
 uint32_t ChannelsNamed(std::string_view names);
-// Delivers on the notice's channels that are (still) configured; failures go to the system log.
-void Deliver(const Notice& notice);
+// The same result as the channel's own `deliver`, without a failure when the target is not set up any more.
+std::string Deliver(const Channel& channel, const Notice& notice);
 // Log content that holds one of our own failures must not set off another notice, which would fail again.
 bool ReportsOwnFailure(const char* content);
 

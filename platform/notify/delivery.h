@@ -12,7 +12,7 @@ namespace quor::notify {
 
 std::string DeliverToDesktop(const Settings& settings, const Notice& notice);
 std::string DeliverByMail(const Settings& settings, const Notice& notice);
-std::string DeliverToWebhooks(const Settings& settings, const Notice& notice);
+std::string DeliverToWebhook(const Settings& settings, const Notice& notice);
 
 }  // namespace quor::notify
 

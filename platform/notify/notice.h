@@ -1,6 +1,6 @@
 // One notice, from its rendering to its delivery. The caller's process renders it, asks the filter, and queues it in
-// the spool; a detached worker takes it from there and delivers it. Only the spool is shared between the processes, so
-// all of them run as the same user.
+// the spool for each place that it goes to; detached workers take it from there and deliver it. Only the spool is
+// shared between the processes, so all of them run as the same user.
 #ifndef PLATFORM_NOTIFY_NOTICE_H
 #define PLATFORM_NOTIFY_NOTICE_H
 
@@ -17,7 +17,7 @@ struct Notice {
     std::string body;       // log content stands in it byte for byte, as it was received
     int64_t time = 0;
     uint32_t heldBack = 0;  // earlier notices that the filter or a full queue held back
-    uint32_t channels = 0;  // a bit for each entry of Channels()
+    std::string target;     // the one of its channel's targets that it goes to
 };
 
 }  // namespace quor::notify

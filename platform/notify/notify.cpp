@@ -1,6 +1,9 @@
 // The notification service as its callers see it.
+#include <algorithm>
 #include <ctime>
 #include <optional>
+#include <utility>
+#include <vector>
 
 #include "base/guarded.h"
 #include "platform/notify/channels.h"
@@ -15,18 +18,46 @@ namespace {
 
 constexpr int kCallerWaitsMs = 500;  // others hold the spool for far less than one, unless the system stops them
 
-enum class Outcome { Failed, NothingToDo, Deliver };
+struct Target {
+    const Channel* channel;
+    std::string name;
+};
 
-Outcome queue(const Spool& spool, Notice& notice, int32_t seconds) {
-    Interval interval(spool.ledger(), notice);
-    if (!interval.due(seconds, notice.time)) {
-        return interval.countHeldBack() ? Outcome::NothingToDo : Outcome::Failed;
+std::vector<Target> targetsOf(const Settings& settings, uint32_t channels) {
+    std::vector<Target> targets;
+    for (size_t i = 0; i < kChannelCount; ++i) {
+        for (std::string& name : Channels()[i].targets(settings)) {
+            if ((channels & 1U << i) != 0) {
+                targets.push_back({&Channels()[i], std::move(name)});
+            }
+        }
     }
-    if (spool.full()) {
-        return interval.countHeldBack() ? Outcome::Deliver : Outcome::Failed;
+    return targets;
+}
+
+// Once for each target. A queue that is full, because its server does not answer, costs the other channels nothing.
+bool put(const Spool& spool, Notice& notice, const std::vector<Target>& targets) {
+    bool done = true;
+    for (const auto& [channel, name] : targets) {
+        notice.target = name;
+        if (spool.full(channel->name)) {
+            spool.giveUp(channel->name, notice, "too many notices wait for this channel");
+        } else {
+            done = spool.put(channel->name, notice) && done;
+        }
+    }
+    return done;
+}
+
+bool queue(const Spool& spool, Notice& notice, const std::vector<Target>& targets, int32_t seconds) {
+    Interval interval(spool.ledger(), notice);
+    const bool full = std::all_of(targets.begin(), targets.end(),
+                                  [&](const Target& target) { return spool.full(target.channel->name); });
+    if (full || !interval.due(seconds, notice.time)) {
+        return interval.countHeldBack();
     }
     notice.heldBack = interval.heldBack();
-    return spool.put(notice) && interval.countSent(seconds, notice.time) ? Outcome::Deliver : Outcome::Failed;
+    return put(spool, notice, targets) && interval.countSent(seconds, notice.time);
 }
 
 int send(const std::string& tag, const char* textsDir, const char* filterFile, QLIBSZHASH* values) {
@@ -36,21 +67,31 @@ int send(const std::string& tag, const char* textsDir, const char* filterFile, Q
     }
     const std::optional<Settings> settings = LoadSettings();
     const FilterRule rule = LoadFilterRule(filterFile, tag);
-    notice->channels = settings ? ConfiguredChannels(*settings) & rule.channels : 0;
-    if (notice->channels == 0 || ReportsOwnFailure(QLIBCSzHashGetValue(values, "%SYSLOG_CONTENT%"))) {
+    const std::vector<Target> targets = settings ? targetsOf(*settings, rule.channels) : std::vector<Target>();
+    if (targets.empty() || ReportsOwnFailure(QLIBCSzHashGetValue(values, "%SYSLOG_CONTENT%"))) {
         return 0;
     }
     notice->time = time(nullptr);
-    Descriptor slot;
+    bool queued = false;
+    std::vector<Worker> workers;
     {
         const Spool spool(kCallerWaitsMs);
-        const Outcome outcome = spool ? queue(spool, *notice, rule.interval) : Outcome::Failed;
-        if (outcome != Outcome::Deliver) {
-            return outcome == Outcome::Failed ? -1 : 0;
-        }
-        slot = spool.freeSlot();
+        queued = spool && queue(spool, *notice, targets, rule.interval);
+        workers = spool ? WorkersNeeded(spool) : std::move(workers);
     }
-    return slot ? StartWorker(slot) : 0;  // no slot: the workers that hold them find the notice
+    return StartWorkers(workers) == 0 && queued ? 0 : -1;
+}
+
+int resume() {
+    std::vector<Worker> workers;
+    {
+        const Spool spool(kCallerWaitsMs);
+        if (!spool) {
+            return -1;
+        }
+        workers = WorkersNeeded(spool);
+    }
+    return StartWorkers(workers);
 }
 
 int test(void (*report)(const char*, int, const char*, void*), void* context) {
@@ -63,15 +104,13 @@ int test(void (*report)(const char*, int, const char*, void*), void* context) {
     notice.subject = "Test notice of the log server";
     notice.body = "This is a test notice of the log server. Nothing needs to be done.\n";
     notice.time = time(nullptr);
-    int tried = 0;
-    for (const Channel& channel : Channels()) {
-        if (channel.configured(*settings)) {
-            const std::string cause = channel.deliver(*settings, notice);
-            report(channel.name, cause.empty() ? 1 : 0, cause.c_str(), context);
-            ++tried;
-        }
+    const std::vector<Target> targets = targetsOf(*settings, ~0U);
+    for (const auto& [channel, name] : targets) {
+        notice.target = name;
+        const std::string cause = channel->deliver(*settings, notice);
+        report(channel->name, cause.empty() ? 1 : 0, cause.c_str(), context);
     }
-    return tried;
+    return static_cast<int>(targets.size());
 }
 
 }  // namespace
@@ -90,4 +129,20 @@ int QUORNotifyTest(void (*report)(const char* channel, int ok, const char* detai
         return -1;
     }
     return quor::Guarded([&] { return quor::notify::test(report, context); });
+}
+
+int QUORNotifyResume() {
+    return quor::Guarded([] { return quor::notify::resume(); });
+}
+
+int QUORNotifyGivenUp(void (*report)(const char* channel, const char* subject, const char* cause, void* context),
+                      void* context) {
+    if (report == nullptr) {
+        return -1;
+    }
+    return quor::Guarded([&] {
+        return quor::notify::TakeGivenUp(quor::notify::kCallerWaitsMs, [&](auto channel, auto subject, auto cause) {
+            report(channel, subject, cause, context);
+        });
+    });
 }

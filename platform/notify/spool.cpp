@@ -9,8 +9,8 @@
 #include <array>
 #include <cstring>
 #include <filesystem>
-#include <string>
-#include <vector>
+#include <fstream>
+#include <tuple>
 
 #include "base/files.h"
 #include "base/numbers.h"
@@ -20,46 +20,81 @@
 namespace quor::notify {
 namespace {
 
+// For each channel.
 constexpr size_t kMostQueued = 200;
-constexpr int kMostWorkers = 3;
+constexpr int kMostWorkers = 2;
+
 constexpr size_t kMostNoticeBytes = 131072;
-constexpr size_t kNameDigits = 20;
 constexpr size_t kFieldCount = 8;
+constexpr off_t kMostGivenUpBytes = 262144;
+
+// Within 16 hours: a server that is down overnight is worth waiting for.
+constexpr unsigned kMostTries = 16;
+constexpr int64_t kFirstWait = 30;
+constexpr int64_t kLongestWait = 7200;
+
+// The name of a queued file is its number and how often it was tried; its time is that of the last try.
+constexpr size_t kNameDigits = 20;
+constexpr size_t kTriesDigits = 2;
 
 std::string below(const std::string& name) {
     return std::string(paths::kNotifySpool) + "/" + name;
 }
 
-std::string queueFolder() {
-    return below("queue");
+constexpr const char kGivenUp[] = "given-up";
+
+std::string queueFolder(const char* channel) {
+    return below("queue/") + channel;
 }
 
-std::string queueFile(const std::string& name) {
-    return queueFolder() + "/" + name;
-}
-
-std::string nameAfter(const std::vector<std::string>& names) {
-    const std::string number = std::to_string(names.empty() ? 1 : ToUint64(names.back().c_str()) + 1);
-    return std::string(kNameDigits - number.size(), '0') + number;
+std::string padded(uint64_t number, size_t digits) {
+    const std::string text = std::to_string(number);
+    return std::string(digits - text.size(), '0') + text;
 }
 
 Descriptor openOwn(const std::string& path, int flags) {
     return Descriptor(open(path.c_str(), flags | O_CREAT | O_CLOEXEC | O_NOFOLLOW, 0600));
 }
 
-// The names of the queued files, oldest first; foreign files are left alone.
-std::vector<std::string> queued() {
-    std::vector<std::string> names;
+struct Queued {
+    uint64_t number;
+    unsigned tries;
+
+    std::string name() const { return padded(number, kNameDigits) + "." + padded(tries, kTriesDigits); }
+};
+
+std::optional<Queued> queuedAs(const std::string& name) {
+    const bool ours = name.size() == kNameDigits + 1 + kTriesDigits && name[kNameDigits] == '.' &&
+                      name.find_first_not_of("0123456789.") == std::string::npos;
+    return ours ? std::optional(Queued{ToUint64(name.substr(0, kNameDigits).c_str()),
+                                       static_cast<unsigned>(ToUint64(name.substr(kNameDigits + 1).c_str()))})
+                : std::nullopt;
+}
+
+// What waits, the least tried and oldest first; foreign files are left alone.
+std::vector<Queued> queued(const char* channel) {
+    std::vector<Queued> waiting;
     std::error_code error;
-    for (std::filesystem::directory_iterator entry(queueFolder(), error), end; entry != end && !error;
+    for (std::filesystem::directory_iterator entry(queueFolder(channel), error), end; entry != end && !error;
          entry.increment(error)) {
-        std::string name = entry->path().filename();
-        if (name.size() == kNameDigits && name.find_first_not_of("0123456789") == std::string::npos) {
-            names.push_back(std::move(name));
+        if (const std::optional<Queued> found = queuedAs(entry->path().filename())) {
+            waiting.push_back(*found);
         }
     }
-    std::sort(names.begin(), names.end());
-    return names;
+    std::sort(waiting.begin(), waiting.end(), [](const Queued& a, const Queued& b) {
+        return std::tie(a.tries, a.number) < std::tie(b.tries, b.number);
+    });
+    return waiting;
+}
+
+// Each wait is twice as long as the one before. A clock that was set back makes a notice due.
+bool isDue(const std::string& path, unsigned tries, int64_t now) {
+    struct stat last {};
+    if (tries == 0 || stat(path.c_str(), &last) != 0) {
+        return tries == 0;
+    }
+    const int64_t wait = std::min(kFirstWait << std::min(tries - 1, kMostTries), kLongestWait);
+    return now < last.st_mtime || now - last.st_mtime >= wait;
 }
 
 // No field can hold a zero byte, so one ends each.
@@ -71,7 +106,7 @@ std::string serialised(const Notice& notice) {
                                                       notice.body,
                                                       std::to_string(notice.time),
                                                       std::to_string(notice.heldBack),
-                                                      std::to_string(notice.channels)};
+                                                      notice.target};
     std::string text;
     for (const std::string& field : fields) {
         text.append(field).push_back('\0');
@@ -97,11 +132,10 @@ std::optional<Notice> parsed(const std::string& text) {
                   fields[4],
                   ToInt64(fields[5].c_str()),
                   static_cast<uint32_t>(ToUint64(fields[6].c_str())),
-                  static_cast<uint32_t>(ToUint64(fields[7].c_str()))};
+                  fields[7]};
 }
 
-std::string readNotice(const std::string& path) {
-    const Descriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK));
+std::string readWhole(const Descriptor& file) {
     std::string text(kMostNoticeBytes, '\0');
     text.resize(ReadAt(file, 0, text.data(), text.size()));
     return text;
@@ -120,10 +154,24 @@ bool lock(const Descriptor& file, int waitMs) {
     return true;
 }
 
+// Nothing when a worker has it.
+Descriptor openQueued(const std::string& path) {
+    Descriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK));
+    return file && lock(file, 0) ? std::move(file) : Descriptor();
+}
+
 }  // namespace
 
+bool Delivery::isLast() const {
+    return tries >= kMostTries;
+}
+
+void Delivery::remove() const {
+    (void)unlink(path.c_str());  // what cannot be removed is tried again
+}
+
 Spool::Spool(int waitMs) {
-    if (QUORFSMkdirP(queueFolder().c_str(), 0, 0, -1, -1, 0700) < 0) {
+    if (QUORFSMkdirP(paths::kNotifySpool, 0, 0, -1, -1, 0700) < 0) {
         return;
     }
     Descriptor ledger = openOwn(below("ledger"), O_RDWR);
@@ -132,38 +180,108 @@ Spool::Spool(int waitMs) {
     }
 }
 
-bool Spool::full() const {
-    return queued().size() >= kMostQueued;
+bool Spool::full(const char* channel) const {
+    const std::vector<Queued> waiting = queued(channel);
+    return waiting.size() >= kMostQueued && waiting.back().tries == 0;
+}
+
+// What failed most often gives way, unless it is being delivered.
+void Spool::makeRoom(const char* channel) const {
+    const std::vector<Queued> waiting = queued(channel);
+    for (auto worst = waiting.rbegin(); worst != waiting.rend() && worst->tries != 0; ++worst) {
+        const std::string path = queueFolder(channel) + "/" + worst->name();
+        const Descriptor file = openQueued(path);
+        if (file && unlink(path.c_str()) == 0) {
+            giveUp(channel, parsed(readWhole(file)).value_or(Notice()), "newer notices took its place");
+            return;
+        }
+    }
 }
 
 // Written beside and renamed: a worker never sees half a notice.
-bool Spool::put(const Notice& notice) const {
-    const std::string path = queueFile(nameAfter(queued()));
+bool Spool::put(const char* channel, const Notice& notice) const {
+    const std::vector<Queued> waiting = queued(channel);
+    if (waiting.size() >= kMostQueued) {
+        makeRoom(channel);
+    }
+    uint64_t last = 0;
+    for (const Queued& before : waiting) {
+        last = std::max(last, before.number);
+    }
+    const std::string path = queueFolder(channel) + "/" + Queued{last + 1, 0}.name();
     const std::string unfinished = below("unfinished");
     const std::string text = serialised(notice);
     const Descriptor file = openOwn(unfinished, O_WRONLY | O_TRUNC);
-    return file && WriteAll(file, text) && rename(unfinished.c_str(), path.c_str()) == 0;
+    return QUORFSMkdirP(queueFolder(channel).c_str(), 0, 0, -1, -1, 0700) >= 0 && file && WriteAll(file, text) &&
+           rename(unfinished.c_str(), path.c_str()) == 0;
 }
 
-std::optional<Notice> Spool::take() const {
-    for (const std::string& name : queued()) {
-        const std::string path = queueFile(name);
-        std::optional<Notice> notice = parsed(readNotice(path));
-        if (unlink(path.c_str()) == 0 && notice) {
-            return notice;
+// The try is counted before it is made, so that a crash while a notice is delivered cannot repeat forever.
+std::optional<Delivery> Spool::take(const char* channel, int64_t now) const {
+    const timespec stamps[] = {{static_cast<time_t>(now), 0}, {static_cast<time_t>(now), 0}};
+    for (const Queued& waiting : queued(channel)) {
+        const std::string path = queueFolder(channel) + "/" + waiting.name();
+        const Queued tried{waiting.number, waiting.tries + 1};
+        const std::string next = queueFolder(channel) + "/" + tried.name();
+        Descriptor file = isDue(path, waiting.tries, now) ? openQueued(path) : Descriptor();
+        if (!file || rename(path.c_str(), next.c_str()) != 0 || futimens(file.get(), stamps) != 0) {
+            continue;
+        }
+        std::optional<Notice> notice = parsed(readWhole(file));
+        if (notice && tried.tries <= kMostTries) {
+            return Delivery{std::move(*notice), tried.tries, next, std::move(file)};
+        }
+        (void)unlink(next.c_str());
+        if (notice) {
+            giveUp(channel, *notice, "its last delivery was broken off");
         }
     }
     return std::nullopt;
 }
 
-Descriptor Spool::freeSlot() const {
+bool Spool::isAnyDue(const char* channel, int64_t now) const {
+    const std::vector<Queued> waiting = queued(channel);
+    return std::any_of(waiting.begin(), waiting.end(), [&](const Queued& notice) {
+        return isDue(queueFolder(channel) + "/" + notice.name(), notice.tries, now);
+    });
+}
+
+Descriptor Spool::freeSlot(const char* channel) const {
     for (int i = 0; i < kMostWorkers; ++i) {
-        Descriptor slot = openOwn(below("worker" + std::to_string(i)), O_RDWR);
+        Descriptor slot = openOwn(below("worker-") + channel + std::to_string(i), O_RDWR);
         if (slot && lock(slot, 0)) {
             return slot;
         }
     }
     return Descriptor();
+}
+
+// One a line; when nobody asks for them, the file grows to its bound.
+void Spool::giveUp(const char* channel, const Notice& notice, const std::string& cause) const {
+    const Descriptor file = openOwn(below(kGivenUp), O_WRONLY | O_APPEND);
+    struct stat found {};
+    if (file && fstat(file.get(), &found) == 0 && found.st_size < kMostGivenUpBytes) {
+        (void)WriteAll(file, channel + ("\t" + notice.subject + "\t") + cause + "\n");
+    }
+}
+
+int TakeGivenUp(int waitMs, const GivenUpHandler& handler) {
+    const std::string taken = below("given-up.taken");
+    if (access(taken.c_str(), F_OK) != 0) {
+        const Spool spool(waitMs);
+        if (!spool) {
+            return -1;
+        }
+        (void)rename(below(kGivenUp).c_str(), taken.c_str());  // mostly there is none
+    }
+    std::ifstream lines(taken);
+    int count = 0;
+    for (std::string channel, subject, cause;
+         std::getline(std::getline(std::getline(lines, channel, '\t'), subject, '\t'), cause); ++count) {
+        handler(channel.c_str(), subject.c_str(), cause.c_str());
+    }
+    (void)unlink(taken.c_str());
+    return count;
 }
 
 }  // namespace quor::notify

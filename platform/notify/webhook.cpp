@@ -29,15 +29,8 @@ std::string post(const Settings& settings, const std::string& url, const std::st
 
 }  // namespace
 
-// Every address is tried; the last failure is told.
-std::string DeliverToWebhooks(const Settings& settings, const Notice& notice) {
-    const std::string json = NoticeAsJson(notice);
-    std::string cause;
-    for (const std::string& url : settings.webhookUrls) {
-        const std::string failed = post(settings, url, json);
-        cause = failed.empty() ? cause : failed;
-    }
-    return cause;
+std::string DeliverToWebhook(const Settings& settings, const Notice& notice) {
+    return post(settings, notice.target, NoticeAsJson(notice));
 }
 
 }  // namespace quor::notify

@@ -10,10 +10,10 @@
 #include <unistd.h>
 
 #include <csignal>
+#include <ctime>
 #include <optional>
 
-#include "platform/notify/channels.h"
-#include "platform/notify/spool.h"
+#include "platform/notify/oneline.h"
 
 namespace quor::notify {
 namespace {
@@ -71,52 +71,93 @@ void closeInherited(int slot) {
     closeFrom(kSlotDescriptor + 1);
 }
 
-// Finding the queue empty and giving the slot back happen under one lock: a caller that saw no free slot has its notice
-// in the queue already, and this worker finds it.
-void deliverQueue() {
+// Only the first failure and the last are told: the same one every hour helps nobody.
+void conclude(const Channel& channel, const Delivery& delivery, const std::string& cause) {
+    if (cause.empty()) {
+        delivery.remove();
+        return;
+    }
+    if (delivery.isLast() || delivery.tries == 1) {
+        syslog(LOG_ERR, "%s %s: %s; %s", channel.failure, channel.name, cause.c_str(),
+               delivery.isLast() ? "given up" : "it is tried again");
+    }
+    if (delivery.isLast()) {
+        const Spool spool(kWaitForever);
+        spool.giveUp(channel.name, delivery.notice, cause);
+        delivery.remove();
+    }
+}
+
+// Finding nothing due and giving the slot back happen under one lock: a caller that saw no free slot has its notice in
+// the queue already, and this worker finds it.
+void deliverQueue(const Channel& channel) {
     for (;;) {
-        std::optional<Notice> notice;
+        std::optional<Delivery> delivery;
         {
             const Spool spool(kWaitForever);
-            notice = spool ? spool.take() : std::nullopt;
-            if (!notice) {
+            delivery = spool ? spool.take(channel.name, time(nullptr)) : std::nullopt;
+            if (!delivery) {
                 (void)flock(kSlotDescriptor, LOCK_UN);
                 return;
             }
         }
-        Deliver(*notice);
+        conclude(channel, *delivery, OneLine(Deliver(channel, delivery->notice), 400));
     }
 }
 
-// Forked from the caller, which has no threads. An exception ends the process instead of unwinding the caller's frames,
-// and _exit leaves the caller's buffers and exit handlers alone.
-[[noreturn]] void becomeWorker(int slot) noexcept {
-    (void)setsid();
-    const pid_t worker = fork();
-    if (worker != 0) {
-        _exit(worker < 0 ? 1 : 0);
-    }
-    closeInherited(slot);
+[[noreturn]] void work(const Worker& worker) {
+    closeInherited(worker.slot.get());
     resetSignals();
     (void)umask(077);
     openlog("quornotify", LOG_PID, 0);  // in the caller's facility
     (void)prctl(PR_SET_NAME, "quornotify");
     if (chdir("/") == 0) {
-        deliverQueue();
+        deliverQueue(*worker.channel);
     }
     _exit(0);
 }
 
+// Forked from the caller, which has no threads. An exception ends the process instead of unwinding the caller's frames,
+// and _exit leaves the caller's buffers and exit handlers alone.
+[[noreturn]] void detach(const std::vector<Worker>& workers) noexcept {
+    (void)setsid();
+    int status = 0;
+    for (const Worker& worker : workers) {
+        const pid_t child = fork();
+        if (child == 0) {
+            work(worker);
+        }
+        status |= child < 0 ? 1 : 0;
+    }
+    _exit(status);
+}
+
 }  // namespace
 
-int StartWorker(const Descriptor& slot) {
+std::vector<Worker> WorkersNeeded(const Spool& spool) {
+    std::vector<Worker> workers;
+    for (const Channel& channel : Channels()) {
+        if (spool.isAnyDue(channel.name, time(nullptr))) {
+            Descriptor slot = spool.freeSlot(channel.name);
+            if (slot) {
+                workers.push_back({&channel, std::move(slot)});
+            }
+        }
+    }
+    return workers;
+}
+
+int StartWorkers(const std::vector<Worker>& workers) {
+    if (workers.empty()) {
+        return 0;
+    }
     const SignalsHeld held;
     const pid_t child = fork();
     if (child < 0) {
         return -1;
     }
     if (child == 0) {
-        becomeWorker(slot.get());
+        detach(workers);
     }
     int status = 0;
     if (waitpid(child, &status, 0) != child) {

@@ -1,14 +1,26 @@
-// The process that delivers.
+// The processes that deliver.
 #ifndef PLATFORM_NOTIFY_WORKER_H
 #define PLATFORM_NOTIFY_WORKER_H
 
+#include <vector>
+
 #include "base/guards.h"
+#include "platform/notify/channels.h"
+#include "platform/notify/spool.h"
 
 namespace quor::notify {
 
-// Starts the process that delivers the queue; negative when it cannot be started. The slot passes to it; the caller's
-// copy may be closed at once.
-int StartWorker(const Descriptor& slot);
+// A process to start: it delivers what is due of the channel's queue.
+struct Worker {
+    const Channel* channel;
+    Descriptor slot;
+};
+
+// One for each channel that has something due and a free slot.
+std::vector<Worker> WorkersNeeded(const Spool& spool);
+
+// Starts them; negative when one cannot be started. The slots pass to them; the caller's copies may be closed at once.
+int StartWorkers(const std::vector<Worker>& workers);
 
 }  // namespace quor::notify
 

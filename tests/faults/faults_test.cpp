@@ -112,7 +112,7 @@ int setRule(Place& place) {
 
 int queueNotice(Place& place) {
     const notify::Spool spool(0);
-    place.seen = spool && spool.put({}) ? "queued" : "";
+    place.seen = spool && spool.put("mail", {}) ? "queued" : "";
     return place.seen.empty() ? -1 : 0;
 }
 

@@ -114,7 +114,7 @@ TEST_F(Delivery, WebhooksGetValidJsonAndTellTheirFailures) {
     unsetenv("http_proxy");
     EXPECT_EQ(good.received(1), (Strings{"post", "application/json"}));  // comes only when it is UTF-8 and JSON
     EXPECT_EQ(good.body(1).rfind("{\"tag\":\"T\",", 0), 0U) << good.body(1);
-    EXPECT_EQ(systemLog(1)[0], "Failed to send notice. webhook: the server answered 500");
+    EXPECT_EQ(systemLog(1)[0], "Failed to send notice. webhook: the server answered 500; it is tried again");
 
     ASSERT_EQ(send({{"%SYSLOG_CONTENT%", "quorlogd: Failed to send notice. webhook"}}), 0);
     settings("webhook_url=\"file:///etc/passwd\"\n");
@@ -135,7 +135,7 @@ TEST_F(Delivery, TheCallerNeitherWaitsNorKeepsAnything) {
     const std::chrono::duration<double> passed = std::chrono::steady_clock::now() - begun;
     EXPECT_TRUE(Eventually([] {
         const std::filesystem::directory_iterator processes("/proc");
-        return std::count_if(begin(processes), end(processes), isCleanWorker) == 3;
+        return std::count_if(begin(processes), end(processes), isCleanWorker) == 2;
     }));
     EXPECT_LT(passed.count(), 1.5) << "one answer of the server takes longer than six calls";
     EXPECT_EQ(waitpid(-1, nullptr, WNOHANG), 0) << "a zombie";  // the server alone is a child
@@ -144,7 +144,80 @@ TEST_F(Delivery, TheCallerNeitherWaitsNorKeepsAnything) {
     pollfd end{ends[0], POLLIN, 0};
     EXPECT_EQ(poll(&end, 1, 1000), 1) << "a worker holds the caller's pipe";
     close(ends[0]);
-    EXPECT_EQ(server.received(6)[0], "3") << "deliveries at a time";
+    EXPECT_EQ(server.received(6)[0], "2") << "deliveries at a time";
+}
+
+TEST_F(Delivery, AFailureIsTriedAgainUntilItIsGivenUp) {
+    const auto tried = [](const char* times) {
+        return Eventually([&] {
+            const std::filesystem::directory_iterator waiting(paths::kNotifySpool + std::string("/queue/mail"));
+            return takeSlots().size() == kSlots && std::any_of(begin(waiting), end(waiting), [&](const auto& entry) {
+                       return entry.path().extension() == times;
+                   });
+        });
+    };
+    Strings givenUp;
+    const auto report = [](const char* channel, const char* subject, const char* cause, void* context) {
+        static_cast<Strings*>(context)->insert(static_cast<Strings*>(context)->end(), {channel, subject, cause});
+    };
+    const Server good("smtp good");
+    const Server stuck("smtp stuck");
+    const Server refusing("smtp refuse");
+    SetClock(1000);
+    settings(mailTo(refusing.port()));
+    ASSERT_EQ(send({{"%HOST%", "refused"}}), 0);
+    ASSERT_TRUE(tried(".01"));
+    settings(mailTo(good.port()));
+    SetClock(1029);
+    EXPECT_EQ(QUORNotifyResume(), 0);
+    SetClock(1030);
+    EXPECT_TRUE(tried(".01")) << "too early";
+    EXPECT_EQ(QUORNotifyResume(), 0);
+    EXPECT_EQ(good.body(good.received(1).empty() ? 0 : 1).substr(0, 12), "Host refused");
+
+    settings(mailTo(stuck.port()));
+    ASSERT_EQ(send({{"%HOST%", "stuck"}}), 0);
+    const std::filesystem::directory_iterator processes("/proc");
+    ASSERT_TRUE(Eventually([] {
+        const std::filesystem::directory_iterator all("/proc");
+        return std::any_of(begin(all), end(all), isCleanWorker);
+    }));
+    for (const auto& process : processes) {
+        if (isCleanWorker(process)) {
+            kill(std::stoi(process.path().filename()), SIGKILL);
+        }
+    }
+    ASSERT_TRUE(tried(".01")) << "what was on its way when its worker died is still there";
+    settings(mailTo(refusing.port()));
+    time_t now = 1030;
+    for (const char* times :
+         {".02", ".03", ".04", ".05", ".06", ".07", ".08", ".09", ".10", ".11", ".12", ".13", ".14", ".15"}) {
+        SetClock(now += 7200);
+        ASSERT_EQ(QUORNotifyResume(), 0);
+        ASSERT_TRUE(tried(times)) << times;
+    }
+    EXPECT_EQ(QUORNotifyGivenUp(report, &givenUp), 0);
+    SetClock(now + 7200);
+    ASSERT_EQ(QUORNotifyResume(), 0);
+    EXPECT_TRUE(Eventually([&] { return QUORNotifyGivenUp(report, &givenUp) == 1; }));
+    EXPECT_EQ(QUORNotifyGivenUp(report, &givenUp), 0);
+    ASSERT_EQ(givenUp.size(), 3U);
+    EXPECT_EQ(givenUp[0] + " " + givenUp[1], "mail Subject");
+    EXPECT_NE(givenUp[2].find("550"), std::string::npos);
+    EXPECT_EQ(systemLog(2).size(), 2U) << "the first failure and the last";
+}
+
+TEST_F(Delivery, AStuckChannelHoldsUpNoOther) {
+    const Server stuck("http stuck");
+    const Server mail("smtp good");
+    const std::string webhook = "webhook_url=\"http://127.0.0.1:" + stuck.port() + "\"\n";
+    settings(mailTo(mail.port(), "desktop_notify_enabled=\"yes\"\nnotify_timeout=\"3\"\n" + webhook));
+    for (int i = 0; i < 4; ++i) {
+        ASSERT_EQ(send({}), 0);
+    }
+    EXPECT_NE(mail.received(4)[0], "");
+    EXPECT_NE(awaitLines(std::string(paths::kNotifySpool) + "/desktop.jsonl", 4)[3], "");
+    EXPECT_EQ(ReadFile(folder_.path("syslog")), "") << "the webhook has not even failed yet";
 }
 
 TEST_F(Delivery, TheTestNoticeTellsTheOutcomeOfEachChannel) {

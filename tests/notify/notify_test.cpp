@@ -141,23 +141,33 @@ TEST_F(Notices, PastTheBoundOfTheQueueAreCounted) {
     ASSERT_EQ(send({}), 0);
     arrived(1);
     std::vector<Descriptor> slots;
-    ASSERT_TRUE(Eventually([&] { return (slots = takeSlots()).size() == 3; }));
-    std::ofstream(kSpool + "/queue/00000000000000000000") << "not a notice";
+    ASSERT_TRUE(Eventually([&] { return (slots = takeSlots()).size() == kSlots; }));
+    const std::string queue = kSpool + "/queue/desktop/000000000000000000";
+    std::ofstream(queue + "00.00") << "not a notice";
     const mode_t mask = umask(0);
     std::filesystem::remove(kSpool + "/ledger");
     for (int i = 0; i < 210; ++i) {
         ASSERT_EQ(send({{"%SYSLOG_CONTENT%", std::to_string(i)}}), 0);
     }
     umask(mask);
-    for (const char* name : {"", "/queue", "/ledger", "/queue/00000000000000000003"}) {
+    for (const char* name : {"", "/queue", "/queue/desktop", "/ledger", "/queue/desktop/00000000000000000003.00"}) {
         const bool folder = std::filesystem::is_directory(kSpool + name);
         EXPECT_EQ(std::filesystem::status(kSpool + name).permissions(), std::filesystem::perms{folder ? 0700U : 0600U});
     }
+    std::filesystem::rename(queue + "07.00", queue + "07.01");
+    ASSERT_EQ(send({{"%SYSLOG_CONTENT%", "new"}}), 0);
+    const auto report = [](const char* channel, const char* /*subject*/, const char* cause, void* context) {
+        *static_cast<std::string*>(context) += std::string(channel) + " " + cause;
+    };
+    std::string givenUp;
+    EXPECT_EQ(QUORNotifyGivenUp(report, &givenUp), 1);
+    EXPECT_EQ(givenUp, "desktop newer notices took its place");
     slots.clear();
     ASSERT_EQ(send({}), 0) << "held back too, but it starts a worker";
-    EXPECT_EQ(arrived(200).back()["body"].asString(), "198\n");
+    const Json::Value last = arrived(200).back();
+    EXPECT_EQ(last["body"].asString() + last["suppressed"].asString(), "new\n11");
     ASSERT_EQ(send({}), 0);
-    EXPECT_EQ(arrived(201).back()["suppressed"].asInt(), 12);
+    EXPECT_EQ(arrived(201).back()["suppressed"].asInt(), 1);
 }
 
 TEST_F(Notices, FromManyProcessesAllArrive) {

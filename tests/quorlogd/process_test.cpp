@@ -1,12 +1,17 @@
 // quorlogd as a process: it follows a database that is written, replaced and locked, and is signalled and killed.
+#include <arpa/inet.h>
+#include <sys/socket.h>
+
 #include <chrono>
 #include <random>
 
+#include "base/guards.h"
 #include "dbutil.h"
 #include "tests/support/child.h"
 
 using namespace quor::test;
 namespace paths = quor::paths;
+using quor::Descriptor;
 
 namespace {
 
@@ -201,6 +206,69 @@ TEST_F(QuorlogdProcess, OneDeviceCannotSilenceTheOthers) {
     EXPECT_TRUE(Eventually([&] { return holding("more logs that match a rule were held back: flood") == 1; }));
     EXPECT_TRUE(Eventually([&spool] { return ReadFile(spool).find("it's < a flood") != std::string::npos; }));
     std::filesystem::remove(paths::kSystemSettings);
+}
+
+// A socket that nobody reads, after `count` datagrams; what it could not take is lost.
+class Overflowing {
+  public:
+    explicit Overflowing(int count) {
+        const int least = 1;
+        const std::string datagram(500, 'x');
+        socklen_t size = sizeof address_;
+        (void)setsockopt(socket_.get(), SOL_SOCKET, SO_RCVBUF, &least, sizeof least);
+        address_.sin_family = AF_INET;
+        address_.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
+        (void)bind(socket_.get(), reinterpret_cast<sockaddr*>(&address_), sizeof address_);
+        (void)getsockname(socket_.get(), reinterpret_cast<sockaddr*>(&address_), &size);
+        for (int i = 0; i < count; ++i) {
+            (void)sendto(socket_.get(), datagram.data(), datagram.size(), 0, reinterpret_cast<sockaddr*>(&address_),
+                         sizeof address_);
+        }
+    }
+    std::string port() const { return std::to_string(ntohs(address_.sin_port)); }
+
+  private:
+    Descriptor socket_{socket(AF_INET, SOCK_DGRAM | SOCK_CLOEXEC, 0)};
+    sockaddr_in address_{};
+};
+
+TEST_F(QuorlogdProcess, TellsWhatWasDroppedOnceAndWhatWaits) {
+    const TempFolder folder;
+    const auto answer = [&folder](int dropped, int queued, int written) {
+        const std::string line = "dst.sql;d_quor_database#0;sqlite3,,,a;b,logs;a;";
+        folder.write("next", "dst.sql;other#0;;a;dropped;9\n" + line + "dropped;" + std::to_string(dropped) + "\n" +
+                                 line + "queued;" + std::to_string(queued) + "\n" + line + "written;" +
+                                 std::to_string(written) + "\n.\n");
+        std::filesystem::rename(folder.path("next"), folder.path("answer"));
+    };
+    const auto has = [](const std::string& begin, const std::string& end) {
+        return Eventually([&] {
+            const Strings all = events();
+            return std::count_if(all.begin(), all.end(), [&](const std::string& event) {
+                       return event.find(begin) != std::string::npos && event.find(end) != std::string::npos;
+                   }) == 1;
+        });
+    };
+    answer(5, 0, 10);
+    const Overflowing udp(100);
+    const Child control("/usr/bin/python3 " SOURCE_FOLDER "/tests/quorlogd/control.py " + folder.path("ctl") + " " +
+                        folder.path("answer"));
+    ASSERT_TRUE(Eventually([&] { return std::filesystem::exists(folder.path("ctl")); }));
+    const std::string options = "--check-interval 1 --udp-port " + udp.port() + " --control " + folder.path("ctl");
+    {
+        Quorlogd daemon(options);
+        EXPECT_TRUE(has("messages were dropped since the start of syslog-ng: 9", ", 5 that syslog-ng could not keep"))
+            << testing::PrintToString(events());
+        EXPECT_EQ(daemon.endOf(SIGKILL), -1);
+    }
+    answer(8, 7, 10);
+    Quorlogd daemon(options);
+    EXPECT_TRUE(has("[3] messages were dropped since 2", ": 0 that")) << testing::PrintToString(events());
+    EXPECT_TRUE(has("The log database takes no messages since ", ", [7] wait"));
+    usleep(2500000);
+    answer(8, 9, 11);
+    EXPECT_TRUE(has("The log database takes messages again", ""));
+    EXPECT_EQ(events().size(), 4U) << testing::PrintToString(events());
 }
 
 TEST_F(QuorlogdProcess, RaisesAFullVolumeOnceAndKeepsTheEventLogSmall) {

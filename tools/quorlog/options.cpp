@@ -58,6 +58,9 @@ void AddFilterOptions(CLI::App& command, store::FilterOptions& filters) {
     addList(command, "--level", filters.level, "Levels, such as err,crit; err+ is err and worse");
     addList(command, "--facility", filters.facility, "Facilities, such as kern,auth");
     addList(command, "--program", filters.program, "Programs");
+    addList(command, "--pid", filters.pid, "Process ids");
+    addList(command, "--msgid", filters.msgid, "Message ids (RFC 5424)");
+    addFilter(command, "--sdata", filters.sdata, "TEXT", "Structured data that contains the text (RFC 5424)");
     CLI::Option* keyword = addFilter(command, "--keyword", filters.keyword, "TEXT", "Messages that contain the text");
     addFilter(command, "--glob", filters.glob, "PATTERN",
               "Messages like this as a whole; * is any text, ? any character")

@@ -22,7 +22,7 @@ class RecordSink {
 
   private:
     std::vector<store::Column> fields_;
-    std::vector<store::Digits> digits_;
+    std::vector<std::string> scratch_;
     Cells cells_;
     std::unique_ptr<RowSink> sink_;
 };

@@ -10,6 +10,7 @@
 #include <utility>
 
 #include "logger.h"
+#include "tools/quorlogd/deliveries.h"
 
 namespace quor {
 namespace {
@@ -38,7 +39,8 @@ Descriptor OpenSignals() {
 }
 
 Daemon::Daemon(const Options& options, Descriptor signals)
-    : options_(options), signals_(std::move(signals)), watch_(options.db), receiver_(options), housekeeping_(options) {
+    : options_(options), signals_(std::move(signals)), watch_(options.db), receiver_(options), housekeeping_(options),
+      losses_(options) {
     nextTick_ = nextCheck_ = Clock::now();
     nextFlush_ = nextTick_ + seconds(options.flushSeconds);
 }
@@ -104,12 +106,15 @@ void Daemon::runTimers() {
     nextTick_ = now + seconds(1);
     receiver_.tick();
     if (now >= nextFlush_) {
+        ResumeDeliveries();
         const bool written = receiver_.flush();
         nextFlush_ = Clock::now() + (written ? seconds(options_.flushSeconds) : kRetryFlush);
     }
     if (now >= nextCheck_) {
         housekeeping_.check();
+        losses_.check();
         receiver_.announceHeldBack();
+        RecordGivenUp();
         nextCheck_ = Clock::now() + seconds(options_.checkSeconds);
     }
 }

@@ -6,6 +6,7 @@
 
 #include "base/guards.h"
 #include "tools/quorlogd/housekeeping.h"
+#include "tools/quorlogd/losses.h"
 #include "tools/quorlogd/options.h"
 #include "tools/quorlogd/receiver.h"
 #include "tools/quorlogd/watch.h"
@@ -41,6 +42,7 @@ class Daemon {
     FolderWatch watch_;
     Receiver receiver_;
     Housekeeping housekeeping_;
+    Losses losses_;
     Clock::time_point nextTick_;
     Clock::time_point nextFlush_;
     Clock::time_point nextCheck_;

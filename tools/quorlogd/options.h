@@ -13,6 +13,8 @@ struct Options {
     std::string db = paths::kWorkingDb;
     unsigned flushSeconds = 10;
     unsigned checkSeconds = 60;
+    std::string control = paths::kReceiverControl;  // of syslog-ng; empty: not asked
+    unsigned udpPort = 0;
     unsigned noticesPerMinute = 60;
     size_t maxDevices = 20000;
     unsigned long long maxWaiting = 200000;  // counts of devices in samples that could not be written

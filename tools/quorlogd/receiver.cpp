@@ -13,6 +13,7 @@
 #include "logger.h"
 #include "store/ask.h"
 #include "store/failure.h"
+#include "tools/quorlogd/announce.h"
 #include "tools/quorlogd/noticetext.h"
 
 namespace quor {
@@ -48,7 +49,8 @@ int64_t secondOf(const store::Record& record) {
 // What a person wants to see of a match.
 std::string contentOf(const store::Record& record) {
     const std::string program = record.prog + (record.pid.empty() ? "" : "[" + record.pid + "]");
-    return FitForNotice(record.ldate + " " + record.ltime + " " + program + ": " + record.msg);
+    const std::string data = record.sdata.empty() || record.sdata == record.msg ? "" : " " + record.sdata;
+    return FitForNotice(record.ldate + " " + record.ltime + " " + program + ": " + record.msg + data);
 }
 
 // The filter's least seconds between two notices of a kind.
@@ -143,9 +145,20 @@ void Receiver::take(const store::Record& record) {
     }
 }
 
+// A number, such as the process id, would match too much.
+std::string Receiver::keywordIn(const store::Record& record) {
+    for (const std::string* text : {&record.msg, &record.msgid, &record.sdata}) {
+        std::string keyword = rules_.CheckKeyword(*text);
+        if (!keyword.empty()) {
+            return keyword;
+        }
+    }
+    return "";
+}
+
 void Receiver::judge(const store::Record& record, const std::string& device) {
     const bool severe = rules_.CheckSev(record.prio);
-    const std::string keyword = rules_.CheckKeyword(record.msg);
+    const std::string keyword = keywordIn(record);
     if ((!severe && keyword.empty()) || isOwnLog(record)) {
         return;
     }
@@ -210,13 +223,8 @@ void Receiver::announceHeldBack() {
         devices += (i == 0 ? "" : ", ") + counts[i].first + " (" + Decimal(counts[i].second) + ")";
     }
     devices += counts.size() > kNamed ? ", ..." : "";
-    const std::string text = "[" + Decimal(total) + "] more logs that match a rule were held back: " + devices;
-    (void)Logger().LogAdd(paths::kEventDb, 1, "SYSTEM", EventText("Event detection: " + text));
-    StringTable values(QLIBCSzHashAlloc(16));
-    (void)QLIBCSzHashSetValue(Adopt(values), "%COUNT%", Decimal(total).c_str());
-    (void)QLIBCSzHashSetValue(Adopt(values), "%DEVICES%", devices.c_str());
-    char tag[] = "QUORSYSLOG_HELD_BACK";
-    (void)rules_.NotificationSend(tag, Adopt(values));  // reports its own failure
+    RecordEvent("[" + Decimal(total) + "] more logs that match a rule were held back: " + devices);
+    SendNotice("QUORSYSLOG_HELD_BACK", {{"%COUNT%", Decimal(total)}, {"%DEVICES%", devices}});
 }
 
 std::string Receiver::statistics() const {

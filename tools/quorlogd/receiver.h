@@ -36,6 +36,7 @@ class Receiver {
   private:
     uint64_t start(const std::string& identity);
     void take(const store::Record& record);
+    std::string keywordIn(const store::Record& record);
     void judge(const store::Record& record, const std::string& device);
     void report(const std::string& trouble);
 

@@ -11,8 +11,10 @@ extern "C" {
 #pragma GCC visibility push(default)
 
 /* Renders the template "<textsDir>/<tag>.txt" with the values of the table, applies the filter file, and hands the
- * notice to the configured channels. Delivery goes on in a process of its own: the call never waits for a server, and 0
- * says that the notice was accepted (or held back by the filter or a full queue, and counted), not that it arrived.
+ * notice to the configured channels. Delivery goes on in processes of its own, one for each channel: the call never
+ * waits for a server, and 0 says that the notice was accepted (or held back by the filter or a full queue, and
+ * counted), not that it arrived. A delivery that fails is tried again, 16 times within 16 hours, with the next notice
+ * or QUORNotifyResume() after its wait.
  * "%SYSLOG_CONTENT%" is taken as escaped for JSON and shown as it was before. `flags` is not used. Negative for a
  * template that is missing or has no subject, and when delivery cannot be started. The caller forks: it should have no
  * other threads. */
@@ -32,9 +34,19 @@ typedef struct QUORMAIL_tag {
 } QUORMAIL;
 
 /* Delivers a test notice on every configured channel, past the filter and the queue, and waits for each. `report` hears
- * of each one: its name, 1 or 0, and the cause of a failure (else empty). The number of channels that were tried,
- * negative when the settings cannot be read. */
+ * of each mail server, desktop and webhook: the channel's name, 1 or 0, and the cause of a failure (else empty). Their
+ * number, negative when the settings cannot be read. */
 int QUORNotifyTest(void (*report)(const char* channel, int ok, const char* detail, void* context), void* context);
+
+/* Starts the deliveries whose time to be tried again has come. To be called every few seconds by a process that is
+ * always there, so that they also go on after a restart. Negative when the spool cannot be used. */
+int QUORNotifyResume(void);
+
+/* Hands over the notices that were given up since the last call: a channel, the subject of the notice, and the cause of
+ * the last failure, each one line of UTF-8. One process should ask. The number of notices, negative when the spool
+ * cannot be used. */
+int QUORNotifyGivenUp(void (*report)(const char* channel, const char* subject, const char* cause, void* context),
+                      void* context);
 
 /* Fills `mail` from the settings; a key that is absent leaves its default. Negative when they cannot be read. */
 int QUORMailGet(QUORMAIL* mail);

@@ -63,7 +63,7 @@ store::Selection selectionOf(const SearchOptions& options) {
     selection.oldestFirst = options.oldest;
     selection.limit = options.limit;
     if (options.before != 0) {
-        selection.filter.conditions.push_back(store::IdCondition(SYSLOG_OP_BELOW, options.before));
+        selection.filter.conditions.attributes.push_back(store::IdCondition(SYSLOG_OP_BELOW, options.before));
     }
     return selection;
 }
