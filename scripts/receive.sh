@@ -13,7 +13,8 @@ await() {
 }
 listening() { (exec 3<> "/dev/tcp/127.0.0.1/$1") 2> /dev/null; }
 
-# start_syslog_ng FOLDER PORT DATABASE: its process is then in $syslog_ng, its messages in $syslog_ng_log. Started again
+# start_syslog_ng FOLDER PORT DATABASE: its process is then in $syslog_ng, its messages in $syslog_ng_log, its control
+# socket in $syslog_ng_control. Started again
 # in the same folder it goes on with what waits there. $buffer_size and $buffer_folder may be set.
 start_syslog_ng() {
     local buffer=${buffer_folder:-$1/buffer} size=${buffer_size:-268435456}
@@ -30,7 +31,7 @@ start_syslog_ng() {
 CONF
     sed "s|/etc/quorsyslog/receiving|$1/receiving|" etc/syslog-ng/quorsyslog.conf > "$1/quorsyslog.conf"
     printf '@version: 3.38\n@include "%s"\n' "$1/quorsyslog.conf" > "$1/syslog-ng.conf"
-    syslog_ng_log=$1/syslog-ng.log
+    syslog_ng_log=$1/syslog-ng.log syslog_ng_control=$1/ctl syslog_ng_port=$2
     /usr/sbin/syslog-ng -F -e --no-caps -f "$1/syslog-ng.conf" --persist-file "$1/persist" --control "$1/ctl" \
         --pidfile "$1/pid" >> "$syslog_ng_log" 2>&1 &
     syslog_ng=$!
@@ -41,7 +42,8 @@ CONF
 # start_quorlogd BUILD DATABASE: its process is then in $quorlogd, its messages in BUILD/root/run/quorlogd.log.
 start_quorlogd() {
     mkdir -p "$1/root/run"
-    "$1/tools/quorlogd/quorlogd" --db "$2" --stderr >> "$1/root/run/quorlogd.log" 2>&1 &
+    "$1/tools/quorlogd/quorlogd" --db "$2" --control "${syslog_ng_control:-}" --udp-port "${syslog_ng_port:-514}" \
+        --check-interval "${check_interval:-60}" --stderr >> "$1/root/run/quorlogd.log" 2>&1 &
     quorlogd=$!
     await "the start of quorlogd" grep -q "^quorlogd\[$quorlogd\]: Started" "$1/root/run/quorlogd.log"
 }

@@ -1,5 +1,5 @@
 #!/usr/bin/env bash
-# The receiving chain under bursts, locks, kills and restarts. After each trial every stored row must be counted once; what
+# The receiving chain under bursts, locks, kills, restarts, floods and damage. After each trial every stored row must be counted once; what
 # was lost on the way to the database, or stored twice, is told.
 # Usage: try-faults.sh BUILD_FOLDER [KILLS [LOCK_SECONDS [BURST]]]     KEEP=1: leave the data for a look
 # ONLY="NAME..." runs those trials alone.
@@ -15,6 +15,8 @@ port=${QUOR_FAULTS_PORT:-15914}
 root=$build/root
 db=$root/var/log/quorlog/syslog.db
 accounting=$root/var/log/quorlog/.QUORACCOUNTDB
+events=$root/usr/quor/etc/quorsyslog.db
+check_interval=5
 run=$(mktemp -d /tmp/quor-faults-XXXXXX)
 syslog_ng=
 quorlogd=
@@ -32,7 +34,10 @@ finish() {
 }
 trap finish EXIT
 
-start() { start_syslog_ng "$run" "$port" "$db"; }
+start() {
+    start_syslog_ng "$run" "$port" "$db"
+    echo "$syslog_ng" > "$root/run/syslog-ng.pid"  # where the library looks for it
+}
 follow() { start_quorlogd "$build" "$db"; }
 ask() { sqlite3 -readonly "$1" '.timeout 10000' "$2" 2> /dev/null; }
 now() { date +%s%N; }
@@ -116,6 +121,50 @@ try_unreadable_counts() {
     report "counts unreadable at the start, then put back"
 }
 
+# Datagrams as fast as one sender makes them: each is stored, or told as dropped.
+try_udp() {
+    local sent=200000 stored told
+    python3 -c 'import socket, sys
+sender = socket.socket(socket.AF_INET, socket.SOCK_DGRAM)
+for i in range(int(sys.argv[2])):
+    sender.sendto(b"<13>Nov 21 10:00:00 host udp: number %09d %s" % (i, b"x" * 120), ("127.0.0.1", int(sys.argv[1])))' "$port" $sent
+    await "the end of $trial" quiet
+    stored=$(of_trial 'count(DISTINCT msg)')
+    told_all() {
+        told=$(ask "$events" "SELECT ifnull(sum(substr(event, instr(event, '[') + 1)), 0) FROM log WHERE event LIKE '%messages were dropped%'")
+        [ $((stored + told)) = $sent ]
+    }
+    await "word of what was dropped" told_all
+    await "the accounting of $trial" counted
+    printf '%-16s %9d %9d %7d %7d %9d  %s\n' "$trial" $sent "$stored" $((sent - stored)) 0 "$(total)" "$told told as dropped"
+}
+
+# Pages of the database are overwritten while messages arrive: it is moved aside, and what it held can be saved.
+try_damage() {
+    local before aside=$db.corrupt
+    before=$(total)
+    send 60000 1 3000 &
+    sleep 8
+    python3 -c 'import os, sys
+file = os.open(sys.argv[1], os.O_WRONLY)
+os.pwrite(file, b"\xa5" * 262144, 16384)' "$db"
+    await "the end of the damaged database" test -f "$aside"
+    wait %send
+    await "the end of $trial" quiet
+    all_counted() { kill -USR2 "$quorlogd" && [ $(($(total) - before)) -ge "$(rows)" ]; }
+    await "the accounting of $trial" all_counted
+    "$build/tools/quorlog/quorlog" db salvage "$aside" "$run/saved.db" > /dev/null
+    python3 -c 'import sqlite3, sys
+texts, counts = set(), []
+for path in sys.argv[2:]:
+    rows = [row[0] for row in sqlite3.connect(path).execute("SELECT msg FROM logs WHERE prog = ?", [sys.argv[1]])]
+    counts.append(len(rows))
+    texts.update(rows)
+print(f"{sys.argv[1]:16} {60000:9} {sum(counts):9} {60000 - len(texts):7} {sum(counts) - len(texts):7}            {counts[0]} saved, {counts[1]} in the new one")' \
+        "$trial" "$run/saved.db" "$db"
+    echo "                 $(($(total) - before)) of them counted"
+}
+
 # try NAME COMMAND...
 try() {
     trial=$1
@@ -124,7 +173,7 @@ try() {
 }
 
 rm -rf "$root/var/log/quorlog" "$root/etc/quorsyslog" "$root/usr/quor/etc" "$root/run"
-mkdir -p "$root/var/log/quorlog" "$root/etc/quorsyslog" "$root/usr/quor/etc"
+mkdir -p "$root/var/log/quorlog" "$root/etc/quorsyslog" "$root/usr/quor/etc" "$root/run"
 start
 follow
 printf '%-16s %9s %9s %7s %7s %9s\n' trial sent stored lost twice counted
@@ -134,10 +183,12 @@ try "lock-${lock_seconds}s" try_lock
 try kill-quorlogd try_ends KILL quorlogd
 try stop-quorlogd try_ends TERM quorlogd
 try unreadable try_unreadable_counts
+try udp try_udp
 lossless=
 try kill-syslog-ng try_ends KILL syslog-ng
 try kill-both try_ends KILL both
 try stop-syslog-ng try_ends TERM syslog-ng
+try damage try_damage
 [ "$(ask "$db" 'PRAGMA integrity_check')" = ok ] || fail "the log database is damaged"
 echo "$(rows) rows, $(total) counted, $(samples) in the samples of the rate"
 [ "$status" = 0 ] || fail "messages were lost, stored twice or not counted where that must not happen"

@@ -163,6 +163,28 @@ TEST_F(QuorlogdProcess, NoticesReplacedAndRestoredDatabases) {
         << "rows of a copy were counted before: " << testing::PrintToString(totals());
 }
 
+TEST_F(QuorlogdProcess, MovesADamagedDatabaseAside) {
+    store(3000);
+    SqliteFile(paths::kWorkingDb).run("PRAGMA wal_checkpoint(TRUNCATE)");
+    Quorlogd daemon;
+    ASSERT_TRUE(counts(3000));
+    const auto damage = [](uintmax_t at, size_t size) {
+        std::fstream(paths::kWorkingDb, std::ios::in | std::ios::out | std::ios::binary).seekp(static_cast<off_t>(at))
+            << std::string(size, '\xA5');
+    };
+    for (const char* total : {"6000", "9000"}) {
+        const bool header = total[0] == '6';
+        damage(header ? 0 : std::filesystem::file_size(paths::kWorkingDb) - 65536, 65536);
+        EXPECT_TRUE(Eventually([] { return !std::filesystem::exists(paths::kWorkingDb); })) << daemon.messages();
+        createLogs();
+        store(3000);
+        EXPECT_TRUE(Eventually([&] { return totals() == (Strings{"3000", total, total}); }));
+        SqliteFile(paths::kWorkingDb).run("PRAGMA wal_checkpoint(TRUNCATE)");
+    }
+    EXPECT_EQ(events().size(), 2U) << testing::PrintToString(events());
+    EXPECT_TRUE(std::filesystem::exists(paths::kWorkingDb + std::string(".corrupt")));
+}
+
 // It kept no position, and no identity of the database.
 TEST_F(QuorlogdProcess, CarriesOnTheCountsOfAFormerVersion) {
     store(50);

@@ -10,6 +10,7 @@
 #include "base/numbers.h"
 #include "base/paths.h"
 #include "common/handles.h"
+#include "dbhandler.h"
 #include "logger.h"
 #include "store/ask.h"
 #include "store/failure.h"
@@ -117,12 +118,32 @@ bool Receiver::takeRows() {
             (void)flush();  // so that a crash repeats no notice
         }
         report("");
+        damagedLooks_ = 0;
         caughtUp_ = !more;
         return more;
     } catch (const Failure& failure) {
         report(failure.what());
+        if (failure.cause() == Cause::Damaged) {
+            replaceDamaged();
+        }
         return false;
     }
+}
+
+// syslog-ng cannot write it either: what it receives waits until there is a new one. A database that is just being put
+// in place may look damaged for a moment.
+void Receiver::replaceDamaged() {
+    constexpr unsigned kSureAfter = 3;
+    constexpr unsigned kAgainAfter = 60;
+    if (++damagedLooks_ % kAgainAfter != kSureAfter) {
+        return;
+    }
+    (void)DBErrorHandle_SQLITE_CORRUPT(nullptr,
+                                       options_.db);  // announces it; syslog-ng finds the new one by itself, too
+    const std::string aside = options_.db + ".corrupt";
+    RecordEvent(QLIBCFileExist(options_.db.c_str()) == 0 && QLIBCFileExist(aside.c_str()) != 0
+                    ? "The log database was damaged: it is kept as " + aside + ", and a new one begins"
+                    : "The log database is damaged, and could not be moved aside: " + options_.db);
 }
 
 // Once for each trouble, not with every look.

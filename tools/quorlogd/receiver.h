@@ -39,6 +39,7 @@ class Receiver {
     std::string keywordIn(const store::Record& record);
     void judge(const store::Record& record, const std::string& device);
     void report(const std::string& trouble);
+    void replaceDamaged();
 
     struct Counters {
         uint64_t rows = 0;
@@ -56,6 +57,7 @@ class Receiver {
     bool matched_ = false;           // since the position was written
     bool caughtUp_ = false;
     std::string trouble_;  // reported last
+    unsigned damagedLooks_ = 0;
     Counters counters_;
 };
 
