@@ -94,6 +94,7 @@ TEST(IsNotificationSet, AsksEveryChannelUntilOneCannotBeRead) {
     const std::tuple<std::string, const char*, int, std::string> cases[] = {
         {"yes no no no", "a@b", 0, "1 "},
         {"yes no no no", "", 0, "0 "},
+        {"yes no no no", "a", 0, "1 "},
         {"yes,please no no no", "a@b", 0, "0 "},
         {"no yes no no", "a@b", 0, "1 "},
         {"no no yes no", "a@b", 0, "1 "},

@@ -176,6 +176,9 @@ TEST_F(Sections, ReadsWhatPeopleWrite) {
     for (const auto& [text, expected] : cases) {
         EXPECT_EQ(value(folder_.write("file", text), "s", "k"), expected) << text;
     }
+    QLIBSZLIST* list = QLIBCSzListAlloc(4);
+    EXPECT_EQ(QLIBCFileEnumSection(folder_.write("file", "[a]").c_str(), &list), 0);
+    QLIBCSzListFree(list);
     EXPECT_EQ(names(folder_.write("file", "[b]\n[a]c]\nx=1\n[b]\n[broken\n[]\n [ d]")), Strings({"b", "a]c", " d"}));
 }
 

@@ -21,7 +21,8 @@ std::string replaced(std::string text, const std::string& what, const std::strin
 class Session : public testing::TestWithParam<std::string> {
   protected:
     std::string outcome(const std::string& command) const {
-        const std::string script = aside_.write("script", "quorlog() { $QUORLOG \"$@\"; }\n" + command + "\n");
+        const std::string script = aside_.write(
+            "script", "quorlog() { $QUORLOG \"$@\"; }; quorlogd() { $QUORLOGD \"$@\"; }\n" + command + "\n");
         const std::string streams = " >" + aside_.path("out") + " 2>" + aside_.path("err") + " </dev/null";
         const int status = system(("cd " + folder_.path() + " && sh " + script + streams).c_str());
         std::string text = ReadFile(aside_.path("out"));
@@ -40,6 +41,7 @@ class Session : public testing::TestWithParam<std::string> {
 TEST_P(Session, PrintsWhatIsWritten) {
     setenv("TZ", "UTC", 1);
     setenv("QUORLOG", QUORLOG, 1);
+    setenv("QUORLOGD", QUORLOGD, 1);
     setenv("ROOT", QUOR_ROOT, 1);
     setenv("SOURCE", SOURCE_FOLDER, 1);
     const std::string path = SOURCE_FOLDER "/tests/quorlog/sessions/" + GetParam() + ".txt";
@@ -59,8 +61,8 @@ TEST_P(Session, PrintsWhatIsWritten) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Quorlog, Session,
-                         testing::Values("databases", "events", "failures", "forms", "help", "parse", "rules", "search",
-                                         "statistics", "terminal"),
+                         testing::Values("daemon", "databases", "events", "failures", "forms", "help", "parse", "rules",
+                                         "search", "statistics", "terminal"),
                          [](const auto& test) { return test.param; });
 
 }  // namespace
