@@ -131,7 +131,7 @@ for i in range(int(sys.argv[2])):
     await "the end of $trial" quiet
     stored=$(of_trial 'count(DISTINCT msg)')
     told_all() {
-        told=$(ask "$events" "SELECT ifnull(sum(substr(event, instr(event, '[') + 1)), 0) FROM log WHERE event LIKE '%messages were dropped%'")
+        told=$(ask "$events" "SELECT ifnull(sum(CAST(substr(event, instr(event, '[') + 1) AS INTEGER)), 0) FROM log WHERE event LIKE '%messages were dropped%'")
         [ $((stored + told)) = $sent ]
     }
     await "word of what was dropped" told_all

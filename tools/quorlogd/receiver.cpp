@@ -1,5 +1,6 @@
 #include "tools/quorlogd/receiver.h"
 
+#include <sys/stat.h>
 #include <sys/statvfs.h>
 #include <syslog.h>
 
@@ -59,6 +60,12 @@ int32_t intervalOf(const char* kind) {
     StringTable section(QLIBCSzHashAlloc(16));
     const bool read = QLIBCFileGetSection(paths::kNotifyFilter, kind, Adopt(section)) >= 0;
     return read ? ToInt32(QLIBCSzHashGetValue(section.get(), "interval")) : 0;
+}
+
+// 0 when there is no such file.
+ino_t inodeOf(const std::string& path) {
+    struct stat found {};
+    return stat(path.c_str(), &found) == 0 ? found.st_ino : 0;
 }
 
 // Whether a former version counted rows, and kept no position.
@@ -131,17 +138,22 @@ bool Receiver::takeRows() {
 }
 
 // syslog-ng cannot write it either: what it receives waits until there is a new one. A database that is just being put
-// in place may look damaged for a moment.
+// in place may look damaged for a moment. Its companions go along: rows in them can be saved, and the new one must not
+// find them.
 void Receiver::replaceDamaged() {
     constexpr unsigned kSureAfter = 3;
     constexpr unsigned kAgainAfter = 60;
     if (++damagedLooks_ % kAgainAfter != kSureAfter) {
         return;
     }
-    (void)DBErrorHandle_SQLITE_CORRUPT(nullptr,
-                                       options_.db);  // announces it; syslog-ng finds the new one by itself, too
     const std::string aside = options_.db + ".corrupt";
-    RecordEvent(QLIBCFileExist(options_.db.c_str()) == 0 && QLIBCFileExist(aside.c_str()) != 0
+    const ino_t damaged = inodeOf(options_.db);
+    for (const char* companion : {"-wal", "-shm"}) {
+        (void)remove((aside + companion).c_str());
+        (void)rename((options_.db + companion).c_str(), (aside + companion).c_str());
+    }
+    (void)DBErrorHandle_SQLITE_CORRUPT(nullptr, options_.db);  // reports its own failures
+    RecordEvent(damaged != 0 && inodeOf(aside) == damaged
                     ? "The log database was damaged: it is kept as " + aside + ", and a new one begins"
                     : "The log database is damaged, and could not be moved aside: " + options_.db);
 }
