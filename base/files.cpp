@@ -4,9 +4,9 @@
 
 namespace quor {
 
-bool WriteAll(const Descriptor& file, std::string_view bytes) {
+bool WriteAll(int file, std::string_view bytes) {
     while (!bytes.empty()) {
-        const ssize_t written = write(file.get(), bytes.data(), bytes.size());
+        const ssize_t written = write(file, bytes.data(), bytes.size());
         if (written < 0 && errno != EINTR) {
             return false;
         }

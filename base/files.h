@@ -11,7 +11,7 @@
 namespace quor {
 
 // False, with the cause in errno, when not everything could be written.
-bool WriteAll(const Descriptor& file, std::string_view bytes);
+bool WriteAll(int file, std::string_view bytes);
 
 // The number of bytes read; fewer than `size` at the end of the file or where it cannot be read.
 size_t ReadAt(const Descriptor& file, uint64_t offset, void* out, size_t size);

@@ -139,6 +139,21 @@ for i in range(int(sys.argv[2])):
     printf '%-16s %9d %9d %7d %7d %9d  %s\n' "$trial" $sent "$stored" $((sent - stored)) 0 "$(total)" "$told told as dropped"
 }
 
+# From the reception of a message to the notice about it, at 1,000 messages a second.
+try_delay() {
+    local count=50
+    echo "webhook_url=\"http://127.0.0.1:$((port + 2))\"" > "$root/etc/quorinfo.conf"
+    printf '[rule]\nnotify_type="2"\nnotify_pri="0"\nnotify_eps="0"\nnotify_pat="tell me"\nnotify_enable="1"\n' \
+        > "$root/etc/quorsyslog/notify.conf"
+    kill -HUP "$quorlogd"
+    send $((count * 1000)) 1 1000 &
+    python3 scripts/notice-delay.py "$port" $((port + 2)) "tell me" $count > "$run/delay" || status=1
+    wait %send
+    rm "$root/etc/quorinfo.conf" "$root/etc/quorsyslog/notify.conf"
+    kill -HUP "$quorlogd"
+    report "$(cat "$run/delay")"
+}
+
 # Pages of the database are overwritten while messages arrive: it is moved aside, and what it held can be saved.
 try_damage() {
     local before aside=$db.corrupt
@@ -184,6 +199,7 @@ try kill-quorlogd try_ends KILL quorlogd
 try stop-quorlogd try_ends TERM quorlogd
 try unreadable try_unreadable_counts
 try udp try_udp
+try delay try_delay
 lossless=
 try kill-syslog-ng try_ends KILL syslog-ng
 try kill-both try_ends KILL both

@@ -97,11 +97,10 @@ std::vector<Column> ColumnsOf(const std::string& table, bool brief) {
     return columns;
 }
 
-bool HasColumn(const std::string& table, _SYSLOG_DB_ATTRI_tag attribute) {
-    if (table == "logs" && attribute == SYSLOG_ATTRI_LLEVEL) {
+bool HasColumn(const std::string& table, std::string_view name) {
+    if (table == "logs" && name == "llevel") {
         return true;  // a second name of prio, there for the search
     }
-    const std::string_view name = LogAttriStrGet(attribute);
     const std::vector<Column> columns = ColumnsOf(table, false);
     return std::any_of(columns.begin(), columns.end(), [name](const Column& column) { return column.name == name; });
 }

@@ -33,7 +33,7 @@ struct Column {
 
 std::vector<Column> ColumnsOf(const std::string& table, bool brief);
 
-bool HasColumn(const std::string& table, _SYSLOG_DB_ATTRI_tag attribute);
+bool HasColumn(const std::string& table, std::string_view name);
 
 }  // namespace quor::store
 

@@ -9,7 +9,7 @@
 namespace quor::store {
 namespace {
 
-constexpr char kShape[] = "dddd-dd-dd";
+constexpr std::string_view kDate = "dddd-dd-dd";
 constexpr int kMaxDaysAgo = 36500;
 
 bool isDigit(char c) {
@@ -20,9 +20,9 @@ bool isDigits(const std::string& text) {
     return !text.empty() && std::all_of(text.begin(), text.end(), isDigit);
 }
 
-bool hasShape(const std::string& text) {
-    return std::equal(text.begin(), text.end(), std::begin(kShape), std::end(kShape) - 1,
-                      [](char c, char shape) { return shape == 'd' ? isDigit(c) : c == shape; });
+bool hasShape(std::string_view text, std::string_view shape) {
+    return std::equal(text.begin(), text.end(), shape.begin(), shape.end(),
+                      [](char c, char wanted) { return wanted == 'd' ? isDigit(c) : c == wanted; });
 }
 
 int daysIn(int year, int month) {
@@ -32,7 +32,7 @@ int daysIn(int year, int month) {
 }
 
 bool isDate(const std::string& text) {
-    if (!hasShape(text)) {
+    if (!hasShape(text, kDate)) {
         return false;
     }
     const int year = ToInt32(text.c_str());
@@ -52,6 +52,7 @@ std::string daysAgo(int days, time_t now) {
     return {text, strftime(text, sizeof text, "%Y-%m-%d", &date)};
 }
 
+// -1 when it is no number of days.
 int daysOf(const std::string& text) {
     if (text == "today") {
         return 0;
@@ -59,38 +60,116 @@ int daysOf(const std::string& text) {
     if (text == "yesterday") {
         return 1;
     }
-    const bool counted = !text.empty() && text.back() == 'd' && isDigits(text.substr(0, text.size() - 1));
-    return counted ? ToInt32(text.c_str()) : -1;
+    const bool counted = text.size() > 1 && text.size() < 8 && isDigits(text.substr(0, text.size() - 1));
+    const int weeks = counted && text.back() == 'w' ? 7 : 1;
+    return counted && (text.back() == 'd' || weeks == 7) ? ToInt32(text.c_str()) * weeks : -1;
+}
+
+// "hh:mm" or "hh:mm:ss" with the seconds; empty when it is neither.
+std::string timeOfDay(const std::string& text) {
+    const std::string time = hasShape(text, "dd:dd") ? text + ":00" : text;
+    const bool right =
+        hasShape(time, "dd:dd:dd") && ToInt32(time.c_str()) < 24 && ToInt32(&time[3]) < 60 && ToInt32(&time[6]) < 60;
+    return right ? time : "";
+}
+
+tm brokenDown(const std::string& date, const std::string& time) {
+    tm parts = {};
+    parts.tm_year = ToInt32(date.c_str()) - 1900;
+    parts.tm_mon = ToInt32(&date[5]) - 1;
+    parts.tm_mday = ToInt32(&date[8]);
+    parts.tm_hour = ToInt32(time.c_str());
+    parts.tm_min = ToInt32(&time[3]);
+    parts.tm_sec = ToInt32(&time[6]);
+    parts.tm_isdst = -1;
+    return parts;
+}
+
+// Seconds east of UTC in "Z", "+hh:mm" and "+hhmm"; false when it is none of them.
+bool readZone(const std::string& text, int& seconds) {
+    const bool colon = hasShape(text.substr(std::min<size_t>(1, text.size())), "dd:dd");
+    if (text != "Z" &&
+        (text.empty() || (text[0] != '+' && text[0] != '-') || (!colon && !hasShape(text.substr(1), "dddd")))) {
+        return false;
+    }
+    const int hours = text == "Z" ? 0 : ToInt32(text.substr(1, 2).c_str());
+    const int minutes = text == "Z" ? 0 : ToInt32(text.substr(colon ? 4 : 3).c_str());
+    seconds = (hours * 60 + minutes) * (text[0] == '-' ? -60 : 60);
+    return hours < 24 && minutes < 60;
+}
+
+// Date and time of day, the zone if wanted; false when the text is something else.
+bool readDateAndTime(const std::string& text, Moment& moment) {
+    if (text.size() < 16 || (text[10] != ' ' && text[10] != 'T') || !isDate(text.substr(0, 10))) {
+        return false;
+    }
+    const size_t zone = std::min(text.find_first_of("Z+-", 11), text.size());
+    moment = {text.substr(0, 10), timeOfDay(text.substr(11, zone - 11))};
+    if (moment.time.empty() || zone == text.size()) {
+        return !moment.time.empty();
+    }
+    int offset = 0;
+    if (!readZone(text.substr(zone), offset)) {
+        return false;
+    }
+    tm utc = brokenDown(moment.date, moment.time);
+    moment = MomentOf(timegm(&utc) - offset);
+    return true;
 }
 
 }  // namespace
 
-std::string ParseDate(const std::string& text, const std::string& option, time_t now) {
-    if (text.empty() || isDate(text)) {
-        return text;
-    }
-    const int days = daysOf(text);
-    if (days < 0 || days > kMaxDaysAgo) {
-        throw Failure(option + ": no such date '" + text + "'; give YYYY-MM-DD, today, yesterday or 7d");
-    }
-    return daysAgo(days, now);
+Moment MomentOf(time_t seconds) {
+    const std::string text = LocalTime(seconds);
+    return text.empty() ? Moment() : Moment{text.substr(0, 10), text.substr(11)};
 }
 
-time_t DayBegin(const std::string& date, int daysLater) {
-    tm day = {};
-    day.tm_year = ToInt32(date.c_str()) - 1900;
-    day.tm_mon = ToInt32(&date[5]) - 1;
-    day.tm_mday = ToInt32(&date[8]) + daysLater;
-    day.tm_isdst = -1;
-    return mktime(&day);
+Moment ParseMoment(const std::string& text, const std::string& option, time_t now) {
+    if (text.empty() || isDate(text)) {
+        return {text, ""};
+    }
+    const int days = daysOf(text);
+    if (days >= 0 && days <= kMaxDaysAgo) {
+        return {daysAgo(days, now), ""};
+    }
+    if (text == "now") {
+        return MomentOf(now);
+    }
+    if (!timeOfDay(text).empty()) {
+        return {daysAgo(0, now), timeOfDay(text)};
+    }
+    Moment moment;
+    if (readDateAndTime(text, moment)) {
+        return moment;
+    }
+    if (days < 0 && text.size() < 8 && text.find_first_of("smh") == text.size() - 1 &&
+        isDigits(text.substr(0, text.size() - 1))) {
+        return MomentOf(now - static_cast<time_t>(ParseSpan(text, option)));
+    }
+    throw Failure(option + ": no such time '" + text +
+                  "'; give 6h, today, yesterday, 7d, 10:00, YYYY-MM-DD or 'YYYY-MM-DD hh:mm'");
+}
+
+time_t BeginOf(const Moment& moment) {
+    tm parts = brokenDown(moment.date, moment.time.empty() ? "00:00:00" : moment.time);
+    return mktime(&parts);
+}
+
+time_t EndOf(const Moment& moment) {
+    if (!moment.time.empty()) {
+        return BeginOf(moment);
+    }
+    tm next = brokenDown(moment.date, "00:00:00");
+    ++next.tm_mday;
+    return mktime(&next) - 1;
 }
 
 uint64_t ParseSpan(const std::string& text, const std::string& option) {
-    constexpr std::string_view kUnits = "smhd";
-    constexpr uint64_t kSeconds[] = {1, 60, 3600, 86400};
+    constexpr std::string_view kUnits = "smhdw";
+    constexpr uint64_t kSeconds[] = {1, 60, 3600, 86400, 604800};
     const size_t unit = text.empty() ? std::string_view::npos : kUnits.find(text.back());
     if (unit == std::string_view::npos || text.size() > 7 || !isDigits(text.substr(0, text.size() - 1))) {
-        throw Failure(option + ": no such time span '" + text + "'; give 90s, 10m, 6h or 2d");
+        throw Failure(option + ": no such time span '" + text + "'; give 90s, 10m, 6h, 2d or 1w");
     }
     return ToUint64(text.c_str()) * kSeconds[unit];
 }

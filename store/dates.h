@@ -1,4 +1,4 @@
-// Dates as a person gives them, in the form in which logs are dated.
+// Dates and times as a person gives them, in the form in which logs are dated.
 #ifndef STORE_DATES_H
 #define STORE_DATES_H
 
@@ -8,14 +8,27 @@
 
 namespace quor::store {
 
-// "YYYY-MM-DD" of a date given so, or as "today", "yesterday" or "7d" (that many days ago) in local time; the empty
-// text stays empty. `option` is named in the Failure of anything else.
-std::string ParseDate(const std::string& text, const std::string& option, time_t now);
+// A second, or a whole day, of local time.
+struct Moment {
+    std::string date;  // YYYY-MM-DD; empty: none
+    std::string time;  // hh:mm:ss; empty: the whole day
 
-// The first second of a day "YYYY-MM-DD" in local time, or of the day that many days later.
-time_t DayBegin(const std::string& date, int daysLater = 0);
+    bool empty() const { return date.empty(); }
+    // Both, with a time that stands for the whole day's.
+    std::string text(const char* timeOfDay) const { return date + " " + (time.empty() ? timeOfDay : time); }
+};
 
-// Seconds of a time span such as "90s", "10m", "6h" or "2d"; `option` is named in the Failure of anything else.
+// Days: "YYYY-MM-DD", "today", "yesterday", "7d", "2w" (that long ago). Seconds: "now", "90s", "10m", "6h" (that long
+// ago), "10:00" (of today), "YYYY-MM-DD 10:00:30", and the same with a "T" and, if wanted, a zone as in ISO 8601. The
+// empty text is no moment. `option` is named in the Failure of anything else.
+Moment ParseMoment(const std::string& text, const std::string& option, time_t now);
+Moment MomentOf(time_t seconds);
+
+// The first and the last second of a moment.
+time_t BeginOf(const Moment& moment);
+time_t EndOf(const Moment& moment);
+
+// Seconds of a time span such as "90s", "10m", "6h", "2d" or "1w"; `option` is named in the Failure of anything else.
 uint64_t ParseSpan(const std::string& text, const std::string& option);
 
 // "YYYY-MM-DDThh:mm:ss" in local time.

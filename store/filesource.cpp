@@ -12,25 +12,48 @@ namespace {
 
 const std::string kNoIdentity = "file ";
 
-std::string quoted(const std::string& text) {
-    const _SYSLOG_SQL_COND_tag value{SYSLOG_ATTRI_HOST, SYSLOG_OP_EQUAL, text, {}};
+std::string quoted(const std::string& text, int op = SYSLOG_OP_EQUAL) {
+    const _SYSLOG_SQL_COND_tag value{SYSLOG_ATTRI_HOST, op, text, {}};
     return "'" + CondValueEscape(&value) + "'";
 }
 
-std::string rendered(const ColumnCondition& condition) {
-    std::string values;
-    for (const std::string& value : condition.values) {
-        values += (values.empty() ? "" : ", ") + quoted(value);
+// "column IN ('a', 'b') OR column GLOB 'c*'"
+std::string renderedList(const std::string& column, const std::list<std::string>& values) {
+    std::string names;
+    std::string patterns;
+    for (const std::string& value : values) {
+        if (value.find_first_of("*?") == std::string::npos) {
+            names += (names.empty() ? "" : ", ") + quoted(value);
+        } else {
+            patterns += " OR " + column + " GLOB " + quoted(value, SYSLOG_OP_GLOB);
+        }
     }
+    return column + " IN (" + names + ")" + patterns;
+}
+
+std::string rendered(const ColumnCondition& condition) {
     const std::string column = condition.column;
-    return condition.isPart ? "instr(" + column + ", " + values + ")" : column + " IN (" + values + ")";
+    const std::string first = quoted(condition.values.front());
+    const std::string last = quoted(condition.values.back());
+    switch (condition.match) {
+    case Match::Part:
+        return "instr(" + column + ", " + first + ")";
+    case Match::PartNoCase:
+        return "instr(lower(" + column + "), lower(" + first + "))";
+    case Match::AtLeast:
+        return column + " >= (" + first + ", " + last + ")";
+    case Match::AtMost:
+        return column + " <= (" + first + ", " + last + ")";
+    default:
+        return renderedList(column, condition.values);
+    }
 }
 
 std::string where(Conditions conditions) {
     std::string text;
     (void)SqlCondListToStr(conditions.attributes, text);  // cannot fail
     for (const ColumnCondition& condition : conditions.columns) {
-        text += (text.empty() ? "" : " AND ") + rendered(condition);
+        text += (text.empty() ? "(" : " AND (") + rendered(condition) + (condition.negated ? ") IS NOT TRUE" : ")");
     }
     return text.empty() ? text : " WHERE " + text;
 }
@@ -68,6 +91,17 @@ class FileSource : public Source {
         const std::vector<std::string> rows =
             Ask(path_, "SELECT COUNT(*) FROM " + table + where(conditions), "COUNT(*)");
         return ToUint64(rows.front().c_str());
+    }
+
+    void groups(const std::string& table, const Conditions& conditions, const std::string& expression,
+                const GroupHandler& handler) const override {
+        const Connection connection = Connect(path_);
+        const Result result = Execute(connection, path_,
+                                      "SELECT " + expression + " AS name, COUNT(*) AS rows FROM " + table +
+                                          where(conditions) + " GROUP BY 1");
+        for (Row row(result.get()); row.next();) {
+            handler(row["name"], ToUint64(row["rows"]));
+        }
     }
 
     std::list<std::string> values(_SYSLOG_DB_ATTRI_tag attribute, const Window& window) const override {

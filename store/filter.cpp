@@ -19,47 +19,34 @@ constexpr size_t kMaxPattern = 15000;  // the database refuses longer ones, brac
 struct Given {
     const char* option;
     std::string FilterOptions::*value;
-    _SYSLOG_DB_ATTRI_tag attribute;
-    bool isName;  // cheap to look for by itself
+    const char* column;
+    bool isName = false;  // cheap to look for by itself
 };
 
 constexpr Given kFilters[] = {
-    {"--host", &FilterOptions::host, SYSLOG_ATTRI_HOST, true},
-    {"--level", &FilterOptions::level, SYSLOG_ATTRI_LLEVEL, true},
-    {"--facility", &FilterOptions::facility, SYSLOG_ATTRI_FAC, true},
-    {"--program", &FilterOptions::program, SYSLOG_ATTRI_PROG, true},
-    {"--keyword", &FilterOptions::keyword, SYSLOG_ATTRI_MSG, false},
-    {"--glob", &FilterOptions::glob, SYSLOG_ATTRI_MSG, false},
-    {"--from", &FilterOptions::from, SYSLOG_ATTRI_LDATE, false},
-    {"--to", &FilterOptions::to, SYSLOG_ATTRI_LDATE, false},
-};
-
-// Those on columns that the library does not know.
-struct GivenColumn {
-    const char* option;
-    std::string FilterOptions::*value;
-    const char* column;
-    bool isPart;
-};
-
-constexpr GivenColumn kColumnFilters[] = {
-    {"--pid", &FilterOptions::pid, "pid", false},
-    {"--msgid", &FilterOptions::msgid, "msgid", false},
+    {"--host", &FilterOptions::host, "host", true},
+    {"--level", &FilterOptions::level, "llevel", true},
+    {"--facility", &FilterOptions::facility, "fac", true},
+    {"--program", &FilterOptions::program, "prog", true},
+    {"--pid", &FilterOptions::pid, "pid", true},
+    {"--msgid", &FilterOptions::msgid, "msgid", true},
     {"--sdata", &FilterOptions::sdata, "sdata", true},
+    {"--ip", &FilterOptions::ip, "ip", true},
+    {"--keyword", &FilterOptions::keyword, "msg"},
+    {"--glob", &FilterOptions::glob, "msg"},
+    {"--from", &FilterOptions::from, "ldate"},
+    {"--to", &FilterOptions::to, "ldate"},
+    {"--last", &FilterOptions::last, "ldate"},
+    {"--not-host", &FilterOptions::notHost, "host"},
+    {"--not-level", &FilterOptions::notLevel, "llevel"},
+    {"--not-facility", &FilterOptions::notFacility, "fac"},
+    {"--not-program", &FilterOptions::notProgram, "prog"},
+    {"--not-keyword", &FilterOptions::notKeyword, "msg"},
 };
 
-// Only table logs, to which the columns were added, has them.
-bool hasColumn(const std::string& table, const Given& given) {
-    return HasColumn(table, given.attribute);
-}
-bool hasColumn(const std::string& table, const GivenColumn& /*given*/) {
-    return table == "logs";
-}
-
-template <typename Filters>
-void checkColumns(const Filters& filters, const FilterOptions& options, const std::string& table) {
-    for (const auto& given : filters) {
-        if (!(options.*given.value).empty() && !hasColumn(table, given)) {
+void checkColumns(const FilterOptions& options, const std::string& table) {
+    for (const Given& given : kFilters) {
+        if (!(options.*given.value).empty() && !HasColumn(table, given.column)) {
             throw Failure(std::string(given.option) + ": table " + table + " has no column for it; leave it out");
         }
     }
@@ -76,21 +63,37 @@ void checkNames(const char* option, const std::string& names) {
     }
 }
 
-int levelIndex(const std::string& name) {
+// The names that other programs and people use, and the numbers.
+int levelIndex(const std::string& text) {
+    constexpr std::pair<const char*, int> kOthers[] = {{"emergency", 0},    {"panic", 0}, {"critical", 2},
+                                                       {"error", 3},        {"warn", 4},  {"information", 6},
+                                                       {"informational", 6}};
+    std::string name = text;
+    std::transform(name.begin(), name.end(), name.begin(),
+                   [](char c) { return c >= 'A' && c <= 'Z' ? static_cast<char>(c + 32) : c; });
+    if (name.size() == 1 && name[0] >= '0' && name[0] <= '7') {
+        return name[0] - '0';
+    }
+    for (const auto& [other, level] : kOthers) {
+        if (name == other) {
+            return level;
+        }
+    }
     const auto* found = std::find(std::begin(g_MappingSyslogPrior), std::end(g_MappingSyslogPrior), name);
     return static_cast<int>(found - std::begin(g_MappingSyslogPrior));
 }
 
-[[noreturn]] void failLevel(const std::string& name) {
+[[noreturn]] void failLevel(const std::string& option, const std::string& name) {
     std::string names;
     for (const char* known : g_MappingSyslogPrior) {
         names += names.empty() ? known : std::string(", ") + known;
     }
-    throw Failure("--level: no such level '" + name + "'; give " + names + ", or err+ for err and worse");
+    throw Failure(option + ": no such level '" + name + "'; give " + names +
+                  ", a number from 0 to 7, or err+ for err and worse");
 }
 
 // "err+" becomes "emerg,alert,crit,err".
-std::string expandLevels(const std::string& levels) {
+std::string expandLevels(const std::string& levels, const std::string& option) {
     if (levels.empty() || levels == "any") {
         return levels;
     }
@@ -99,7 +102,7 @@ std::string expandLevels(const std::string& levels) {
         const bool orWorse = !token.empty() && token.back() == '+';
         const int last = levelIndex(token.substr(0, token.size() - (orWorse ? 1 : 0)));
         if (last == static_cast<int>(std::size(g_MappingSyslogPrior))) {
-            failLevel(token);
+            failLevel(option, token);
         }
         for (int level = orWorse ? 0 : last; level <= last; ++level) {
             expanded += (expanded.empty() ? "" : ",") + std::string(g_MappingSyslogPrior[level]);
@@ -129,6 +132,9 @@ std::string patternOf(const FilterOptions& options) {
     if (options.keyword.empty()) {
         return options.glob == "**" ? "" : options.glob;  // matches everything, which the library takes for no filter
     }
+    if (options.ignoreCase) {
+        return "";
+    }
     if (!comparesExactly(options.keyword)) {
         return "?*";  // the literal decides
     }
@@ -137,20 +143,35 @@ std::string patternOf(const FilterOptions& options) {
     return pattern;
 }
 
-void checkDates(const std::string& from, const std::string& to) {
-    if (!from.empty() && !to.empty() && from > to) {
-        throw Failure("--from " + from + " is after --to " + to + "; swap them");
+// The span that dates and times leave.
+struct Span {
+    Moment from;
+    Moment to;
+};
+
+Span spanOf(const FilterOptions& options, time_t now) {
+    if (!options.from.empty() && !options.last.empty()) {
+        throw Failure("--from and --last both say where to begin; give one of them");
     }
+    Span span{ParseMoment(options.from, "--from", now), ParseMoment(options.to, "--to", now)};
+    if (!options.last.empty()) {
+        span.from = MomentOf(now - static_cast<time_t>(ParseSpan(options.last, "--last")));
+    }
+    if (!span.from.empty() && !span.to.empty() && span.from.text("00:00:00") > span.to.text("23:59:59")) {
+        throw Failure("--from " + options.from + options.last + " is after --to " + options.to + "; swap them");
+    }
+    return span;
 }
 
 void check(const FilterOptions& options, const std::string& table) {
-    checkColumns(kFilters, options, table);
-    checkColumns(kColumnFilters, options, table);
-    checkNames("--host", options.host);
-    checkNames("--facility", options.facility);
-    checkNames("--program", options.program);
-    checkNames("--pid", options.pid);
-    checkNames("--msgid", options.msgid);
+    checkColumns(options, table);
+    for (const Given& given : kFilters) {
+        const bool text = given.value == &FilterOptions::sdata || std::string_view(given.column) == "msg" ||
+                          std::string_view(given.column) == "ldate" || std::string_view(given.column) == "llevel";
+        if (!text) {
+            checkNames(given.option, options.*given.value);
+        }
+    }
     if (std::max(options.keyword.size(), options.glob.size()) > kMaxPattern) {
         throw Failure("the text to search for is too long; give at most " + std::to_string(kMaxPattern) + " bytes");
     }
@@ -159,19 +180,62 @@ void check(const FilterOptions& options, const std::string& table) {
     }
 }
 
-std::list<ColumnCondition> columnConditions(const FilterOptions& options) {
+bool isList(const std::string& names) {
+    return !names.empty() && names != "any";
+}
+
+void addTimes(const Span& span, std::list<ColumnCondition>& conditions) {
+    if (!span.from.time.empty()) {
+        conditions.push_back({"(ldate, ltime)", {span.from.date, span.from.time}, Match::AtLeast});
+    }
+    if (!span.to.time.empty()) {
+        conditions.push_back({"(ldate, ltime)", {span.to.date, span.to.time}, Match::AtMost});
+    }
+}
+
+// What the library has no form for; it leaves it out of `options`.
+std::list<ColumnCondition> takeColumns(FilterOptions& options) {
     std::list<ColumnCondition> conditions;
-    for (const GivenColumn& given : kColumnFilters) {
-        const std::string& value = options.*given.value;
-        if (!value.empty() && value != "any") {
-            conditions.push_back(
-                {given.column, given.isPart ? std::list<std::string>{value} : Tokenize(value, ","), given.isPart});
+    const auto addList = [&](std::string& names, const char* column, bool negated) {
+        if (isList(names)) {
+            conditions.push_back({column, Tokenize(names, ","), Match::Any, negated});
         }
+        names.clear();
+    };
+    const auto addPart = [&](std::string& text, const char* column, Match match, bool negated) {
+        if (!text.empty()) {
+            conditions.push_back({column, {text}, match, negated});
+        }
+        text.clear();
+    };
+    const Match part = options.ignoreCase ? Match::PartNoCase : Match::Part;
+    addList(options.pid, "pid", false);
+    addList(options.msgid, "msgid", false);
+    addList(options.ip, "ip", false);
+    addPart(options.sdata, "sdata", Match::Part, false);
+    addList(options.notHost, "host", true);
+    addList(options.notLevel, "llevel", true);
+    addList(options.notFacility, "fac", true);
+    addList(options.notProgram, "prog", true);
+    addPart(options.notKeyword, "msg", part, true);
+    if (holdsWildcard(options.host)) {
+        addList(options.host, "host", false);
+    }
+    if (holdsWildcard(options.program)) {
+        addList(options.program, "prog", false);
+    }
+    if (options.ignoreCase) {
+        addPart(options.keyword, "msg", part, false);
     }
     return conditions;
 }
 
-std::string datesInWords(const std::string& from, const std::string& to) {
+std::string spanInWords(const Span& span) {
+    const auto words = [](const Moment& moment) {
+        return moment.date + (moment.time.empty() ? "" : " " + moment.time);
+    };
+    const std::string from = words(span.from);
+    const std::string to = words(span.to);
     if (from == to) {
         return "is dated " + from;
     }
@@ -190,18 +254,19 @@ bool Filter::accepts(const _SYSLOG_LOG_DATA_tag& record) const {
 
 Filter BuildFilter(const FilterOptions& options, const std::string& table, time_t now) {
     check(options, table);
-    FilterOptions checked = options;  // the library takes its arguments by reference
-    checked.level = expandLevels(options.level);
-    checked.from = ParseDate(options.from, "--from", now);
-    checked.to = ParseDate(options.to, "--to", now);
-    checkDates(checked.from, checked.to);
-    std::string pattern = patternOf(options);
     Filter filter;
-    LogSearchCondListGen(checked.host, checked.level, checked.facility, checked.program, pattern, checked.from,
-                         checked.to, filter.conditions.attributes);
-    filter.conditions.columns = columnConditions(options);
-    const bool literal = holdsWildcard(options.keyword) || !comparesExactly(options.keyword);
-    filter.literal = literal ? options.keyword : "";
+    FilterOptions rest = options;  // the library takes its arguments by reference
+    rest.level = expandLevels(options.level, "--level");
+    rest.notLevel = expandLevels(options.notLevel, "--not-level");
+    const Span span = spanOf(options, now);
+    std::string pattern = patternOf(options);
+    filter.conditions.columns = takeColumns(rest);
+    addTimes(span, filter.conditions.columns);
+    rest.from = span.from.date;
+    rest.to = span.to.date;
+    LogSearchCondListGen(rest.host, rest.level, rest.facility, rest.program, pattern, rest.from, rest.to,
+                         filter.conditions.attributes);
+    filter.literal = holdsWildcard(rest.keyword) || !comparesExactly(rest.keyword) ? rest.keyword : "";
     return filter;
 }
 
@@ -213,21 +278,18 @@ std::vector<Probe> BuildProbes(const FilterOptions& options, const std::string& 
             probes.push_back({words, std::move(conditions)});
         }
     };
-    const auto addNamed = [&](const auto& given) {
-        FilterOptions alone;
-        alone.*given.value = options.*given.value;
-        add("has " + std::string(given.option) + " " + options.*given.value, alone);
-    };
     for (const Given& given : kFilters) {
         if (given.isName) {
-            addNamed(given);
+            FilterOptions alone;
+            alone.*given.value = options.*given.value;
+            add("has " + std::string(given.option) + " " + options.*given.value, alone);
         }
     }
-    std::for_each(std::begin(kColumnFilters), std::end(kColumnFilters), addNamed);
-    FilterOptions dates;
-    dates.from = ParseDate(options.from, "--from", now);
-    dates.to = ParseDate(options.to, "--to", now);
-    add(datesInWords(dates.from, dates.to), dates);
+    FilterOptions times;
+    times.from = options.from;
+    times.to = options.to;
+    times.last = options.last;
+    add(spanInWords(spanOf(options, now)), times);
     return probes;
 }
 

@@ -11,11 +11,21 @@
 
 namespace quor::store {
 
-// A condition on a column that is no attribute of the library: it is one of the values, or the one value is part of it.
+// How a column compares.
+enum class Match {
+    Any,         // it is one of the values, of which those with "*" or "?" are patterns
+    Part,        // the one value is part of it
+    PartNoCase,  // the same, whatever the case of ASCII letters
+    AtLeast,     // two columns, written as such, compared with two values
+    AtMost,
+};
+
+// A condition that the library has no form for.
 struct ColumnCondition {
     const char* column;
     std::list<std::string> values;
-    bool isPart;
+    Match match = Match::Any;
+    bool negated = false;  // also met by rows without a value
 };
 
 // All of them hold.
@@ -26,7 +36,8 @@ struct Conditions {
     bool empty() const { return attributes.empty() && columns.empty(); }
 };
 
-// As a person gives them; the empty text leaves a filter out. The names of a list are separated by commas.
+// As a person gives them; the empty text leaves a filter out. The names of a list are separated by commas. Hosts and
+// programs may hold "*" and "?".
 struct FilterOptions {
     std::string host;
     std::string level;
@@ -35,10 +46,18 @@ struct FilterOptions {
     std::string pid;
     std::string msgid;
     std::string sdata;  // a part of the structured data
+    std::string ip;
     std::string keyword;
     std::string glob;
     std::string from;
     std::string to;
+    std::string last;  // a time span, in place of from
+    std::string notHost;
+    std::string notLevel;
+    std::string notFacility;
+    std::string notProgram;
+    std::string notKeyword;
+    bool ignoreCase = false;  // of the keywords, for ASCII letters
 };
 
 struct Filter {

@@ -8,6 +8,7 @@
 #include <list>
 #include <memory>
 #include <string>
+#include <string_view>
 
 #include "store/filter.h"
 #include "store/record.h"
@@ -15,6 +16,7 @@
 namespace quor::store {
 
 using RecordHandler = std::function<void(const Record&)>;
+using GroupHandler = std::function<void(std::string_view name, uint64_t rows)>;
 
 struct Window {
     uint64_t limit = 0;  // 0: no limit
@@ -35,6 +37,9 @@ class Source {
                           const RecordHandler& handler) const = 0;
     // Counts the rows that meet all conditions.
     virtual uint64_t count(const std::string& table, const Conditions& conditions) const = 0;
+    // Counts them by the value of an SQL expression of ours, in no order; null counts as the empty text.
+    virtual void groups(const std::string& table, const Conditions& conditions, const std::string& expression,
+                        const GroupHandler& handler) const = 0;
     // The distinct values of an attribute of table logs, ascending. Of limit and offset the low 32 bits count.
     virtual std::list<std::string> values(_SYSLOG_DB_ATTRI_tag attribute, const Window& window) const = 0;
     // Deletes the rows of table logs that meet all conditions: every row when there is none.

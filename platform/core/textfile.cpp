@@ -28,7 +28,7 @@ class Draft {
         }
     }
 
-    bool write(const std::string& text) const { return file_ && WriteAll(file_, text); }
+    bool write(const std::string& text) const { return file_ && WriteAll(file_.get(), text); }
 
     bool takeOwnerAndMode(const std::string& original) const {
         struct stat old {};

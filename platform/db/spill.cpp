@@ -46,7 +46,7 @@ bool SpillFile::write(const char* data, size_t size) {
         file_ = openTemporary();
     }
     size_ += size;
-    return WriteAll(file_, {data, size});
+    return WriteAll(file_.get(), {data, size});
 }
 
 char* SpillFile::map() {

@@ -18,7 +18,7 @@ constexpr off_t kMostBytes = off_t{1} << 20U;
 
 std::string append(const std::string& path, const std::string& line) {
     const Descriptor file(open(path.c_str(), O_WRONLY | O_APPEND | O_CREAT | O_CLOEXEC | O_NOFOLLOW, 0600));
-    return file && WriteAll(file, line) ? "" : path + ": " + strerror(errno);
+    return file && WriteAll(file.get(), line) ? "" : path + ": " + strerror(errno);
 }
 
 }  // namespace

@@ -212,7 +212,7 @@ bool Spool::put(const char* channel, const Notice& notice) const {
     const std::string unfinished = below("unfinished");
     const std::string text = serialised(notice);
     const Descriptor file = openOwn(unfinished, O_WRONLY | O_TRUNC);
-    return QUORFSMkdirP(queueFolder(channel).c_str(), 0, 0, -1, -1, 0700) >= 0 && file && WriteAll(file, text) &&
+    return QUORFSMkdirP(queueFolder(channel).c_str(), 0, 0, -1, -1, 0700) >= 0 && file && WriteAll(file.get(), text) &&
            rename(unfinished.c_str(), path.c_str()) == 0;
 }
 
@@ -261,7 +261,7 @@ void Spool::giveUp(const char* channel, const Notice& notice, const std::string&
     const Descriptor file = openOwn(below(kGivenUp), O_WRONLY | O_APPEND);
     struct stat found {};
     if (file && fstat(file.get(), &found) == 0 && found.st_size < kMostGivenUpBytes) {
-        (void)WriteAll(file, channel + ("\t" + notice.subject + "\t") + cause + "\n");
+        (void)WriteAll(file.get(), channel + ("\t" + notice.subject + "\t") + cause + "\n");
     }
 }
 

@@ -43,22 +43,65 @@ TEST(Text, IsShownAndEncodedWithoutAnythingRaw) {
     }
 }
 
-TEST(Dates, AreLocalDaysThatExist) {
+TEST(Moments, AreLocalDaysAndTimesThatExist) {
     setenv("TZ", "CET-1CEST,M3.5.0,M10.5.0/3", 1);  // it changed its clocks on the night to 2026-03-29
     tzset();
     const time_t now = 1774823400;  // 2026-03-30 00:30 local time, 2026-03-29 22:30 UTC
     for (const char* text : {"", "2000-02-29", "2024-02-29", "2024-03-31", "2024-08-31", "2024-12-31"}) {
-        EXPECT_EQ(ParseDate(text, "--from", now), text);
+        EXPECT_EQ(ParseMoment(text, "--from", now).date, text);
     }
-    EXPECT_EQ(ParseDate("yesterday", "--from", now), "2026-03-29");
-    EXPECT_EQ(ParseDate("0d", "--from", now), "2026-03-30");
-    EXPECT_EQ(ParseDate("36500d", "--from", now), "1926-04-24");
-    for (const char* text : {"1900-02-29", "2023-02-29", "2024-04-31", "2024-06-31", "2024-09-31", "2024-11-31",
-                             "2024-01-32", "2024-01-00", "2024-00-01", "2024-13-01", "2024-1-1", "2024/01/01", "0", "7",
-                             "-1d", "36501d", "99999999999d"}) {
-        EXPECT_THROW((void)ParseDate(text, "--from", now), Failure) << text;
+    const std::map<std::string, std::string> moments = {{"yesterday", "2026-03-29 "},
+                                                        {"0d", "2026-03-30 "},
+                                                        {"36500d", "1926-04-24 "},
+                                                        {"2w", "2026-03-16 "},
+                                                        {"now", "2026-03-30 00:30:00"},
+                                                        {"90s", "2026-03-30 00:28:30"},
+                                                        {"31m", "2026-03-29 23:59:00"},
+                                                        {"23h", "2026-03-29 00:30:00"},
+                                                        {"23:59", "2026-03-30 23:59:00"},
+                                                        {"00:00:59", "2026-03-30 00:00:59"},
+                                                        {"2026-11-21 10:00", "2026-11-21 10:00:00"},
+                                                        {"2026-11-21T10:00:30", "2026-11-21 10:00:30"},
+                                                        {"2026-11-21T10:00:30Z", "2026-11-21 11:00:30"},
+                                                        {"2026-07-01T23:30:00-0130", "2026-07-02 03:00:00"},
+                                                        {"2026-07-01T00:30:00+05:30", "2026-06-30 21:00:00"}};
+    for (const auto& [text, moment] : moments) {
+        const Moment parsed = ParseMoment(text, "--from", now);
+        EXPECT_EQ(parsed.date + " " + parsed.time, moment) << text;
     }
-    const std::map<std::string, uint64_t> spans = {{"90s", 90}, {"10m", 600}, {"6h", 21600}, {"2d", 172800}};
+    EXPECT_EQ(EndOf({"2026-03-29", ""}) - BeginOf({"2026-03-29", ""}), 23 * 3600 - 1) << "clocks changed";
+    for (const char* text : {"1900-02-29",
+                             "2023-02-29",
+                             "2024-04-31",
+                             "2024-06-31",
+                             "2024-09-31",
+                             "2024-11-31",
+                             "2024-01-32",
+                             "2024-01-00",
+                             "2024-00-01",
+                             "2024-13-01",
+                             "2024-1-1",
+                             "2024/01/01",
+                             "0",
+                             "7",
+                             "-1d",
+                             "36501d",
+                             "99999999999d",
+                             "24:00",
+                             "10:60",
+                             "10:00:60",
+                             "1:00",
+                             "d",
+                             "h",
+                             "1x",
+                             "2026-11-21 24:00",
+                             "2026-11-21T10:00+24:00",
+                             "2026-11-21T10:00x",
+                             "2026-02-30 10:00"}) {
+        EXPECT_THROW((void)ParseMoment(text, "--from", now), Failure) << text;
+    }
+    const std::map<std::string, uint64_t> spans = {
+        {"90s", 90}, {"10m", 600}, {"6h", 21600}, {"2d", 172800}, {"1w", 604800}};
     for (const auto& [text, seconds] : spans) {
         EXPECT_EQ(ParseSpan(text, ""), seconds);
     }

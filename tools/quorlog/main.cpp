@@ -33,6 +33,7 @@ int parseFailed(const CLI::App& app, const CLI::ParseError& error) {
 int run(int argc, char** argv) {
     CLI::App app;
     app.name("quorlog");
+    app.set_version_flag("--version", "quorlog " QUORLOG_VERSION);
     int status = quor::cli::kDone;
     try {
         quor::cli::AddCommands(app, status);

@@ -20,14 +20,23 @@ CLI::IsMember namesOf(const std::array<const char*, 4>& names) {
     return CLI::IsMember(std::vector<std::string>(names.begin(), names.end()));
 }
 
+// An empty value is a slip, of a script mostly: left out, it would mean every row.
+CLI::Option* refuseEmpty(CLI::Option* option) {
+    return option->each([option](const std::string& value) {
+        if (value.empty()) {
+            throw Failure(option->get_name() + ": the value is empty; leave the option out, or give one");
+        }
+    });
+}
+
 // An option that may be given several times; its values are joined like a list.
 void addList(CLI::App& command, const std::string& name, std::string& value, const std::string& help) {
-    command.add_option(name, value, help)->type_name("NAMES")->join(',')->group("Filters");
+    refuseEmpty(command.add_option(name, value, help)->type_name("NAMES")->join(',')->group("Filters"));
 }
 
 CLI::Option* addFilter(CLI::App& command, const std::string& name, std::string& value, const std::string& type,
                        const std::string& help) {
-    return command.add_option(name, value, help)->type_name(type)->group("Filters");
+    return refuseEmpty(command.add_option(name, value, help)->type_name(type)->group("Filters"));
 }
 
 }  // namespace
@@ -54,19 +63,29 @@ void AddTableOption(CLI::App& command, std::string& table) {
 }
 
 void AddFilterOptions(CLI::App& command, store::FilterOptions& filters) {
-    addList(command, "--host", filters.host, "Sending hosts");
+    addList(command, "--host", filters.host, "Sending hosts; * and ? stand for any text");
     addList(command, "--level", filters.level, "Levels, such as err,crit; err+ is err and worse");
     addList(command, "--facility", filters.facility, "Facilities, such as kern,auth");
-    addList(command, "--program", filters.program, "Programs");
+    addList(command, "--program", filters.program, "Programs; * and ? stand for any text");
     addList(command, "--pid", filters.pid, "Process ids");
+    addList(command, "--ip", filters.ip, "Addresses of senders; * and ? stand for any text");
     addList(command, "--msgid", filters.msgid, "Message ids (RFC 5424)");
     addFilter(command, "--sdata", filters.sdata, "TEXT", "Structured data that contains the text (RFC 5424)");
     CLI::Option* keyword = addFilter(command, "--keyword", filters.keyword, "TEXT", "Messages that contain the text");
     addFilter(command, "--glob", filters.glob, "PATTERN",
               "Messages like this as a whole; * is any text, ? any character")
         ->excludes(keyword);
-    addFilter(command, "--from", filters.from, "DATE", "First day: YYYY-MM-DD, today, yesterday, 7d");
-    addFilter(command, "--to", filters.to, "DATE", "Last day, inclusive");
+    command.add_flag("-i,--ignore-case", filters.ignoreCase, "Keywords in small or capital letters (ASCII)")
+        ->group("Filters");
+    addFilter(command, "--from,--since", filters.from, "TIME",
+              "First day or second: 6h, today, yesterday, 7d, 10:00, YYYY-MM-DD, 'YYYY-MM-DD hh:mm'");
+    addFilter(command, "--to,--until", filters.to, "TIME", "Last day or second, inclusive");
+    addFilter(command, "--last", filters.last, "SPAN", "Since so long ago: 90s, 10m, 6h, 2d, 1w");
+    addList(command, "--not-host", filters.notHost, "Any host but these");
+    addList(command, "--not-level", filters.notLevel, "Any level but these");
+    addList(command, "--not-facility", filters.notFacility, "Any facility but these");
+    addList(command, "--not-program", filters.notProgram, "Any program but these");
+    addFilter(command, "--not-keyword", filters.notKeyword, "TEXT", "Messages without the text");
 }
 
 void AddOutputOptions(CLI::App& command, OutputOptions& output) {
@@ -83,11 +102,12 @@ void AddYesOption(CLI::App& command, bool& yes) {
 }
 
 CLI::Option* AddNumberOption(CLI::App& command, const std::string& name, uint64_t& value, const std::string& help) {
-    const auto parse = [&value, name](const std::vector<std::string>& given) {
+    const std::string longName = name.substr(name.find_last_of(',') + 1);
+    const auto parse = [&value, longName](const std::vector<std::string>& given) {
         const std::string& text = given.back();
         const auto result = std::from_chars(text.data(), text.data() + text.size(), value);
         if (result.ec != std::errc() || result.ptr != text.data() + text.size()) {
-            throw Failure(name + ": not a number: '" + text + "'; give digits only");
+            throw Failure(longName + ": not a number: '" + text + "'; give digits only");
         }
         return true;
     };

@@ -6,6 +6,7 @@
 #include <cerrno>
 #include <cstring>
 
+#include "base/files.h"
 #include "store/failure.h"
 #include "tools/quorlog/display.h"
 
@@ -111,22 +112,14 @@ void writeBelowEachOther(const std::vector<Value>& values, Output& out) {
 }  // namespace
 
 void Output::flush() {
-    std::string_view rest = buffer_;
-    while (!rest.empty()) {
-        const ssize_t written = write(fd_, rest.data(), rest.size());
-        if (written < 0 && errno == EINTR) {
-            continue;
-        }
-        if (written < 0) {
-            const std::string cause = strerror(errno);
-            buffer_.clear();
-            throw store::Failure("cannot write the output: " + cause +
-                                     "; make sure that its reader is running and its disk has room",
-                                 store::Cause::Other);
-        }
-        rest.remove_prefix(static_cast<size_t>(written));
-    }
+    const bool written = WriteAll(fd_, buffer_);
+    const std::string cause = strerror(errno);
     buffer_.clear();
+    if (!written) {
+        throw store::Failure("cannot write the output: " + cause +
+                                 "; make sure that its reader is running and its disk has room",
+                             store::Cause::Other);
+    }
 }
 
 std::unique_ptr<RowSink> MakeSink(const Style& style, Columns columns, Output& out) {

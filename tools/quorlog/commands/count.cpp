@@ -1,10 +1,11 @@
 // count.
 #include <unistd.h>
 
+#include <algorithm>
 #include <ctime>
 
 #include "base/paths.h"
-#include "store/selection.h"
+#include "store/groups.h"
 #include "store/whynothing.h"
 #include "tools/quorlog/commands/commands.h"
 #include "tools/quorlog/messages.h"
@@ -19,6 +20,8 @@ struct CountOptions {
     store::FilterOptions filters;
     OutputOptions output;
     bool estimate = false;
+    std::string by;
+    uint64_t limit = 0;
 };
 
 void setup(CLI::App& command, CountOptions& options) {
@@ -26,8 +29,48 @@ void setup(CLI::App& command, CountOptions& options) {
     AddTableOption(command, options.table);
     AddFilterOptions(command, options.filters);
     AddOutputOptions(command, options.output);
-    command.add_flag("--estimate", options.estimate,
-                     "Print the largest id instead: immediate, but too large after deletions");
+    CLI::Option* by =
+        command.add_option("--by", options.by, "Count each host, program, level, facility, hour, day or message apart")
+            ->type_name("NAME")
+            ->check(CLI::IsMember(std::vector<std::string>(store::kGroupings.begin(), store::kGroupings.end())));
+    AddNumberOption(command, "-n,--limit", options.limit, "Groups to show, 0 for all")->needs(by);
+    command
+        .add_flag("--estimate", options.estimate,
+                  "Print the largest id instead: immediate, but too large after deletions")
+        ->excludes(by);
+}
+
+// Of a length that is to `full` as `rows` to `most`.
+std::string barOf(uint64_t rows, uint64_t most) {
+    constexpr double kFull = 30;
+    const double part = static_cast<double>(rows) / static_cast<double>(most);
+    return std::string(static_cast<size_t>(std::max(1.0, kFull * part)), '#');
+}
+
+int runBy(const CountOptions& options, const store::Source& source, const store::Selection& selection) {
+    std::vector<store::Group> groups = CountBy(source, selection, options.by);
+    if (options.limit != 0 && groups.size() > options.limit) {
+        groups.resize(options.limit);
+    }
+    uint64_t most = 0;
+    for (const store::Group& group : groups) {
+        most = std::max(most, group.rows);
+    }
+    const Style style = options.output.style();
+    const bool bars = style.format == Format::Table && style.terminal;
+    Columns columns = {{"count", Kind::Number}, {options.by.c_str()}};
+    if (bars) {
+        columns.insert(columns.begin() + 1, {""});
+    }
+    Output out(STDOUT_FILENO);
+    const auto sink = MakeSink(style, std::move(columns), out);
+    for (const store::Group& group : groups) {
+        const std::string count = std::to_string(group.rows);
+        const std::string bar = bars ? barOf(group.rows, most) : "";
+        sink->row(bars ? Cells{count, bar, group.name} : Cells{count, group.name});
+    }
+    sink->finish();
+    return groups.empty() ? ReportNothing(WhyNothing(source, selection, options.filters, 0)) : kDone;
 }
 
 int run(const CountOptions& options) {
@@ -35,6 +78,9 @@ int run(const CountOptions& options) {
     selection.table = options.table;
     selection.filter = BuildFilter(options.filters, options.table, time(nullptr));
     const auto source = store::OpenSource(options.db);
+    if (!options.by.empty()) {
+        return runBy(options, *source, selection);
+    }
     if (options.estimate && !selection.filter.conditions.empty()) {
         throw Failure("--estimate counts the whole table; leave out the filters or --estimate");
     }

@@ -1,6 +1,10 @@
 // db check, wal, limit: looking after the working database.
+#include <fcntl.h>
+#include <sys/stat.h>
+
 #include <filesystem>
 
+#include "base/guards.h"
 #include "base/paths.h"
 #include "dbhandler.h"
 #include "store/ask.h"
@@ -90,10 +94,18 @@ int runLimit(const CareOptions& options) {
         Complain("nothing removed");
         return kNothing;
     }
-    if (SyslogngWorkingDbCheck(db, static_cast<int>(options.kilobytes)) < 0) {
-        throw Failure("cannot remove " + db + "; see the system log", store::Cause::Other);
+    const Descriptor file(open(db.c_str(), O_RDONLY | O_CLOEXEC));
+    struct stat before {};
+    struct stat after {};
+    (void)fstat(file.get(), &before);
+    if (SyslogngWorkingDbCheck(db, static_cast<int>(options.kilobytes)) < 0 || fstat(file.get(), &after) != 0 ||
+        after.st_nlink >= before.st_nlink) {
+        throw Failure("cannot remove " + db + "; make sure that you may write to its folder", store::Cause::Denied);
     }
     WriteLine("removed " + db);
+    if (SyslogngHupSignalSend() < 0) {  // once more: the check does not say whether it could
+        Complain("syslog-ng could not be told; if it runs, restart it: it goes on writing to the removed file");
+    }
     return kDone;
 }
 

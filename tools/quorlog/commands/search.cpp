@@ -42,14 +42,14 @@ void setup(CLI::App& command, SearchOptions& options) {
     AddTableOption(command, options.table);
     AddFilterOptions(command, options.filters);
     AddOutputOptions(command, options.output);
-    AddNumberOption(command, "--limit", options.limit, "Number of rows, 0 for all; a table shows 50 by default")
+    AddNumberOption(command, "-n,--limit", options.limit, "Number of rows, 0 for all; a terminal shows 50 by default")
         ->each([&options](const std::string&) { options.limited = true; });
     CLI::Option* offset = AddNumberOption(command, "--offset", options.offset, "Number of rows to skip");
     CLI::Option* before =
         AddNumberOption(command, "--before", options.before,
                         "Only rows with a smaller id: give the last id of a page to get the next page");
     CLI::Option* oldest = command.add_flag("--oldest", options.oldest, "Oldest rows first, instead of newest");
-    CLI::Option* following = command.add_flag("--follow", options.follow, "Print new rows as they arrive, until ^C");
+    CLI::Option* following = command.add_flag("-f,--follow", options.follow, "Print new rows as they arrive, until ^C");
     following->excludes(offset)->excludes(oldest)->excludes(before);
     AddNumberOption(command, "--interval", options.interval, "Seconds between two checks for new rows")
         ->needs(following);
@@ -115,6 +115,17 @@ int follow(const SearchOptions& options, const store::Source& source, const stor
     return kDone;
 }
 
+// A person sees the first rows, and how to see the others.
+void tellMore(const store::Source& source, store::Selection rest, uint64_t last) {
+    rest.filter.conditions.attributes.push_back(
+        store::IdCondition(rest.oldestFirst ? SYSLOG_OP_ABOVE : SYSLOG_OP_BELOW, last));
+    const uint64_t more = Count(source, rest);
+    if (more != 0) {
+        Complain(std::to_string(more) + (more == 1 ? " more row" : " more rows") + "; all of them: -n 0" +
+                 (rest.oldestFirst ? "" : "; the next page: --before " + std::to_string(last)));
+    }
+}
+
 int run(const SearchOptions& options) {
     store::Selection selection = selectionOf(options);
     const auto source = store::OpenSource(options.db);
@@ -122,13 +133,21 @@ int run(const SearchOptions& options) {
         return follow(options, *source, selection);
     }
     const Style style = options.output.style();
-    if (!options.limited && style.format == Format::Table) {
+    const bool page = !options.limited && style.format == Format::Table && style.terminal;
+    if (page) {
         selection.limit = kTableRows;
     }
     Output out(STDOUT_FILENO);
     RecordSink sink(style, selection.table, out);
-    const uint64_t rows = Select(*source, selection, [&](const auto& record) { sink.add(record); });
+    uint64_t last = 0;
+    const uint64_t rows = Select(*source, selection, [&](const auto& record) {
+        sink.add(record);
+        last = record.id;
+    });
     sink.finish();
+    if (page && rows == kTableRows) {
+        tellMore(*source, selection, last);
+    }
     return rows == 0 ? ReportNothing(WhyNothing(*source, selection, options.filters, options.before)) : kDone;
 }
 

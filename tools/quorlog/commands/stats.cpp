@@ -109,15 +109,16 @@ struct Span {
 
 Span spanOf(const StatsOptions& options) {
     const time_t now = time(nullptr);
-    const std::string from = store::ParseDate(options.from, "--from", now);
-    const std::string to = store::ParseDate(options.to, "--to", now);
+    const store::Moment from = store::ParseMoment(options.from, "--from", now);
+    const store::Moment to = store::ParseMoment(options.to, "--to", now);
     if (from.empty() && to.empty()) {
         return {now - static_cast<int64_t>(store::ParseSpan(options.last, "--last")), now};
     }
-    if (!from.empty() && !to.empty() && from > to) {
-        throw Failure("--from " + from + " is after --to " + to + "; swap them");
+    const Span span{from.empty() ? 0 : BeginOf(from), to.empty() ? now : EndOf(to)};
+    if (!from.empty() && !to.empty() && span.first > span.last) {
+        throw Failure("--from " + options.from + " is after --to " + options.to + "; swap them");
     }
-    return {from.empty() ? 0 : store::DayBegin(from), to.empty() ? now : store::DayBegin(to, 1) - 1};
+    return span;
 }
 
 int bounded(int64_t seconds) {

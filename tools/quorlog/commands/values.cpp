@@ -31,7 +31,7 @@ void setup(CLI::App& command, ValuesOptions& options) {
 
 int run(const ValuesOptions& options) {
     const _SYSLOG_DB_ATTRI_tag attribute = LogAttriType(options.attribute);
-    if (attribute == SYSLOG_ATTRI_NONE || !store::HasColumn("logs", attribute)) {
+    if (attribute == SYSLOG_ATTRI_NONE || !store::HasColumn("logs", LogAttriStrGet(attribute))) {
         throw Failure("table logs has no column '" + options.attribute +
                       "'; give host, ip, fac, prio, tag, prog, ldate, ltime, tzoffset, utcsec, id or msg");
     }
