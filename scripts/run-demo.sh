@@ -139,4 +139,6 @@ show names host
 show events list
 show_mails
 show_burst
+cp "$root/run/receiving.conf" "$root/etc/quorsyslog/"  # where its port is looked up
+show doctor --control "$syslog_ng_control"
 [ -n "${ONCE:-}" ] || by_hand

@@ -8,24 +8,10 @@
 #include <optional>
 #include <string>
 
+#include "store/receiving.h"
 #include "tools/quorlogd/options.h"
 
 namespace quor {
-
-// What syslog-ng says of the log database.
-struct ReceiverCounts {
-    uint64_t dropped = 0;  // since its start
-    uint64_t queued = 0;
-    uint64_t written = 0;
-};
-// Out of the answer to "STATS".
-ReceiverCounts ParseReceiverCounts(const std::string& statistics);
-
-// Datagrams dropped, by the number of the socket, out of the text of /proc/net/udp or udp6.
-std::map<uint64_t, uint64_t> ParseUdpDrops(const std::string& table, unsigned port);
-
-// The UDP port in the values of the receiving configuration, or its default.
-unsigned ReceivingPort();
 
 class Losses {
   public:
@@ -40,16 +26,16 @@ class Losses {
     using Totals = std::map<std::string, uint64_t>;
 
     void lookAtUdp(Totals& totals) const;
-    std::optional<ReceiverCounts> lookAtReceiver(Totals& totals);
+    std::optional<store::ReceiverCounts> lookAtReceiver(Totals& totals);
     void compare(const Totals& totals);
-    void watchWaiting(const ReceiverCounts& counts);
+    void watchWaiting(const store::ReceiverCounts& counts);
     void load();
     void save() const;
 
     const Options& options_;
     Totals totals_;
     int64_t since_ = 0;  // the last look
-    ReceiverCounts counts_;
+    store::ReceiverCounts counts_;
     bool stuck_ = false;
     bool complained_ = false;
 };

@@ -6,9 +6,9 @@
 #include <filesystem>
 
 #include "base/paths.h"
+#include "store/receiving.h"
 #include "tools/quorlogd/daemon.h"
 #include "tools/quorlogd/housekeeping.h"
-#include "tools/quorlogd/losses.h"
 #include "tools/quorlogd/pidfile.h"
 
 namespace {
@@ -53,7 +53,7 @@ void setUp(CLI::App& app, quor::Options& options) {
 int run(int argc, char** argv) {
     quor::Options options;
     options.volume = std::filesystem::path(options.db).parent_path();
-    options.udpPort = quor::ReceivingPort();
+    options.udpPort = quor::store::ReceivingPort();
     CLI::App app(
         "Follows the log database that syslog-ng writes: accounts every row, checks the notification rules and records "
         "events. Signals: TERM or INT ends, HUP reads the rules anew, USR1 reports statistics, USR2 writes the "

@@ -1,0 +1,269 @@
+// doctor: what is wrong with receiving, following, space and notices, and what to do about it.
+#include <fcntl.h>
+#include <sys/file.h>
+#include <sys/stat.h>
+#include <sys/statvfs.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstring>
+#include <ctime>
+#include <filesystem>
+#include <functional>
+#include <map>
+#include <optional>
+
+#include "base/guards.h"
+#include "base/numbers.h"
+#include "base/paths.h"
+#include "notification.h"
+#include "store/ask.h"
+#include "store/databasefile.h"
+#include "store/dates.h"
+#include "store/receiving.h"
+#include "store/selection.h"
+#include "tools/quorlog/commands/commands.h"
+#include "tools/quorlog/messages.h"
+#include "tools/quorlog/options.h"
+
+namespace quor::cli {
+namespace {
+
+struct DoctorOptions {
+    std::string db = paths::kWorkingDb;
+    std::string control = paths::kReceiverControl;
+    std::string format = "table";
+};
+
+enum class State { Good, Doubtful, Bad };
+
+// One thing looked at. The measures have names and values as Prometheus wants them.
+struct Finding {
+    const char* check;
+    State state;
+    std::string detail;
+    std::string advice;
+    std::vector<std::pair<const char*, uint64_t>> measures;
+};
+
+void setup(CLI::App& command, DoctorOptions& options) {
+    AddDatabaseOption(command, options.db);
+    command.add_option("--control", options.control, "Control socket of syslog-ng")
+        ->type_name("PATH")
+        ->capture_default_str();
+    command.add_option("--format", options.format, "Output format: table, json, csv, ndjson, prometheus")
+        ->type_name("NAME")
+        ->capture_default_str()
+        ->check(CLI::IsMember({"table", "json", "csv", "ndjson", "prometheus"}));
+}
+
+Finding lookAtReceiver(const std::string& control) {
+    const std::optional<store::ReceiverCounts> counts = store::AskReceiver(control);
+    if (!counts) {
+        return {"syslog-ng",
+                State::Bad,
+                std::string("does not answer at ") + control + ": " + strerror(errno),
+                "start it, or name its control socket with --control; only root may ask it",
+                {{"receiver_up", 0}}};
+    }
+    const bool waiting = counts->queued > 1000;
+    const bool lost = counts->dropped != 0;
+    return {"syslog-ng",
+            lost || waiting ? State::Doubtful : State::Good,
+            "runs as process " + std::to_string(counts->process) + "; " + Decimal(counts->written) +
+                " messages written, " + Decimal(counts->queued) + " waiting, " + Decimal(counts->dropped) +
+                " dropped since its start",
+            lost      ? "see its messages in the system log; most often its disk was full"
+            : waiting ? "see whether the log database can be written"
+                      : "",
+            {{"receiver_up", 1},
+             {"messages_written", counts->written},
+             {"messages_waiting", counts->queued},
+             {"messages_dropped", counts->dropped}}};
+}
+
+Finding lookAtUdp() {
+    const unsigned port = store::ReceivingPort();
+    const std::map<uint64_t, uint64_t> drops = store::UdpDrops(port);
+    uint64_t dropped = 0;
+    for (const auto& [socket, count] : drops) {
+        dropped += count;
+    }
+    const std::string name = "UDP port " + std::to_string(port);
+    if (drops.empty()) {
+        return {"udp", State::Bad, name + " is not open", "see the messages of syslog-ng in the system log", {}};
+    }
+    return {"udp",
+            dropped == 0 ? State::Good : State::Doubtful,
+            name + " is open; " + Decimal(dropped) + " datagrams dropped since then",
+            dropped == 0 ? "" : "let devices that send much use TCP",
+            {{"datagrams_dropped", dropped}}};
+}
+
+// Whoever holds the lock runs.
+bool isFollowerRunning() {
+    const Descriptor file(open(paths::kReceiverPid, O_RDONLY | O_CLOEXEC));
+    return file && flock(file.get(), LOCK_SH | LOCK_NB) != 0;
+}
+
+// Nothing when it has never followed the database.
+std::optional<uint64_t> positionIn(const store::Source& source) {
+    const std::vector<std::string> found =
+        store::Ask(paths::kAccountingDb, "SELECT source || ' ' || last AS position FROM followed", "position");
+    const std::string begin = source.identity() + " ";
+    for (const std::string& position : found) {
+        if (position.rfind(begin, 0) == 0) {
+            return ToUint64(position.c_str() + begin.size());
+        }
+    }
+    return std::nullopt;
+}
+
+Finding lookAtFollower(const std::string& db) {
+    if (!isFollowerRunning()) {
+        return {"quorlogd",
+                State::Bad,
+                "does not run: nothing is counted, judged or announced",
+                "start it; the system log tells why it ended",
+                {{"follower_up", 0}}};
+    }
+    const auto source = store::OpenSource(db);
+    const std::optional<uint64_t> position = positionIn(*source);
+    const uint64_t newest = LargestId(*source, "logs");
+    const uint64_t behind = position && newest > *position ? newest - *position : 0;
+    const bool late = !position || behind > 50000;
+    return {"quorlogd",
+            late ? State::Doubtful : State::Good,
+            position ? "runs; " + Decimal(behind) + " rows are not written to its counts yet"
+                     : "runs, but has not counted this database yet",
+            late ? "wait; if it stays so, see its messages in the system log" : "",
+            {{"follower_up", 1}, {"rows_behind", behind}}};
+}
+
+Finding lookAtRows(const store::Source& source) {
+    store::Record last;
+    if (source.read("logs", {}, {1, 0}, false, [&](const store::Record& record) { last = record; }) == 0) {
+        return {"rows",
+                State::Doubtful,
+                "no message was stored yet",
+                "send one: logger -n 127.0.0.1 -d hello",
+                {{"last_row_id", 0}}};
+    }
+    const int64_t second = last.rsec != 0 ? last.rsec : last.utcsec;
+    const int64_t age = static_cast<int64_t>(time(nullptr)) - second;
+    const bool future = age < -60;
+    return {"rows",
+            future || age > 86400 ? State::Doubtful : State::Good,
+            "the last, " + Decimal(last.id) + ", came from " + last.host + " at " + store::LocalTime(second),
+            future        ? "its time is still to come: set the clock of this machine right"
+            : age > 86400 ? "no message for a day: see that the devices send to this machine"
+                          : "",
+            {{"last_row_id", last.id}, {"last_row_seconds", static_cast<uint64_t>(std::max<int64_t>(second, 0))}}};
+}
+
+uint64_t sizeOf(const std::string& path) {
+    std::error_code missing;
+    const uintmax_t size = std::filesystem::file_size(path, missing);
+    return missing ? 0 : size;
+}
+
+Finding lookAtSpace(const std::string& db) {
+    struct statvfs volume {};
+    const std::string folder = std::filesystem::path(db).parent_path();
+    if (statvfs(folder.c_str(), &volume) != 0) {
+        return {"space", State::Bad, folder + ": " + strerror(errno), "create it, and start syslog-ng", {}};
+    }
+    const uint64_t left = static_cast<uint64_t>(volume.f_bavail) * volume.f_frsize;
+    const uint64_t size = sizeOf(db);
+    const uint64_t journal = sizeOf(db + "-wal");
+    const uint64_t mega = uint64_t{1} << 20;
+    const bool full = left < 64 * mega;
+    const bool soon = left < 512 * mega || journal > 256 * mega;
+    return {"space",
+            full   ? State::Bad
+            : soon ? State::Doubtful
+                   : State::Good,
+            "the database takes " + Decimal(size / mega) + " MiB, its write-ahead log " + Decimal(journal / mega) +
+                " MiB; " + Decimal(left / mega) + " MiB are left",
+            full || left < 512 * mega ? "delete old rows, or move the logs to a larger disk"
+            : soon                    ? "quorlog db checkpoint, with syslog-ng stopped, moves the log into the database"
+                                      : "",
+            {{"database_bytes", size}, {"journal_bytes", journal}, {"free_bytes", left}}};
+}
+
+Finding lookAtNotices() {
+    const bool set = IsNotificationSet();
+    return {"notices",
+            set ? State::Good : State::Doubtful,
+            set ? "a channel is set up" : "no channel is set up: matches of the rules are events only",
+            set ? "" : std::string("set one up in ") + paths::kSystemSettings + ", then: quorlog notify test",
+            {}};
+}
+
+// A check that cannot be made is a finding, too.
+Finding guarded(const char* check, const std::function<Finding()>& look) {
+    try {
+        return look();
+    } catch (const Failure& failure) {
+        return {check, State::Bad, failure.what(), "", {}};
+    }
+}
+
+std::vector<Finding> examine(const DoctorOptions& options) {
+    const std::string db = store::AbsolutePath(options.db);
+    std::vector<Finding> findings = {lookAtReceiver(options.control), lookAtUdp()};
+    findings.push_back(guarded("quorlogd", [&] { return lookAtFollower(db); }));
+    findings.push_back(guarded("rows", [&] { return lookAtRows(*store::OpenSource(db)); }));
+    findings.push_back(lookAtSpace(db));
+    findings.push_back(lookAtNotices());
+    return findings;
+}
+
+const char* nameOf(State state) {
+    constexpr const char* kNames[] = {"good", "look", "bad"};
+    return kNames[static_cast<size_t>(state)];
+}
+
+void writeMetrics(const std::vector<Finding>& findings) {
+    for (const Finding& finding : findings) {
+        WriteLine(std::string("quorsyslog_check{name=\"") + finding.check + "\"} " +
+                  std::to_string(static_cast<int>(finding.state)));
+        for (const auto& [name, value] : finding.measures) {
+            WriteLine(std::string("quorsyslog_") + name + " " + Decimal(value));
+        }
+    }
+}
+
+void writeTable(const std::string& format, const std::vector<Finding>& findings) {
+    OutputOptions output;
+    output.format = format;
+    Output out(STDOUT_FILENO);
+    const auto sink = MakeSink(output.style(), {{"check"}, {"state"}, {"found"}, {"advice"}}, out);
+    for (const Finding& finding : findings) {
+        sink->row({finding.check, nameOf(finding.state), finding.detail, finding.advice});
+    }
+    sink->finish();
+}
+
+int run(const DoctorOptions& options) {
+    const std::vector<Finding> findings = examine(options);
+    if (options.format == "prometheus") {
+        writeMetrics(findings);
+        return kDone;
+    }
+    writeTable(options.format, findings);
+    State worst = State::Good;
+    for (const Finding& finding : findings) {
+        worst = std::max(worst, finding.state);
+    }
+    return static_cast<int>(worst);  // 0, 1 and 2, as everywhere
+}
+
+}  // namespace
+
+void AddDoctor(CLI::App& app, int& status) {
+    AddCommand<DoctorOptions>(app, "doctor", "Say whether logs are received, counted and announced", status, setup,
+                              run);
+}
+
+}  // namespace quor::cli
