@@ -18,11 +18,11 @@ std::string quoted(const std::string& text, int op = SYSLOG_OP_EQUAL) {
 }
 
 // "column IN ('a', 'b') OR column GLOB 'c*'"
-std::string renderedList(const std::string& column, const std::list<std::string>& values) {
+std::string renderedList(const std::string& column, const std::list<std::string>& values, bool patternsToo) {
     std::string names;
     std::string patterns;
     for (const std::string& value : values) {
-        if (value.find_first_of("*?") == std::string::npos) {
+        if (!patternsToo || value.find_first_of("*?") == std::string::npos) {
             names += (names.empty() ? "" : ", ") + quoted(value);
         } else {
             patterns += " OR " + column + " GLOB " + quoted(value, SYSLOG_OP_GLOB);
@@ -45,7 +45,7 @@ std::string rendered(const ColumnCondition& condition) {
     case Match::AtMost:
         return column + " <= (" + first + ", " + last + ")";
     default:
-        return renderedList(column, condition.values);
+        return renderedList(column, condition.values, condition.match == Match::Like);
     }
 }
 

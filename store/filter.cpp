@@ -196,9 +196,10 @@ void addTimes(const Span& span, std::list<ColumnCondition>& conditions) {
 // What the library has no form for; it leaves it out of `options`.
 std::list<ColumnCondition> takeColumns(FilterOptions& options) {
     std::list<ColumnCondition> conditions;
+    const Match any = options.patterns ? Match::Like : Match::Any;
     const auto addList = [&](std::string& names, const char* column, bool negated) {
         if (isList(names)) {
-            conditions.push_back({column, Tokenize(names, ","), Match::Any, negated});
+            conditions.push_back({column, Tokenize(names, ","), any, negated});
         }
         names.clear();
     };
@@ -218,10 +219,10 @@ std::list<ColumnCondition> takeColumns(FilterOptions& options) {
     addList(options.notFacility, "fac", true);
     addList(options.notProgram, "prog", true);
     addPart(options.notKeyword, "msg", part, true);
-    if (holdsWildcard(options.host)) {
+    if (options.patterns && holdsWildcard(options.host)) {
         addList(options.host, "host", false);
     }
-    if (holdsWildcard(options.program)) {
+    if (options.patterns && holdsWildcard(options.program)) {
         addList(options.program, "prog", false);
     }
     if (options.ignoreCase) {
@@ -281,6 +282,7 @@ std::vector<Probe> BuildProbes(const FilterOptions& options, const std::string& 
     for (const Given& given : kFilters) {
         if (given.isName) {
             FilterOptions alone;
+            alone.patterns = options.patterns;
             alone.*given.value = options.*given.value;
             add("has " + std::string(given.option) + " " + options.*given.value, alone);
         }

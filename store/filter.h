@@ -13,7 +13,8 @@ namespace quor::store {
 
 // How a column compares.
 enum class Match {
-    Any,         // it is one of the values, of which those with "*" or "?" are patterns
+    Any,         // it is one of the values
+    Like,        // the same, and values with "*" or "?" are patterns
     Part,        // the one value is part of it
     PartNoCase,  // the same, whatever the case of ASCII letters
     AtLeast,     // two columns, written as such, compared with two values
@@ -36,8 +37,7 @@ struct Conditions {
     bool empty() const { return attributes.empty() && columns.empty(); }
 };
 
-// As a person gives them; the empty text leaves a filter out. The names of a list are separated by commas. Hosts and
-// programs may hold "*" and "?".
+// As a person gives them; the empty text leaves a filter out. The names of a list are separated by commas.
 struct FilterOptions {
     std::string host;
     std::string level;
@@ -58,6 +58,7 @@ struct FilterOptions {
     std::string notProgram;
     std::string notKeyword;
     bool ignoreCase = false;  // of the keywords, for ASCII letters
+    bool patterns = false;    // names may hold "*" and "?"; else they are taken as they stand, whatever a sender wrote
 };
 
 struct Filter {

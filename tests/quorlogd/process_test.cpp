@@ -219,11 +219,14 @@ TEST_F(QuorlogdProcess, OneDeviceCannotSilenceTheOthers) {
             .run("INSERT INTO logs(host, ip, prog, msg) VALUES('" + std::string(address) + "', '" + address +
                  "', 'quorlogd', 'it''s not sent')");
     }
+    SqliteFile(paths::kWorkingDb)
+        .run("INSERT INTO logs(host, ip, prog, msg, msgid, sdata) VALUES('data', '10.0.0.2', 'app', 'plain', 'ID', "
+             "'it''s data')");
     store(1000, "it''s < a flood", "flood");
     for (int i = 0; i < 20; ++i) {
         store(1, "it''s down", "quiet" + std::to_string(i) + "-");
     }
-    EXPECT_TRUE(counts(1024));
+    EXPECT_TRUE(counts(1025));
     const auto holding = [](const std::string& text) {
         const Strings all = events();
         return std::count_if(all.begin(), all.end(),
@@ -231,6 +234,7 @@ TEST_F(QuorlogdProcess, OneDeviceCannotSilenceTheOthers) {
     };
     EXPECT_TRUE(Eventually([&] { return holding(": [quiet") == 20; })) << testing::PrintToString(events());
     EXPECT_EQ(holding("[10.0.0.1:") * 10 + holding("[127.0.0.1:"), 10);
+    EXPECT_EQ(holding("app: plain ID it's data]"), 1);
     EXPECT_LE(holding("[flood"), 22);
     EXPECT_GE(holding("[flood1: 2026-11-21 05:15:54 kernel[7]: it's \u2039 a flood]"), 1);
     EXPECT_TRUE(Eventually([&] { return holding("more logs that match a rule were held back: flood") == 1; }));

@@ -62,13 +62,15 @@ void AddTableOption(CLI::App& command, std::string& table) {
         ->check(namesOf(store::kLogTables));
 }
 
-void AddFilterOptions(CLI::App& command, store::FilterOptions& filters) {
-    addList(command, "--host", filters.host, "Sending hosts; * and ? stand for any text");
+void AddFilterOptions(CLI::App& command, store::FilterOptions& filters, bool patterns) {
+    filters.patterns = patterns;
+    const std::string like = patterns ? "; * and ? stand for any text" : "";
+    addList(command, "--host", filters.host, "Sending hosts" + like);
     addList(command, "--level", filters.level, "Levels, such as err,crit; err+ is err and worse");
     addList(command, "--facility", filters.facility, "Facilities, such as kern,auth");
-    addList(command, "--program", filters.program, "Programs; * and ? stand for any text");
+    addList(command, "--program", filters.program, "Programs" + like);
     addList(command, "--pid", filters.pid, "Process ids");
-    addList(command, "--ip", filters.ip, "Addresses of senders; * and ? stand for any text");
+    addList(command, "--ip", filters.ip, "Addresses of senders" + like);
     addList(command, "--msgid", filters.msgid, "Message ids (RFC 5424)");
     addFilter(command, "--sdata", filters.sdata, "TEXT", "Structured data that contains the text (RFC 5424)");
     CLI::Option* keyword = addFilter(command, "--keyword", filters.keyword, "TEXT", "Messages that contain the text");

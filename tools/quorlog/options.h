@@ -27,7 +27,8 @@ struct OutputOptions {
 
 void AddDatabaseOption(CLI::App& command, std::string& db);
 void AddTableOption(CLI::App& command, std::string& table);
-void AddFilterOptions(CLI::App& command, store::FilterOptions& filters);
+// `patterns`: names may hold "*" and "?".
+void AddFilterOptions(CLI::App& command, store::FilterOptions& filters, bool patterns);
 void AddOutputOptions(CLI::App& command, OutputOptions& output);
 void AddYesOption(CLI::App& command, bool& yes);
 

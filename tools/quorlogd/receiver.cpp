@@ -48,11 +48,12 @@ int64_t secondOf(const store::Record& record) {
     return record.rsec != 0 ? record.rsec : record.utcsec;
 }
 
-// What a person wants to see of a match.
-std::string contentOf(const store::Record& record) {
+// What a person wants to see of a match; what surrounds the message only when the keyword stands there.
+std::string contentOf(const store::Record& record, const std::string& keyword = "") {
     const std::string program = record.prog + (record.pid.empty() ? "" : "[" + record.pid + "]");
-    const std::string data = record.sdata.empty() || record.sdata == record.msg ? "" : " " + record.sdata;
-    return FitForNotice(record.ldate + " " + record.ltime + " " + program + ": " + record.msg + data);
+    const bool inMessage = record.msg.find(keyword) != std::string::npos;
+    const std::string around = inMessage ? "" : " " + record.msgid + " " + record.sdata;
+    return FitForNotice(record.ldate + " " + record.ltime + " " + program + ": " + record.msg + around);
 }
 
 // The filter's least seconds between two notices of a kind.
@@ -203,8 +204,8 @@ void Receiver::judge(const store::Record& record, const std::string& device) {
     }
     if (!keyword.empty() && alarms_.grant(kKeyword, device, Clock::now())) {
         matched_ = true;
-        (void)rules_.NotificationSendKeyword(record.host, keyword, contentOf(record));
-        (void)Logger().LogAddNotifyKw(EventText(keyword), EventText(record.host + ": " + contentOf(record)));
+        (void)rules_.NotificationSendKeyword(record.host, keyword, contentOf(record, keyword));
+        (void)Logger().LogAddNotifyKw(EventText(keyword), EventText(record.host + ": " + contentOf(record, keyword)));
     }
 }
 

@@ -27,7 +27,7 @@ struct CountOptions {
 void setup(CLI::App& command, CountOptions& options) {
     AddDatabaseOption(command, options.db);
     AddTableOption(command, options.table);
-    AddFilterOptions(command, options.filters);
+    AddFilterOptions(command, options.filters, true);
     AddOutputOptions(command, options.output);
     CLI::Option* by =
         command.add_option("--by", options.by, "Count each host, program, level, facility, hour, day or message apart")
@@ -44,7 +44,8 @@ void setup(CLI::App& command, CountOptions& options) {
 std::string barOf(uint64_t rows, uint64_t most) {
     constexpr double kFull = 30;
     const double part = static_cast<double>(rows) / static_cast<double>(most);
-    return std::string(static_cast<size_t>(std::max(1.0, kFull * part)), '#');
+    std::string bar;
+    return bar.append(static_cast<size_t>(std::max(1.0, kFull * part)), '#');
 }
 
 int runBy(const CountOptions& options, const store::Source& source, const store::Selection& selection) {

@@ -20,7 +20,7 @@ struct DeleteOptions {
 
 void setup(CLI::App& command, DeleteOptions& options) {
     AddDatabaseOption(command, options.db);
-    AddFilterOptions(command, options.filters);
+    AddFilterOptions(command, options.filters, false);
     command.add_flag("--all", options.all, "Delete every row; needed when no filter is given");
     AddYesOption(command, options.yes);
 }

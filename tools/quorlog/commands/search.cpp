@@ -40,7 +40,7 @@ struct SearchOptions {
 void setup(CLI::App& command, SearchOptions& options) {
     AddDatabaseOption(command, options.db);
     AddTableOption(command, options.table);
-    AddFilterOptions(command, options.filters);
+    AddFilterOptions(command, options.filters, true);
     AddOutputOptions(command, options.output);
     AddNumberOption(command, "-n,--limit", options.limit, "Number of rows, 0 for all; a terminal shows 50 by default")
         ->each([&options](const std::string&) { options.limited = true; });
