@@ -1,5 +1,7 @@
 #include "store/receiving.h"
 
+#include <fcntl.h>
+#include <sys/file.h>
 #include <sys/socket.h>
 #include <sys/un.h>
 
@@ -113,6 +115,12 @@ std::map<uint64_t, uint64_t> UdpDrops(unsigned port) {
         addUdpDrops(readFile(table), port, drops);
     }
     return drops;
+}
+
+int FollowerProcess() {
+    const Descriptor file(open(paths::kReceiverPid, O_RDONLY | O_CLOEXEC));
+    const bool runs = file && flock(file.get(), LOCK_SH | LOCK_NB) != 0;
+    return runs ? ToInt32(readFile(paths::kReceiverPid).c_str()) : 0;
 }
 
 unsigned ReceivingPort() {

@@ -1,6 +1,4 @@
 // doctor: what is wrong with receiving, following, space and notices, and what to do about it.
-#include <fcntl.h>
-#include <sys/file.h>
 #include <sys/stat.h>
 #include <sys/statvfs.h>
 #include <unistd.h>
@@ -13,7 +11,6 @@
 #include <map>
 #include <optional>
 
-#include "base/guards.h"
 #include "base/numbers.h"
 #include "base/paths.h"
 #include "notification.h"
@@ -100,12 +97,6 @@ Finding lookAtUdp() {
             {{"datagrams_dropped", dropped}}};
 }
 
-// Whoever holds the lock runs.
-bool isFollowerRunning() {
-    const Descriptor file(open(paths::kReceiverPid, O_RDONLY | O_CLOEXEC));
-    return file && flock(file.get(), LOCK_SH | LOCK_NB) != 0;
-}
-
 // Nothing when it has never followed the database.
 std::optional<uint64_t> positionIn(const store::Source& source) {
     const std::vector<std::string> found =
@@ -120,7 +111,7 @@ std::optional<uint64_t> positionIn(const store::Source& source) {
 }
 
 Finding lookAtFollower(const std::string& db) {
-    if (!isFollowerRunning()) {
+    if (store::FollowerProcess() == 0) {
         return {"quorlogd",
                 State::Bad,
                 "does not run: nothing is counted, judged or announced",

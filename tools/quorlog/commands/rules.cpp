@@ -1,10 +1,14 @@
 // rules list, set, test: the notification rules.
 #include <algorithm>
 #include <array>
+#include <cerrno>
+#include <csignal>
+#include <cstring>
 
 #include "base/paths.h"
 #include "common/handles.h"
 #include "notification.h"
+#include "store/receiving.h"
 #include "tools/quorlog/commands/commands.h"
 #include "tools/quorlog/display.h"
 #include "tools/quorlog/messages.h"
@@ -131,6 +135,22 @@ void apply(const SetOptions& options, Rule& rule) {
     }
 }
 
+// A rule that nobody checks, or whose notices reach nobody, should not be a surprise later.
+void putInForce() {
+    const int process = store::FollowerProcess();
+    if (process == 0) {
+        Complain("quorlogd does not run; it reads the rules when it starts");
+    } else if (kill(process, SIGHUP) != 0) {
+        Complain(std::string("quorlogd could not be told: ") + strerror(errno) + "; run: systemctl reload quorlogd");
+    } else {
+        WriteLine("quorlogd checks by it from now on");
+    }
+    if (!IsNotificationSet()) {
+        Complain(std::string("matches become events only: no channel for notices is set up in ") +
+                 paths::kSystemSettings);
+    }
+}
+
 int runSet(const SetOptions& options) {
     checkTexts(options);
     const std::vector<std::string> names = ruleNames();
@@ -148,6 +168,7 @@ int runSet(const SetOptions& options) {
     }
     WriteLine("set rule " + options.name + ": " + typeName(rule) + " " + threshold(rule) +
               (rule.notify_enable ? "" : ", disabled"));
+    putInForce();
     return kDone;
 }
 
