@@ -80,6 +80,11 @@ std::vector<std::string> Ask(const std::string& db, const std::string& sql, cons
     return texts;
 }
 
+std::string Literal(const std::string& text) {
+    const _SYSLOG_SQL_COND_tag value{SYSLOG_ATTRI_HOST, SYSLOG_OP_EQUAL, text, {}};
+    return "'" + CondValueEscape(&value) + "'";
+}
+
 void RequireTable(const std::string& db, const std::string& table) {
     (void)Ask(db, "SELECT 1 FROM " + table + " LIMIT 1", "1");
 }

@@ -21,6 +21,9 @@ Result Execute(const Connection& connection, const std::string& db, const std::s
 // The texts of one column of the result. Fails as these do.
 std::vector<std::string> Ask(const std::string& db, const std::string& sql, const char* column);
 
+// The text as a literal of a statement.
+std::string Literal(const std::string& text);
+
 // Failure when the table is not there: several readers of the library cannot tell that from an empty one.
 void RequireTable(const std::string& db, const std::string& table);
 

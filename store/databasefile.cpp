@@ -37,4 +37,10 @@ std::string RequireLogDatabase(const std::string& path) {
     return RequireDatabase(path, "start syslog-ng, give another --db, or run quorlog db create");
 }
 
+uint64_t SizeOf(const std::string& path) {
+    std::error_code missing;
+    const uintmax_t size = std::filesystem::file_size(path, missing);
+    return missing ? 0 : size;
+}
+
 }  // namespace quor::store

@@ -2,6 +2,7 @@
 #ifndef STORE_DATABASEFILE_H
 #define STORE_DATABASEFILE_H
 
+#include <cstdint>
 #include <string>
 
 namespace quor::store {
@@ -13,6 +14,9 @@ std::string AbsolutePath(const std::string& path);
 std::string RequireDatabase(const std::string& path, const std::string& advice);
 // The same for a log database.
 std::string RequireLogDatabase(const std::string& path);
+
+// Bytes of a file; 0 when there is none.
+uint64_t SizeOf(const std::string& path);
 
 }  // namespace quor::store
 

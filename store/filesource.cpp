@@ -12,8 +12,8 @@ namespace {
 
 const std::string kNoIdentity = "file ";
 
-std::string quoted(const std::string& text, int op = SYSLOG_OP_EQUAL) {
-    const _SYSLOG_SQL_COND_tag value{SYSLOG_ATTRI_HOST, op, text, {}};
+std::string pattern(const std::string& text) {
+    const _SYSLOG_SQL_COND_tag value{SYSLOG_ATTRI_HOST, SYSLOG_OP_GLOB, text, {}};
     return "'" + CondValueEscape(&value) + "'";
 }
 
@@ -23,9 +23,9 @@ std::string renderedList(const std::string& column, const std::list<std::string>
     std::string patterns;
     for (const std::string& value : values) {
         if (!patternsToo || value.find_first_of("*?") == std::string::npos) {
-            names += (names.empty() ? "" : ", ") + quoted(value);
+            names += (names.empty() ? "" : ", ") + Literal(value);
         } else {
-            patterns += " OR " + column + " GLOB " + quoted(value, SYSLOG_OP_GLOB);
+            patterns += " OR " + column + " GLOB " + pattern(value);
         }
     }
     return column + " IN (" + names + ")" + patterns;
@@ -33,8 +33,8 @@ std::string renderedList(const std::string& column, const std::list<std::string>
 
 std::string rendered(const ColumnCondition& condition) {
     const std::string column = condition.column;
-    const std::string first = quoted(condition.values.front());
-    const std::string last = quoted(condition.values.back());
+    const std::string first = Literal(condition.values.front());
+    const std::string last = Literal(condition.values.back());
     switch (condition.match) {
     case Match::Part:
         return "instr(" + column + ", " + first + ")";

@@ -1,5 +1,6 @@
 #include <gtest/gtest.h>
 
+#include "store/event.h"
 #include "tools/quorlogd/alarms.h"
 #include "tools/quorlogd/devices.h"
 #include "tools/quorlogd/noticetext.h"
@@ -24,7 +25,7 @@ TEST(FitForNotice, FitsTheNoticeWhateverNeedsEscaping) {
 }
 
 TEST(EventText, IsALiteralAndNoMarkup) {
-    EXPECT_EQ(quor::EventText("it's <b>\x1b[2J\n\xc3\xa9"), "it''s \u2039b> [2J \xc3\xa9");
+    EXPECT_EQ(quor::store::EventText("it's <b>\x1b[2J\n\xc3\xa9"), "it''s \u2039b> [2J \xc3\xa9");
 }
 
 TEST(Alarms, ShareTheNoticesOfAMinute) {

@@ -1,15 +1,13 @@
 #include "tools/quorlogd/announce.h"
 
-#include "base/paths.h"
 #include "common/handles.h"
-#include "logger.h"
 #include "notification.h"
-#include "tools/quorlogd/noticetext.h"
+#include "store/event.h"
 
 namespace quor {
 
 void RecordEvent(const std::string& text) {
-    (void)Logger().LogAdd(paths::kEventDb, 1, "SYSTEM", EventText("Event detection: " + text));
+    store::RecordEvent("SYSTEM", "Event detection: " + text);
 }
 
 void SendNotice(const char* tag, const std::map<std::string, std::string>& values) {

@@ -46,20 +46,4 @@ std::string FitForNotice(const std::string& message) {
     return message.substr(0, characterStart(message, kept)) + kMarker;
 }
 
-std::string EventText(const std::string& text) {
-    std::string safe;
-    safe.reserve(text.size());
-    for (const char c : text) {
-        if (c == '\'') {
-            safe += "''";
-        } else if (c == '<') {
-            safe += "\u2039";
-        } else {
-            const bool control = static_cast<unsigned char>(c) < ' ' || c == '\x7f';
-            safe += control ? ' ' : c;
-        }
-    }
-    return safe;
-}
-
 }  // namespace quor

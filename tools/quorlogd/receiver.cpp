@@ -14,6 +14,7 @@
 #include "dbhandler.h"
 #include "logger.h"
 #include "store/ask.h"
+#include "store/event.h"
 #include "store/failure.h"
 #include "tools/quorlogd/announce.h"
 #include "tools/quorlogd/noticetext.h"
@@ -200,12 +201,13 @@ void Receiver::judge(const store::Record& record, const std::string& device) {
     if (severe && alarms_.grant(kSeverity, device, Clock::now())) {
         matched_ = true;
         (void)rules_.NotificationSendSev(record.host, PriorTypeToStr(record.prio), contentOf(record));
-        (void)Logger().LogAddNotifySev(record.prio, EventText(record.host + ": " + contentOf(record)));
+        (void)Logger().LogAddNotifySev(record.prio, store::EventText(record.host + ": " + contentOf(record)));
     }
     if (!keyword.empty() && alarms_.grant(kKeyword, device, Clock::now())) {
         matched_ = true;
         (void)rules_.NotificationSendKeyword(record.host, keyword, contentOf(record, keyword));
-        (void)Logger().LogAddNotifyKw(EventText(keyword), EventText(record.host + ": " + contentOf(record, keyword)));
+        (void)Logger().LogAddNotifyKw(store::EventText(keyword),
+                                      store::EventText(record.host + ": " + contentOf(record, keyword)));
     }
 }
 

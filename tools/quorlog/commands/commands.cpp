@@ -35,6 +35,7 @@ void AddCommands(CLI::App& app, int& status) {
     AddRules(app, status);
     AddNotify(app, status);
     AddDb(app, status);
+    AddBackup(app, status);
     AddDoctor(app, status);
     AddParse(app, status);
 }

@@ -18,6 +18,7 @@ void AddEvents(CLI::App& app, int& status);
 void AddRules(CLI::App& app, int& status);
 void AddNotify(CLI::App& app, int& status);
 void AddDb(CLI::App& app, int& status);
+void AddBackup(CLI::App& app, int& status);
 void AddDoctor(CLI::App& app, int& status);
 void AddParse(CLI::App& app, int& status);
 

@@ -37,11 +37,6 @@ void connect(DbSession& session, const std::string& path) {
     }
 }
 
-uint64_t sizeOf(const std::string& path) {
-    struct stat status = {};
-    return stat(path.c_str(), &status) == 0 ? static_cast<uint64_t>(status.st_size) : 0;
-}
-
 int runCreate(const DbOptions& options) {
     const std::string db = store::AbsolutePath(options.db);
     RequirePlainPath(db, Quoting::Double);
@@ -73,8 +68,8 @@ int runInfo(const DbOptions& options) {
     Output out(STDOUT_FILENO);
     WriteRecord(options.output.style(),
                 {{"path", db},
-                 {"bytes", std::to_string(sizeOf(db)), Kind::Number},
-                 {"wal_bytes", std::to_string(sizeOf(db + "-wal")), Kind::Number},
+                 {"bytes", std::to_string(store::SizeOf(db)), Kind::Number},
+                 {"wal_bytes", std::to_string(store::SizeOf(db + "-wal")), Kind::Number},
                  {"device", described ? info.device : ""},
                  {"logs", std::to_string(rows), Kind::Number},
                  {"oldest", rows == 0 ? "" : handle->DBInfoStartStrGet()},

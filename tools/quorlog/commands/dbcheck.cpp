@@ -10,6 +10,7 @@
 #include "store/ask.h"
 #include "store/databasefile.h"
 #include "tools/quorlog/commands/commands.h"
+#include "tools/quorlog/deeds.h"
 #include "tools/quorlog/messages.h"
 #include "tools/quorlog/options.h"
 #include "tools/quorlog/shellpath.h"
@@ -103,6 +104,7 @@ int runLimit(const CareOptions& options) {
         throw Failure("cannot remove " + db + "; make sure that you may write to its folder", store::Cause::Denied);
     }
     WriteLine("removed " + db);
+    RecordDeed("Removed " + db + ", which had grown too large");
     if (SyslogngHupSignalSend() < 0) {  // once more: the check does not say whether it could
         Complain("syslog-ng could not be told; if it runs, restart it: it goes on writing to the removed file");
     }

@@ -5,6 +5,7 @@
 #include "store/selection.h"
 #include "store/whynothing.h"
 #include "tools/quorlog/commands/commands.h"
+#include "tools/quorlog/deeds.h"
 #include "tools/quorlog/messages.h"
 #include "tools/quorlog/options.h"
 
@@ -55,6 +56,7 @@ int run(const DeleteOptions& options) {
     }
     source->remove(selection.filter.conditions);
     WriteLine("deleted " + rows);
+    RecordDeed("Deleted " + rows + " from " + source->name());
     return kDone;
 }
 

@@ -152,12 +152,6 @@ Finding lookAtRows(const store::Source& source) {
             {{"last_row_id", last.id}, {"last_row_seconds", static_cast<uint64_t>(std::max<int64_t>(second, 0))}}};
 }
 
-uint64_t sizeOf(const std::string& path) {
-    std::error_code missing;
-    const uintmax_t size = std::filesystem::file_size(path, missing);
-    return missing ? 0 : size;
-}
-
 Finding lookAtSpace(const std::string& db) {
     struct statvfs volume {};
     const std::string folder = std::filesystem::path(db).parent_path();
@@ -165,8 +159,8 @@ Finding lookAtSpace(const std::string& db) {
         return {"space", State::Bad, folder + ": " + strerror(errno), "create it, and start syslog-ng", {}};
     }
     const uint64_t left = static_cast<uint64_t>(volume.f_bavail) * volume.f_frsize;
-    const uint64_t size = sizeOf(db);
-    const uint64_t journal = sizeOf(db + "-wal");
+    const uint64_t size = store::SizeOf(db);
+    const uint64_t journal = store::SizeOf(db + "-wal");
     const uint64_t mega = uint64_t{1} << 20;
     const bool full = left < 64 * mega;
     const bool soon = left < 512 * mega || journal > 256 * mega;

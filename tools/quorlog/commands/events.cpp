@@ -1,5 +1,4 @@
 // events list, html, clear: the package's own event log.
-#include <pwd.h>
 
 #include <algorithm>
 #include <filesystem>
@@ -10,6 +9,7 @@
 #include "store/databasefile.h"
 #include "store/dates.h"
 #include "tools/quorlog/commands/commands.h"
+#include "tools/quorlog/deeds.h"
 #include "tools/quorlog/eventpage.h"
 #include "tools/quorlog/messages.h"
 #include "tools/quorlog/options.h"
@@ -92,14 +92,9 @@ int runHtml(const EventsOptions& options) {
     return kDone;
 }
 
-std::string userName() {
-    const passwd* user = getpwuid(geteuid());
-    return user != nullptr ? user->pw_name : std::to_string(geteuid());
-}
-
 int runClear(const EventsOptions& options) {
     const std::string db = requireEvents(options.db);
-    const std::string user = userName();
+    const std::string user = UserName();
     if ((db + user).find('\'') != std::string::npos) {
         throw Failure("a path or user name with an apostrophe cannot be recorded; rename " + db);
     }

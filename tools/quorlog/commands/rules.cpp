@@ -10,6 +10,7 @@
 #include "notification.h"
 #include "store/receiving.h"
 #include "tools/quorlog/commands/commands.h"
+#include "tools/quorlog/deeds.h"
 #include "tools/quorlog/display.h"
 #include "tools/quorlog/messages.h"
 #include "tools/quorlog/options.h"
@@ -168,6 +169,7 @@ int runSet(const SetOptions& options) {
     }
     WriteLine("set rule " + options.name + ": " + typeName(rule) + " " + threshold(rule) +
               (rule.notify_enable ? "" : ", disabled"));
+    RecordDeed("Set rule " + options.name + ": " + typeName(rule) + " " + threshold(rule));
     putInForce();
     return kDone;
 }
