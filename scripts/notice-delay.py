@@ -30,7 +30,7 @@ threading.Thread(target=server.serve_forever, daemon=True).start()
 connection = socket.create_connection(("127.0.0.1", syslog_port))
 for number in range(count):
     sent[number] = time.monotonic()
-    connection.sendall(f"<13>Nov 21 10:00:00 marked-{number} delay: {keyword} {number}\n".encode())
+    connection.sendall(f"<13>Nov 21 10:00:00 marked-{number} marked: {keyword} {number}\n".encode())
     time.sleep(1)
 end = time.monotonic() + 20
 while len(heard) < count and time.monotonic() < end:
