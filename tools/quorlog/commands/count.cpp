@@ -51,7 +51,7 @@ std::string barOf(uint64_t rows, uint64_t most) {
 int runBy(const CountOptions& options, const store::Source& source, const store::Selection& selection) {
     std::vector<store::Group> groups = CountBy(source, selection, options.by);
     if (options.limit != 0 && groups.size() > options.limit) {
-        groups.resize(options.limit);
+        groups.resize(static_cast<size_t>(options.limit));
     }
     uint64_t most = 0;
     for (const store::Group& group : groups) {
