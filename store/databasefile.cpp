@@ -37,6 +37,12 @@ std::string RequireLogDatabase(const std::string& path) {
     return RequireDatabase(path, "start syslog-ng, give another --db, or run quorlog db create");
 }
 
+void RemoveCompanions(const std::string& path) {
+    for (const char* companion : {"-wal", "-shm"}) {
+        (void)unlink((path + companion).c_str());
+    }
+}
+
 uint64_t SizeOf(const std::string& path) {
     std::error_code missing;
     const uintmax_t size = std::filesystem::file_size(path, missing);

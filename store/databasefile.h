@@ -15,6 +15,10 @@ std::string RequireDatabase(const std::string& path, const std::string& advice);
 // The same for a log database.
 std::string RequireLogDatabase(const std::string& path);
 
+// Removes the write-ahead log of a database that is about to be removed, and what goes with it: a database that takes
+// its place must not find them.
+void RemoveCompanions(const std::string& path);
+
 // Bytes of a file; 0 when there is none.
 uint64_t SizeOf(const std::string& path);
 

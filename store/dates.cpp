@@ -104,7 +104,11 @@ bool readDateAndTime(const std::string& text, Moment& moment) {
         return false;
     }
     const size_t zone = std::min(text.find_first_of("Z+-", 11), text.size());
-    moment = {text.substr(0, 10), timeOfDay(text.substr(11, zone - 11))};
+    const size_t time = std::min(text.find_first_of(".,", 11), zone);  // a fraction of a second is left out
+    if (time != zone && !isDigits(text.substr(time + 1, zone - time - 1))) {
+        return false;
+    }
+    moment = {text.substr(0, 10), timeOfDay(text.substr(11, time - 11))};
     if (moment.time.empty() || zone == text.size()) {
         return !moment.time.empty();
     }
@@ -121,7 +125,8 @@ bool readDateAndTime(const std::string& text, Moment& moment) {
 
 Moment MomentOf(time_t seconds) {
     const std::string text = LocalTime(seconds);
-    return text.empty() ? Moment() : Moment{text.substr(0, 10), text.substr(11)};
+    const bool comparable = hasShape(text, "dddd-dd-ddTdd:dd:dd");  // years of four digits
+    return comparable ? Moment{text.substr(0, 10), text.substr(11)} : Moment();
 }
 
 Moment ParseMoment(const std::string& text, const std::string& option, time_t now) {
@@ -139,7 +144,7 @@ Moment ParseMoment(const std::string& text, const std::string& option, time_t no
         return {daysAgo(0, now), timeOfDay(text)};
     }
     Moment moment;
-    if (readDateAndTime(text, moment)) {
+    if (readDateAndTime(text, moment) && !moment.empty()) {
         return moment;
     }
     if (days < 0 && text.size() < 8 && text.find_first_of("smh") == text.size() - 1 &&

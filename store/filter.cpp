@@ -156,6 +156,9 @@ Span spanOf(const FilterOptions& options, time_t now) {
     Span span{ParseMoment(options.from, "--from", now), ParseMoment(options.to, "--to", now)};
     if (!options.last.empty()) {
         span.from = MomentOf(now - static_cast<time_t>(ParseSpan(options.last, "--last")));
+        if (span.from.empty()) {
+            throw Failure("--last: '" + options.last + "' is too long ago; give less");
+        }
     }
     if (!span.from.empty() && !span.to.empty() && span.from.text("00:00:00") > span.to.text("23:59:59")) {
         throw Failure("--from " + options.from + options.last + " is after --to " + options.to + "; swap them");
@@ -172,8 +175,11 @@ void check(const FilterOptions& options, const std::string& table) {
             checkNames(given.option, options.*given.value);
         }
     }
-    if (std::max(options.keyword.size(), options.glob.size()) > kMaxPattern) {
-        throw Failure("the text to search for is too long; give at most " + std::to_string(kMaxPattern) + " bytes");
+    for (const Given& given : kFilters) {
+        if ((options.*given.value).size() > kMaxPattern) {
+            throw Failure(std::string(given.option) + ": too long; give at most " + std::to_string(kMaxPattern) +
+                          " bytes");
+        }
     }
     if (!comparesExactly(options.glob)) {
         throw Failure("--glob: the pattern is not UTF-8; give --keyword, which takes any bytes");

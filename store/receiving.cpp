@@ -79,6 +79,7 @@ ReceiverCounts parseCounts(const std::string& statistics, int process) {
         if (line.rfind("dst.sql;d_quor_database#", 0) != 0) {
             return;
         }
+        counts.stores = true;
         const size_t number = line.rfind(';');
         const size_t kind = line.rfind(';', number - 1);
         const std::string_view name = line.substr(kind + 1, number - kind - 1);

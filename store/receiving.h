@@ -12,6 +12,7 @@ namespace quor::store {
 // What syslog-ng says of the log database.
 struct ReceiverCounts {
     int process = 0;       // its number
+    bool stores = false;   // it has the log database as a destination
     uint64_t dropped = 0;  // since its start
     uint64_t queued = 0;
     uint64_t written = 0;  // since its start

@@ -10,6 +10,7 @@
 #include "logger.h"
 #include "notification.h"
 #include "quor/quorcore.h"
+#include "store/databasefile.h"
 
 namespace quor {
 namespace {
@@ -81,7 +82,9 @@ void Housekeeping::check() {
     if (options_.volumeFullPercent > 0) {
         checkVolume();
     }
-    if (options_.workingDbMaxKb != 0) {
+    if (options_.workingDbMaxKb != 0 &&
+        store::SizeOf(options_.db) / 1024 > static_cast<uint64_t>(options_.workingDbMaxKb)) {
+        store::RemoveCompanions(options_.db);
         (void)SyslogngWorkingDbCheck(options_.db, options_.workingDbMaxKb);  // there may be none yet
     }
 }

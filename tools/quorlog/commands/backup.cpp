@@ -2,9 +2,12 @@
 #include <fcntl.h>
 #include <sys/stat.h>
 #include <sys/statvfs.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
 #include <cerrno>
+#include <csignal>
+#include <cstdlib>
 #include <cstring>
 #include <filesystem>
 
@@ -46,15 +49,21 @@ void requireRoom(const std::string& db, const std::string& folder) {
     }
 }
 
-// A file that goes away unless it becomes what it should.
+// A file of its own, which goes away unless it becomes what it should.
 class Draft {
   public:
-    explicit Draft(const std::string& target) : target_(target), path_(target + ".partial") {
-        (void)unlink(path_.c_str());
+    explicit Draft(std::string target) : target_(std::move(target)), path_(target_ + ".XXXXXX") {
+        if (!Descriptor(mkstemp(path_.data()))) {
+            throw Failure("cannot write " + target_ + ": " + strerror(errno) + "; give another file",
+                          store::Cause::Denied);
+        }
     }
     Draft(const Draft&) = delete;
     Draft& operator=(const Draft&) = delete;
-    ~Draft() { (void)unlink(path_.c_str()); }
+    ~Draft() {
+        (void)unlink(path_.c_str());
+        (void)unlink((path_ + "-journal").c_str());
+    }
 
     const std::string& path() const { return path_; }
     void finish() const {
@@ -63,12 +72,46 @@ class Draft {
             throw Failure("cannot write " + target_ + ": " + strerror(errno) + "; give another file",
                           store::Cause::Other);
         }
+        (void)fchmod(file.get(), 0640);  // a disk without such modes is none the worse
     }
 
   private:
     std::string target_;
     std::string path_;
 };
+
+// In a process of its own, so that the draft is removed whatever signal ends this one. The exit status.
+int copy(const std::string& db, const std::string& draft) {
+    sigset_t watched;
+    sigset_t before;
+    sigemptyset(&watched);
+    for (const int number : {SIGINT, SIGTERM, SIGHUP, SIGQUIT, SIGCHLD}) {
+        sigaddset(&watched, number);
+    }
+    (void)signal(SIGCHLD, SIG_DFL);  // a caller may have had it ignored
+    sigprocmask(SIG_BLOCK, &watched, &before);
+    const pid_t child = fork();
+    if (child == 0) {
+        int status = kDone;
+        try {
+            (void)store::Ask(db, "VACUUM INTO " + store::Literal(draft), "");
+        } catch (const Failure& failure) {
+            Complain(failure.what());
+            status = kFailed;
+        }
+        _exit(status);
+    }
+    int status = kFailed;
+    if (child > 0) {
+        if (sigwaitinfo(&watched, nullptr) != SIGCHLD) {
+            (void)kill(child, SIGKILL);
+        }
+        const bool ended = waitpid(child, &status, 0) == child && WIFEXITED(status);
+        status = ended ? WEXITSTATUS(status) : kFailed;
+    }
+    sigprocmask(SIG_SETMASK, &before, nullptr);
+    return status;
+}
 
 int run(const BackupOptions& options) {
     const std::string db = store::RequireLogDatabase(options.db);
@@ -78,15 +121,18 @@ int run(const BackupOptions& options) {
         throw Failure(target + " exists already; move it away or give another file");
     }
     requireRoom(db, std::filesystem::path(target).parent_path());
-    (void)umask(027);  // it holds log content
+    store::RequireTable(db, "logs");
     const Draft draft(target);
-    (void)store::Ask(db, "VACUUM INTO " + store::Literal(draft.path()), "");
+    if (copy(db, draft.path()) != kDone) {
+        Complain("no backup was made");
+        return kFailed;
+    }
     if (store::Ask(draft.path(), "PRAGMA quick_check", "quick_check") != std::vector<std::string>{"ok"}) {
         throw Failure("the backup is not sound; run quorlog db check on " + db, store::Cause::Damaged);
     }
     const uint64_t rows = Count(*store::OpenSource(draft.path()), {});
     draft.finish();
-    WriteLine("saved " + std::to_string(rows) + " rows in " + target);
+    WriteLine("saved " + std::to_string(rows) + (rows == 1 ? " row in " : " rows in ") + target);
     RecordDeed("Backed up " + db + " to " + target);
     return kDone;
 }

@@ -85,6 +85,10 @@ int runWal(const CareOptions& options) {
 
 int runLimit(const CareOptions& options) {
     const std::string db = store::RequireLogDatabase(options.db);
+    store::RequireTable(db, "logs");  // nothing else is removed
+    if (std::filesystem::is_symlink(db)) {
+        throw Failure(db + " is a symbolic link; give the file that it leads to");
+    }
     const uint64_t kilobytes = std::filesystem::file_size(db) / 1024;
     const std::string size = db + " takes " + std::to_string(kilobytes) + " KiB";
     if (options.kilobytes > INT32_MAX || kilobytes <= options.kilobytes) {
@@ -99,6 +103,7 @@ int runLimit(const CareOptions& options) {
     struct stat before {};
     struct stat after {};
     (void)fstat(file.get(), &before);
+    store::RemoveCompanions(db);
     if (SyslogngWorkingDbCheck(db, static_cast<int>(options.kilobytes)) < 0 || fstat(file.get(), &after) != 0 ||
         after.st_nlink >= before.st_nlink) {
         throw Failure("cannot remove " + db + "; make sure that you may write to its folder", store::Cause::Denied);

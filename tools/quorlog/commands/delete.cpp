@@ -27,7 +27,24 @@ void setup(CLI::App& command, DeleteOptions& options) {
 }
 
 // A deletion has to say what it means: an empty filter is a slip more often than a wish.
+void checkNames(const store::FilterOptions& filters) {
+    for (const std::string* names :
+         {&filters.host, &filters.level, &filters.facility, &filters.program, &filters.pid, &filters.msgid, &filters.ip,
+          &filters.notHost, &filters.notLevel, &filters.notFacility, &filters.notProgram}) {
+        if (*names == "any") {
+            throw Failure("'any' means every row; leave that filter out");
+        }
+    }
+    for (const std::string* names : {&filters.notHost, &filters.notFacility, &filters.notProgram}) {
+        if (names->find_first_of("*?") != std::string::npos) {
+            throw Failure("rows cannot be kept by a name with * or ?, which stand for themselves here: '" + *names +
+                          "'; name each that is to be kept");
+        }
+    }
+}
+
 store::Filter filterOf(const DeleteOptions& options) {
+    checkNames(options.filters);
     store::Filter filter = BuildFilter(options.filters, "logs", time(nullptr));
     const bool filtered = !filter.conditions.empty();
     if (!filter.literal.empty()) {
@@ -45,6 +62,10 @@ int run(const DeleteOptions& options) {
     store::Selection selection;
     selection.filter = filterOf(options);
     const auto source = store::OpenSource(options.db);
+    if (!options.all) {  // rows that arrive while somebody thinks about the question are not part of the answer
+        selection.filter.conditions.attributes.push_back(
+            store::IdCondition(SYSLOG_OP_AT_MOST, LargestId(*source, selection.table)));
+    }
     const uint64_t count = Count(*source, selection);
     if (count == 0) {
         return ReportNothing(WhyNothing(*source, selection, options.filters, 0));

@@ -63,6 +63,13 @@ Finding lookAtReceiver(const std::string& control) {
                 "start it, or name its control socket with --control; only root may ask it",
                 {{"receiver_up", 0}}};
     }
+    if (!counts->stores) {
+        return {"syslog-ng",
+                State::Bad,
+                "runs as process " + std::to_string(counts->process) + ", but stores nothing in a log database",
+                "see that quorsyslog.conf is linked from /etc/syslog-ng/conf.d, and restart it",
+                {{"receiver_up", 1}}};
+    }
     const bool waiting = counts->queued > 1000;
     const bool lost = counts->dropped != 0;
     return {"syslog-ng",
@@ -141,11 +148,12 @@ Finding lookAtRows(const store::Source& source) {
                 {{"last_row_id", 0}}};
     }
     const int64_t second = last.rsec != 0 ? last.rsec : last.utcsec;
+    const std::string when = second != 0 ? store::LocalTime(second) : last.ldate + " " + last.ltime;
     const int64_t age = static_cast<int64_t>(time(nullptr)) - second;
     const bool future = age < -60;
     return {"rows",
             future || age > 86400 ? State::Doubtful : State::Good,
-            "the last, " + Decimal(last.id) + ", came from " + last.host + " at " + store::LocalTime(second),
+            "the last, " + Decimal(last.id) + ", came from " + last.host + " at " + when,
             future        ? "its time is still to come: set the clock of this machine right"
             : age > 86400 ? "no message for a day: see that the devices send to this machine"
                           : "",

@@ -30,7 +30,7 @@ struct EventsOptions {
 void setupList(CLI::App& command, EventsOptions& options) {
     AddDatabaseOption(command, options.db);
     AddOutputOptions(command, options.output);
-    AddNumberOption(command, "--limit", options.limit, "Number of events, 0 for all");
+    AddNumberOption(command, "-n,--limit", options.limit, "Number of events, 0 for all");
     AddNumberOption(command, "--offset", options.offset, "Number of events to skip");
 }
 

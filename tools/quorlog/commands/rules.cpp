@@ -137,14 +137,24 @@ void apply(const SetOptions& options, Rule& rule) {
 }
 
 // A rule that nobody checks, or whose notices reach nobody, should not be a surprise later.
-void putInForce() {
+void putInForce(const Rule& rule) {
+    for (const std::string& name : ruleNames()) {
+        Rule earlier;
+        if (name == rule.name) {
+            break;
+        }
+        if (SyslogNotifyConfGet(kFile, name, earlier) < 0) {
+            Complain("rule '" + name + "' lacks a key, and no rule after it is loaded; repair it first");
+            return;
+        }
+    }
     const int process = store::FollowerProcess();
     if (process == 0) {
         Complain("quorlogd does not run; it reads the rules when it starts");
     } else if (kill(process, SIGHUP) != 0) {
         Complain(std::string("quorlogd could not be told: ") + strerror(errno) + "; run: systemctl reload quorlogd");
     } else {
-        WriteLine("quorlogd checks by it from now on");
+        WriteLine(rule.notify_enable ? "quorlogd checks by it from now on" : "quorlogd leaves it out from now on");
     }
     if (!IsNotificationSet()) {
         Complain(std::string("matches become events only: no channel for notices is set up in ") +
@@ -169,8 +179,9 @@ int runSet(const SetOptions& options) {
     }
     WriteLine("set rule " + options.name + ": " + typeName(rule) + " " + threshold(rule) +
               (rule.notify_enable ? "" : ", disabled"));
-    RecordDeed("Set rule " + options.name + ": " + typeName(rule) + " " + threshold(rule));
-    putInForce();
+    RecordDeed("Set rule " + options.name + ": " + typeName(rule) + " " + threshold(rule) +
+               (rule.notify_enable ? "" : ", disabled"));
+    putInForce(rule);
     return kDone;
 }
 

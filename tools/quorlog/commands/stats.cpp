@@ -39,7 +39,7 @@ void setupDevice(CLI::App& command, StatsOptions& options) {
 
 void setupTop(CLI::App& command, StatsOptions& options) {
     setup(command, options);
-    AddNumberOption(command, "--limit", options.limit, "Number of devices, 0 for all; 10 by default");
+    AddNumberOption(command, "-n,--limit", options.limit, "Number of devices, 0 for all; 10 by default");
 }
 
 void setupEps(CLI::App& command, StatsOptions& options) {

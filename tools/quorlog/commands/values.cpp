@@ -25,7 +25,7 @@ void setup(CLI::App& command, ValuesOptions& options) {
         ->required();
     AddDatabaseOption(command, options.db);
     AddOutputOptions(command, options.output);
-    AddNumberOption(command, "--limit", options.limit, "Number of values, 0 for all");
+    AddNumberOption(command, "-n,--limit", options.limit, "Number of values, 0 for all");
     AddNumberOption(command, "--offset", options.offset, "Number of values to skip");
 }
 
