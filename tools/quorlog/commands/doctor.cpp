@@ -125,6 +125,9 @@ Finding lookAtFollower(const std::string& db) {
                 "start it; the system log tells why it ended",
                 {{"follower_up", 0}}};
     }
+    if (access(db.c_str(), F_OK) != 0) {
+        return {"quorlogd", State::Doubtful, "runs, and waits for " + db, "start syslog-ng", {{"follower_up", 1}}};
+    }
     const auto source = store::OpenSource(db);
     const std::optional<uint64_t> position = positionIn(*source);
     const uint64_t newest = LargestId(*source, "logs");
