@@ -117,14 +117,16 @@ bool readDateAndTime(const std::string& text, Moment& moment) {
         return false;
     }
     tm utc = brokenDown(moment.date, moment.time);
-    moment = MomentOf(timegm(&utc) - offset);
-    return true;
+    const time_t seconds = timegm(&utc);
+    moment = MomentOf(int64_t{seconds} - offset);
+    return seconds != -1;  // which nobody means
 }
 
 }  // namespace
 
-Moment MomentOf(time_t seconds) {
-    const std::string text = LocalTime(seconds);
+Moment MomentOf(int64_t seconds) {
+    const bool known = static_cast<time_t>(seconds) == seconds;  // it may have 32 bits
+    const std::string text = known ? LocalTime(seconds) : "";
     const bool comparable = hasShape(text, "dddd-dd-ddTdd:dd:dd");  // years of four digits
     return comparable ? Moment{text.substr(0, 10), text.substr(11)} : Moment();
 }
@@ -147,9 +149,13 @@ Moment ParseMoment(const std::string& text, const std::string& option, time_t no
     if (readDateAndTime(text, moment) && !moment.empty()) {
         return moment;
     }
+    moment = {};
     if (days < 0 && text.size() < 8 && text.find_first_of("smh") == text.size() - 1 &&
         isDigits(text.substr(0, text.size() - 1))) {
-        return MomentOf(now - static_cast<time_t>(ParseSpan(text, option)));
+        moment = MomentOf(int64_t{now} - static_cast<int64_t>(ParseSpan(text, option)));
+    }
+    if (!moment.empty()) {
+        return moment;
     }
     throw Failure(option + ": no such time '" + text +
                   "'; give 6h, today, yesterday, 7d, 10:00, YYYY-MM-DD or 'YYYY-MM-DD hh:mm'");

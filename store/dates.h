@@ -22,7 +22,8 @@ struct Moment {
 // ago), "10:00" (of today), "YYYY-MM-DD 10:00:30", and the same with a "T" and, if wanted, a zone as in ISO 8601. The
 // empty text is no moment. `option` is named in the Failure of anything else.
 Moment ParseMoment(const std::string& text, const std::string& option, time_t now);
-Moment MomentOf(time_t seconds);
+// Empty when the machine has no time for these Unix seconds, or its year has not four digits.
+Moment MomentOf(int64_t seconds);
 
 // The first and the last second of a moment.
 time_t BeginOf(const Moment& moment);

@@ -155,7 +155,7 @@ Span spanOf(const FilterOptions& options, time_t now) {
     }
     Span span{ParseMoment(options.from, "--from", now), ParseMoment(options.to, "--to", now)};
     if (!options.last.empty()) {
-        span.from = MomentOf(now - static_cast<time_t>(ParseSpan(options.last, "--last")));
+        span.from = MomentOf(int64_t{now} - static_cast<int64_t>(ParseSpan(options.last, "--last")));
         if (span.from.empty()) {
             throw Failure("--last: '" + options.last + "' is too long ago; give less");
         }

@@ -295,6 +295,8 @@ TEST_F(QuorlogdProcess, TellsWhatWasDroppedOnceAndWhatWaits) {
         Quorlogd daemon(options);
         EXPECT_TRUE(has("messages were dropped since the start of syslog-ng: 9", ", 5 that syslog-ng could not keep"))
             << testing::PrintToString(events());
+        EXPECT_TRUE(
+            Eventually([] { return std::filesystem::exists(paths::kRunFolder + std::string("/quorlogd.losses")); }));
         EXPECT_EQ(daemon.endOf(SIGKILL), -1);
     }
     answer(8, 7, 10);
