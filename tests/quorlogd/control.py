@@ -5,8 +5,9 @@ server = socket.socket(socket.AF_UNIX)
 server.bind(sys.argv[1])
 server.listen()
 while True:
-    connection = server.accept()[0]
-    if connection.recv(100) == b"STATS\n":
-        with open(sys.argv[2], "rb") as answer:
-            connection.sendall(answer.read())
-    connection.close()
+    with server.accept()[0] as connection, open(sys.argv[2], "rb") as answer:
+        try:
+            if connection.recv(100) == b"STATS\n":
+                connection.sendall(answer.read())
+        except OSError:
+            pass  # who asked was killed
