@@ -68,7 +68,7 @@ size_t severity(const std::string& level) {
 void sortGroups(const std::string& grouping, std::vector<Group>& groups) {
     const auto order = [&](const Group& a, const Group& b) {
         if (grouping == "level") {
-            return severity(a.name) < severity(b.name);
+            return std::pair(severity(a.name), a.name) < std::pair(severity(b.name), b.name);
         }
         const bool byTime = grouping == "hour" || grouping == "day";
         return byTime || a.rows == b.rows ? a.name < b.name : a.rows > b.rows;

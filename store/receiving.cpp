@@ -5,6 +5,7 @@
 #include <sys/socket.h>
 #include <sys/un.h>
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
 #include <cstring>
@@ -121,7 +122,7 @@ std::map<uint64_t, uint64_t> UdpDrops(unsigned port) {
 int FollowerProcess() {
     const Descriptor file(open(paths::kReceiverPid, O_RDONLY | O_CLOEXEC));
     const bool runs = file && flock(file.get(), LOCK_SH | LOCK_NB) != 0;
-    return runs ? ToInt32(readFile(paths::kReceiverPid).c_str()) : 0;
+    return runs ? std::max(ToInt32(readFile(paths::kReceiverPid).c_str()), 0) : 0;  // others are groups to a signal
 }
 
 unsigned ReceivingPort() {
