@@ -74,6 +74,7 @@ TEST_F(Accounting, ASampleIsClosedByTheFirstLogOfAnotherSecond) {
     EXPECT_EQ(rows(),
               (Strings{"1000", "d", "1", "999", "d", "1", "999", "n", "1", "1001", "d", "1", "1001", "d", "1"}));
     AccountingManager next;
+    EXPECT_EQ(next.ConfigLoad(), 0);
     EXPECT_EQ(histogramOf(next), (Histogram{{"D", 3}, {"d", 1}, {"n", 1}}));
 }
 

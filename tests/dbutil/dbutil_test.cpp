@@ -59,6 +59,8 @@ TEST_F(Record, HasTheFieldsOfItsTableAlone) {
               "0: 8 2 3 2 1,A,h,C,D,E,d,t,p,I,u,e,::1,f,2 KB");
     EXPECT_EQ(read("CREATE TABLE other(id); INSERT INTO other VALUES(7)", "other", false),
               "-1: 1 2 3 2 4,A,B,C,D,E,F,G,H,I,J,K,L,M,N");
+    _SYSLOG_LOG_DATA_tag none{};
+    EXPECT_EQ(DBRecToAllLogInfo(nullptr, 0, &none, false), -1);
 }
 
 TEST(Names, ThatAreUnknownAreRefused) {

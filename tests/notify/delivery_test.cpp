@@ -29,6 +29,7 @@ TEST_F(Delivery, MailsCarryWhatWasReceivedAndNoHeaderOfItsMaking) {
     // keyword, content, subject, body, its charset
     const std::tuple<std::string, std::string, std::string, std::string, const char*> cases[]{
         {"\xC3\xA4", "a\\\"b\\\\c\t\x1b[2J .\r\n.\r\nEND", "About \xC3\xA4", "a\"b\\c\t\x1b[2J .\r\n.\r\nEND", "utf-8"},
+        {"=?utf-8?b?ZXZpbA==?=", "x", "About =?utf-8?b?ZXZpbA==?=", "x", "utf-8"},
         {"x\r\nBcc: evil@a.com\r\n\r\n", "caf\xC3\xA9", "About x  Bcc: evil@a.com    ", "caf\xC3\xA9", "utf-8"},
         {longWord, "caf\xE9 \xFF\xC3\xA9", "About " + longWord, "caf\xE9 \xFF\xC3\xA9", "iso-8859-1"}};
     const std::string headers =
@@ -230,11 +231,14 @@ TEST_F(Delivery, TheTestNoticeTellsTheOutcomeOfEachChannel) {
                                                   (*detail != '\0' ? ", cause" : ""));
     };
     const mode_t mask = umask(0);
+    SetClock(1'700'000'000);
     EXPECT_EQ(QUORNotifyTest(report, &heard), 3);
     umask(mask);
     EXPECT_EQ(QUORNotifyTest(nullptr, &heard), -1);
     EXPECT_EQ(std::filesystem::status(std::string(paths::kNotifySpool) + "/desktop.jsonl").permissions(),
               std::filesystem::perms{0600});
+    EXPECT_NE(awaitLines(std::string(paths::kNotifySpool) + "/desktop.jsonl", 1)[0].find("1700000000"),
+              std::string::npos);
     EXPECT_EQ(heard, (Strings{"desktop ok", "webhook ok", "mail failed, cause"}));
 }
 

@@ -169,15 +169,17 @@ TEST(Salvage, AppliesTheWriteAheadLog) {
 TEST(Salvage, RunsNoQueryOfTheDamagedFile) {
     const TempFolder folder;
     const std::string path = folder.path("hostile.db");
-    SqliteFile(path).run(std::string(kLogs) +
-                         "CREATE TABLE evil(a); INSERT INTO logs(msg) VALUES('x');"
-                         "PRAGMA writable_schema=ON; UPDATE sqlite_master SET "
-                         "sql = 'CREATE TABLE evil AS SELECT sqlite_version() AS a' WHERE name = 'evil'");
+    SqliteFile(path).run(
+        std::string(kLogs) +
+        "CREATE TABLE evil(a); INSERT INTO logs(msg) VALUES('x'); CREATE UNIQUE INDEX once ON logs(msg);"
+        "PRAGMA writable_schema=ON; UPDATE sqlite_master SET "
+        "sql = 'CREATE TABLE evil AS SELECT sqlite_version() AS a' WHERE name = 'evil'");
     const std::string saved = folder.path("saved.db");
     QUORSALVAGE report;
     ASSERT_EQ(QUORDBSalvage(path.c_str(), saved.c_str(), nullptr, nullptr, nullptr, &report), 0) << report.error;
-    EXPECT_EQ(SqliteFile(saved).query("SELECT name FROM sqlite_master WHERE name IN ('logs', 'logs_host', 'evil')"),
-              (Strings{"logs", "logs_host"}));
+    EXPECT_EQ(
+        SqliteFile(saved).query("SELECT name FROM sqlite_master WHERE name IN ('logs', 'logs_host', 'once', 'evil')"),
+        (Strings{"logs", "logs_host", "once"}));
 }
 
 TEST(Salvage, RefusesAndLeavesNothing) {
