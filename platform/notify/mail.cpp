@@ -55,8 +55,9 @@ std::string DeliverByMail(const Settings& settings, const Notice& notice) {
     const QUORMAIL& mail = settings.mail;
     CurlList recipients;
     for (const std::string& address : Recipients(mail)) {
-        if (!Append(recipients, "<" + address + ">")) {
-            return "no memory";
+        const std::string cause = Append(recipients, "<" + address + ">");
+        if (!cause.empty()) {
+            return cause;
         }
     }
     if (!recipients || !isHostName(mail.server)) {

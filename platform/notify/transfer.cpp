@@ -1,28 +1,74 @@
 #include "platform/notify/transfer.h"
 
+#include <dlfcn.h>
+
 namespace quor::notify {
 namespace {
 
 constexpr long kConnectSeconds = 10;
+constexpr const char kLibrary[] = "libcurl.so.4";
 
 size_t discard(const char* /*data*/, size_t size, size_t count, void* /*context*/) {
     return size * count;
 }
 
+// Null when the library cannot be loaded or lacks the function.
+template <typename Function>
+void find(void* library, const char* name, Function*& function) {
+    function = library != nullptr ? reinterpret_cast<Function*>(dlsym(library, name)) : nullptr;
+}
+
+// The library stays until the process ends.
+Curl load() {
+    (void)dlerror();  // of somebody else
+    void* library = dlopen(kLibrary, RTLD_NOW);
+    Curl curl;
+    find(library, "curl_easy_init", curl.init);
+    find(library, "curl_easy_setopt", curl.setopt);
+    find(library, "curl_easy_perform", curl.perform);
+    find(library, "curl_easy_getinfo", curl.getinfo);
+    find(library, "curl_easy_strerror", curl.strerror);
+    find(library, "curl_easy_cleanup", curl.cleanup);
+    find(library, "curl_slist_append", curl.append);
+    find(library, "curl_slist_free_all", curl.freeAll);
+    const char* error = dlerror();
+    if (error != nullptr) {
+        curl.fault = std::string("cannot load libcurl: ") + error;
+    }
+    return curl;
+}
+
 }  // namespace
 
-bool Append(CurlList& list, const std::string& text) {
-    curl_slist* longer = curl_slist_append(list.get(), text.c_str());
+const Curl& LoadedCurl() {
+    static const Curl curl = load();
+    return curl;
+}
+
+void FreeList(curl_slist* list) {
+    LoadedCurl().freeAll(list);
+}
+
+void CleanUp(CURL* curl) {
+    LoadedCurl().cleanup(curl);
+}
+
+std::string Append(CurlList& list, const std::string& text) {
+    if (!LoadedCurl().fault.empty()) {
+        return LoadedCurl().fault;
+    }
+    curl_slist* longer = LoadedCurl().append(list.get(), text.c_str());
     if (longer == nullptr) {
-        return false;
+        return "no memory";
     }
     (void)list.release();
     list.reset(longer);
-    return true;
+    return "";
 }
 
 // The environment's proxy settings are the caller's, not this service's.
-Transfer::Transfer(const std::string& url, long timeoutSeconds, const Tls& tls) : curl_(curl_easy_init()) {
+Transfer::Transfer(const std::string& url, long timeoutSeconds, const Tls& tls)
+    : curl_(LoadedCurl().fault.empty() ? LoadedCurl().init() : nullptr) {
     set(CURLOPT_URL, url.c_str());
     set(CURLOPT_PROXY, "");
     set(CURLOPT_ERRORBUFFER, error_.data());
@@ -38,20 +84,22 @@ Transfer::Transfer(const std::string& url, long timeoutSeconds, const Tls& tls) 
 
 std::string Transfer::run() {
     if (!curl_) {
-        return "libcurl cannot start";
+        return LoadedCurl().fault.empty() ? "libcurl cannot start" : LoadedCurl().fault;
     }
     if (result_ == CURLE_OK) {
-        result_ = curl_easy_perform(curl_.get());
+        result_ = LoadedCurl().perform(curl_.get());
     }
     if (result_ == CURLE_OK) {
         return "";
     }
-    return error_[0] != '\0' ? error_.data() : curl_easy_strerror(result_);
+    return error_[0] != '\0' ? error_.data() : LoadedCurl().strerror(result_);
 }
 
 long Transfer::status() const {
     long code = 0;
-    (void)curl_easy_getinfo(curl_.get(), CURLINFO_RESPONSE_CODE, &code);
+    if (curl_) {
+        (void)LoadedCurl().getinfo(curl_.get(), CURLINFO_RESPONSE_CODE, &code);
+    }
     return code;
 }
 

@@ -1,4 +1,7 @@
 // One libcurl transfer with the bounds that every delivery has.
+//
+// libcurl is loaded by the process that delivers and by nobody else. It brings some thirty libraries, and a program
+// that was linked with them would take several times as long to start as a search takes.
 #ifndef PLATFORM_NOTIFY_TRANSFER_H
 #define PLATFORM_NOTIFY_TRANSFER_H
 
@@ -11,10 +14,28 @@
 
 namespace quor::notify {
 
-using CurlList = std::unique_ptr<curl_slist, Releaser<curl_slist_free_all>>;
+struct Curl {
+    decltype(curl_easy_init)* init = nullptr;
+    decltype(curl_easy_setopt)* setopt = nullptr;
+    decltype(curl_easy_perform)* perform = nullptr;
+    decltype(curl_easy_getinfo)* getinfo = nullptr;
+    decltype(curl_easy_strerror)* strerror = nullptr;
+    decltype(curl_easy_cleanup)* cleanup = nullptr;
+    decltype(curl_slist_append)* append = nullptr;
+    decltype(curl_slist_free_all)* freeAll = nullptr;
+    std::string fault;  // why there is none; empty when all of them are there
+};
 
-// False when there is no memory.
-bool Append(CurlList& list, const std::string& text);
+// Loads it with the first call.
+const Curl& LoadedCurl();
+
+void FreeList(curl_slist* list);
+void CleanUp(CURL* curl);
+
+using CurlList = Guard<curl_slist, FreeList>;
+
+// The cause of the failure; empty when it was appended.
+std::string Append(CurlList& list, const std::string& text);
 
 struct Tls {
     const char* caFile;  // empty: the system's certificates
@@ -28,7 +49,7 @@ class Transfer {
     template <typename Value>
     void set(CURLoption option, Value value) {
         if (curl_ && result_ == CURLE_OK) {
-            result_ = curl_easy_setopt(curl_.get(), option, value);
+            result_ = LoadedCurl().setopt(curl_.get(), option, value);
         }
     }
 
@@ -38,7 +59,7 @@ class Transfer {
     long status() const;
 
   private:
-    std::unique_ptr<CURL, Releaser<curl_easy_cleanup>> curl_;
+    Guard<CURL, CleanUp> curl_;
     CURLcode result_ = CURLE_OK;
     std::array<char, CURL_ERROR_SIZE> error_{};
 };

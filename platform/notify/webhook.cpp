@@ -15,8 +15,11 @@ std::string post(const Settings& settings, const std::string& url, const std::st
         return "webhook_url must begin with http:// or https://";
     }
     CurlList headers;
-    if (!Append(headers, "Content-Type: application/json") || !Append(headers, "Expect:")) {
-        return "no memory";
+    for (const char* header : {"Content-Type: application/json", "Expect:"}) {
+        std::string cause = Append(headers, header);
+        if (!cause.empty()) {
+            return cause;
+        }
     }
     Transfer transfer(url, settings.timeout, {settings.webhookCaFile.c_str(), settings.webhookVerify});
     transfer.set(CURLOPT_HTTPHEADER, headers.get());

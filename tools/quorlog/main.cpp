@@ -36,7 +36,7 @@ int run(int argc, char** argv) {
     app.set_version_flag("--version", "quorlog " QUORLOG_VERSION);
     int status = quor::cli::kDone;
     try {
-        quor::cli::AddCommands(app, status);
+        quor::cli::AddCommands(app, status, argc > 1 ? argv[1] : "");
         app.parse(argc, argv);
         return status;
     } catch (const CLI::ParseError& error) {

@@ -1,9 +1,23 @@
 #include "tools/quorlog/commands/commands.h"
 
 #include <CLI/CLI.hpp>
+#include <algorithm>
+#include <iterator>
 
 namespace quor::cli {
 namespace {
+
+struct Command {
+    std::string_view name;
+    void (*add)(CLI::App& app, int& status);
+};
+
+// In the order in which help names them.
+constexpr Command kCommands[] = {
+    {"search", AddSearch}, {"count", AddCount},   {"delete", AddDelete}, {"values", AddValues}, {"names", AddNames},
+    {"stats", AddStats},   {"events", AddEvents}, {"rules", AddRules},   {"notify", AddNotify}, {"db", AddDb},
+    {"backup", AddBackup}, {"doctor", AddDoctor}, {"parse", AddParse},
+};
 
 // Help on every command: the parser's own stops at groups such as stats.
 class WholeHelp : public CLI::Formatter {
@@ -19,25 +33,19 @@ class WholeHelp : public CLI::Formatter {
 
 }  // namespace
 
-void AddCommands(CLI::App& app, int& status) {
+void AddCommands(CLI::App& app, int& status, std::string_view only) {
     app.description("Searches, counts and manages the logs that syslog-ng writes to databases.");
     app.footer("Exit status: 0 found or done, 1 nothing found, 2 wrong usage or failure.");
     app.formatter(std::make_shared<WholeHelp>());
     app.require_subcommand(1);
     app.set_help_all_flag("--help-all", "Print the options of every command");
-    AddSearch(app, status);
-    AddCount(app, status);
-    AddDelete(app, status);
-    AddValues(app, status);
-    AddNames(app, status);
-    AddStats(app, status);
-    AddEvents(app, status);
-    AddRules(app, status);
-    AddNotify(app, status);
-    AddDb(app, status);
-    AddBackup(app, status);
-    AddDoctor(app, status);
-    AddParse(app, status);
+    const auto* chosen =
+        std::find_if(std::begin(kCommands), std::end(kCommands), [&](const auto& each) { return each.name == only; });
+    for (const auto& command : kCommands) {
+        if (chosen == std::end(kCommands) || &command == chosen) {
+            command.add(app, status);
+        }
+    }
 }
 
 }  // namespace quor::cli

@@ -2,6 +2,8 @@
 #ifndef QUORLOG_COMMANDS_COMMANDS_H
 #define QUORLOG_COMMANDS_COMMANDS_H
 
+#include <string_view>
+
 namespace CLI {
 class App;
 }
@@ -26,8 +28,8 @@ void AddParse(CLI::App& app, int& status);
 void AddDbCheck(CLI::App& db, int& status);
 void AddDbSalvage(CLI::App& db, int& status);
 
-// All of them.
-void AddCommands(CLI::App& app, int& status);
+// All of them, or the command of this name alone, when there is one: adding all takes longer than a search.
+void AddCommands(CLI::App& app, int& status, std::string_view only = {});
 
 }  // namespace quor::cli
 
