@@ -1,5 +1,5 @@
 #!/bin/sh
-# Builds what the PowerPC build links, from Debian's source packages: SQLite, JsonCpp, utf8proc and GoogleTest, and copies the
+# Builds what the PowerPC build links, from Debian's source packages: SQLite, JsonCpp, RE2, utf8proc and GoogleTest, and copies the
 # headers of CLI11. The sources come from where this machine gets its packages.
 # Usage: build-powerpc-deps.sh FOLDER       result: FOLDER/prefix; nothing is done when it is complete
 set -eu
@@ -53,6 +53,11 @@ build_sqlite() {
     install -D -m 644 sqlite3.pc "$prefix/lib/pkgconfig/sqlite3.pc"
 }
 
+build_re2() {
+    make -C "$folder"/src/re2-* -j"$jobs" CXX=$host-g++ CXXFLAGS=-O2 REBUILD_TABLES=1 prefix="$prefix" \
+        shared-install > "$folder/src/re2.log"
+}
+
 # build_with_cmake SOURCE [OPTION...]
 build_with_cmake() {
     source=$1
@@ -65,8 +70,9 @@ build_with_cmake() {
 }
 
 write_sources
-fetch sqlite3 libjsoncpp utf8proc
+fetch sqlite3 libjsoncpp utf8proc re2
 (build_sqlite)
+build_re2
 build_with_cmake "$(echo "$folder"/src/libjsoncpp-*/)" -DBUILD_SHARED_LIBS=ON -DBUILD_STATIC_LIBS=OFF \
     -DBUILD_OBJECT_LIBS=OFF -DJSONCPP_WITH_TESTS=OFF -DJSONCPP_WITH_POST_BUILD_UNITTEST=OFF
 build_with_cmake "$(echo "$folder"/src/utf8proc-*/)" -DBUILD_SHARED_LIBS=ON

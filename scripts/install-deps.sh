@@ -6,11 +6,11 @@ set -eu
 packages_of() {
     case "$1" in
     build) echo g++ cmake ninja-build pkg-config libsqlite3-dev sqlite3 libjsoncpp-dev \
-        libcurl4-openssl-dev libutf8proc-dev libcli11-dev ;;
+        libcurl4-openssl-dev libutf8proc-dev libre2-dev libcli11-dev ;;
     run) echo syslog-ng-core syslog-ng-mod-sql libdbd-sqlite3 bsdutils procps python3 python3-aiosmtpd ;;
     test) echo libgtest-dev openssl ;;
     bench) echo libbenchmark-dev ;;
-    powerpc) echo g++-powerpc-linux-gnu qemu-user dpkg-dev make tcl ;;
+    powerpc) echo g++-powerpc-linux-gnu qemu-user dpkg-dev make tcl perl python3 unicode-data ;;
     package) echo dpkg-dev file debootstrap ;;
     docs) echo doxygen mandoc ;;
     check) echo clang-14 clang-format-14 clang-tidy-14 libclang-rt-14-dev git ;;

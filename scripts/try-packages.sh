@@ -29,7 +29,7 @@ finish() {
 trap finish EXIT
 inside apt-get update -qq
 inside apt-get install -y -qq --no-install-recommends syslog-ng-core syslog-ng-mod-sql libdbd-sqlite3 sqlite3 \
-    libjsoncpp25 libcurl4 libutf8proc2 g++ pkg-config > "$packages/install.log" 2>&1
+    libjsoncpp25 libcurl4 libre2-9 libutf8proc2 g++ pkg-config > "$packages/install.log" 2>&1
 listing > "$packages/before.txt"
 
 printf '#!/bin/sh\nexit 0\n' > "$root/usr/sbin/policy-rc.d" # services start in this chroot too

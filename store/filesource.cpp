@@ -2,9 +2,13 @@
 #include <fcntl.h>
 #include <sys/stat.h>
 
+#include <set>
+
 #include "store/ask.h"
+#include "store/columns.h"
 #include "store/databasefile.h"
 #include "store/failure.h"
+#include "store/regex.h"
 #include "store/source.h"
 
 namespace quor::store {
@@ -33,17 +37,19 @@ std::string renderedList(const std::string& column, const std::list<std::string>
 
 std::string rendered(const ColumnCondition& condition) {
     const std::string column = condition.column;
-    const std::string first = Literal(condition.values.front());
-    const std::string last = Literal(condition.values.back());
+    const auto first = [&] { return Literal(condition.values.front()); };
+    const auto both = [&] { return " (" + first() + ", " + Literal(condition.values.back()) + ")"; };
     switch (condition.match) {
     case Match::Part:
-        return "instr(" + column + ", " + first + ")";
+        return "instr(" + column + ", " + first() + ")";
     case Match::PartNoCase:
-        return "instr(lower(" + column + "), lower(" + first + "))";
+        return "instr(lower(" + column + "), lower(" + first() + "))";
+    case Match::Regex:
+        return column + " REGEXP " + first();
     case Match::AtLeast:
-        return column + " >= (" + first + ", " + last + ")";
+        return column + " >=" + both();
     case Match::AtMost:
-        return column + " <= (" + first + ", " + last + ")";
+        return column + " <=" + both();
     default:
         return renderedList(column, condition.values, condition.match == Match::Like);
     }
@@ -56,6 +62,24 @@ std::string where(Conditions conditions) {
         text += (text.empty() ? "(" : " AND (") + rendered(condition) + (condition.negated ? ") IS NOT TRUE" : ")");
     }
     return text.empty() ? text : " WHERE " + text;
+}
+
+// Of the columns that later versions added to a table of logs, those that it lacks, separated by commas; empty when it
+// has them, or is no table of ours.
+std::string missingColumns(const Connection& connection, const std::string& db, const std::string& table) {
+    const Result result = Execute(connection, db, "SELECT name FROM pragma_table_xinfo(" + Literal(table) + ")");
+    std::set<std::string> wanted = {"llevel"};
+    for (const Column& column : ColumnsOf(table, false)) {
+        wanted.insert(column.name);
+    }
+    for (Row row(result.get()); row.next();) {
+        wanted.erase(row["name"]);
+    }
+    std::string missing;
+    for (const char* added : {"llevel", "pid", "msgid", "sdata", "rsec"}) {
+        missing += wanted.erase(added) == 0 ? "" : (missing.empty() ? "" : ", ") + std::string(added);
+    }
+    return wanted.empty() ? missing : "";
 }
 
 void addExtras(const Row& row, Record& record) {
@@ -74,8 +98,7 @@ class FileSource : public Source {
         const std::string sql =
             "SELECT * FROM " + table + where(conditions) + " ORDER BY id " + (ascending ? "asc" : "desc");
         const _SYSLOG_SQL_LIMIT_tag limit{window.limit, window.offset};
-        const Connection connection = Connect(path_);
-        const Result result = Execute(connection, path_, sql, &limit);
+        const Result result = ask(table, sql, &limit);
         std::string name = table;
         Record record;
         Row row(result.get());
@@ -88,17 +111,14 @@ class FileSource : public Source {
     }
 
     uint64_t count(const std::string& table, const Conditions& conditions) const override {
-        const std::vector<std::string> rows =
-            Ask(path_, "SELECT COUNT(*) FROM " + table + where(conditions), "COUNT(*)");
-        return ToUint64(rows.front().c_str());
+        const Result result = ask(table, "SELECT COUNT(*) AS rows FROM " + table + where(conditions));
+        return ToUint64(Row(result.get())["rows"]);
     }
 
     void groups(const std::string& table, const Conditions& conditions, const std::string& expression,
                 const GroupHandler& handler) const override {
-        const Connection connection = Connect(path_);
-        const Result result = Execute(connection, path_,
-                                      "SELECT " + expression + " AS name, COUNT(*) AS rows FROM " + table +
-                                          where(conditions) + " GROUP BY 1");
+        const Result result = ask(table, "SELECT " + expression + " AS name, COUNT(*) AS rows FROM " + table +
+                                             where(conditions) + " GROUP BY 1");
         for (Row row(result.get()); row.next();) {
             handler(row["name"], ToUint64(row["rows"]));
         }
@@ -118,7 +138,7 @@ class FileSource : public Source {
 
     void remove(const Conditions& conditions) const override {
         if (!conditions.columns.empty()) {
-            (void)Ask(path_, "DELETE FROM logs" + where(conditions), "");
+            (void)ask("logs", "DELETE FROM logs" + where(conditions));
             return;
         }
         std::string db = path_;
@@ -145,6 +165,23 @@ class FileSource : public Source {
     const std::string& name() const override { return path_; }
 
   private:
+    Result ask(const std::string& table, const std::string& sql, const _SYSLOG_SQL_LIMIT_tag* limit = nullptr) const {
+        const Connection connection = Connect(path_);
+        AddRegexp(connection);
+        try {
+            return Execute(connection, path_, sql, limit);
+        } catch (const Failure& failure) {
+            const std::string missing =
+                failure.cause() == Cause::Missing ? missingColumns(connection, path_, table) : "";
+            if (missing.empty()) {
+                throw;
+            }
+            throw Failure(path_ + ": table " + table + " is of a former version and lacks " + missing +
+                              "; start syslog-ng, which adds them to its database, or leave out what asks for them",
+                          Cause::Missing);
+        }
+    }
+
     std::vector<std::string> identities() const try {
         return Ask(path_, "SELECT value FROM store_identity", "value");
     } catch (const Failure& failure) {

@@ -1,114 +1,68 @@
 #include "store/filter.h"
 
 #include <algorithm>
-#include <iterator>
 
 #include "base/numbers.h"
 #include "base/utf8.h"
-#include "common.h"
 #include "store/columns.h"
 #include "store/dates.h"
 #include "store/failure.h"
+#include "store/regex.h"
 
 namespace quor::store {
 namespace {
 
-constexpr size_t kMaxPattern = 15000;  // the database refuses longer ones, brackets tripled
+constexpr const char kUnknownLevel[] = "debug";  // as the library reads whatever is none of the levels
+constexpr size_t kMaxPattern = 15000;            // the database refuses longer ones, brackets tripled
 
 // A filter of the command line: the option, its value, the column that answers it.
+template <typename Value>
 struct Given {
     const char* option;
-    std::string FilterOptions::*value;
+    Value FilterOptions::*value;
     const char* column;
-    bool isName = false;  // cheap to look for by itself
+    bool negated = false;
 };
 
-constexpr Given kFilters[] = {
-    {"--host", &FilterOptions::host, "host", true},
-    {"--level", &FilterOptions::level, "llevel", true},
-    {"--facility", &FilterOptions::facility, "fac", true},
-    {"--program", &FilterOptions::program, "prog", true},
-    {"--pid", &FilterOptions::pid, "pid", true},
-    {"--msgid", &FilterOptions::msgid, "msgid", true},
-    {"--sdata", &FilterOptions::sdata, "sdata", true},
-    {"--ip", &FilterOptions::ip, "ip", true},
+constexpr Given<Names> kLists[] = {
+    {"--host", &FilterOptions::host, "host"},
+    {"--level", &FilterOptions::level, "llevel"},
+    {"--facility", &FilterOptions::facility, "fac"},
+    {"--program", &FilterOptions::program, "prog"},
+    {"--pid", &FilterOptions::pid, "pid"},
+    {"--msgid", &FilterOptions::msgid, "msgid"},
+    {"--ip", &FilterOptions::ip, "ip"},
+    {"--not-host", &FilterOptions::notHost, "host", true},
+    {"--not-level", &FilterOptions::notLevel, "llevel", true},
+    {"--not-facility", &FilterOptions::notFacility, "fac", true},
+    {"--not-program", &FilterOptions::notProgram, "prog", true},
+};
+
+constexpr Given<std::string> kTexts[] = {
+    {"--sdata", &FilterOptions::sdata, "sdata"},
     {"--keyword", &FilterOptions::keyword, "msg"},
     {"--glob", &FilterOptions::glob, "msg"},
+    {"--regex", &FilterOptions::regex, "msg"},
     {"--from", &FilterOptions::from, "ldate"},
     {"--to", &FilterOptions::to, "ldate"},
     {"--last", &FilterOptions::last, "ldate"},
-    {"--not-host", &FilterOptions::notHost, "host"},
-    {"--not-level", &FilterOptions::notLevel, "llevel"},
-    {"--not-facility", &FilterOptions::notFacility, "fac"},
-    {"--not-program", &FilterOptions::notProgram, "prog"},
-    {"--not-keyword", &FilterOptions::notKeyword, "msg"},
+    {"--not-keyword", &FilterOptions::notKeyword, "msg", true},
+    {"--not-regex", &FilterOptions::notRegex, "msg", true},
 };
 
-void checkColumns(const FilterOptions& options, const std::string& table) {
-    for (const Given& given : kFilters) {
-        if (!(options.*given.value).empty() && !HasColumn(table, given.column)) {
-            throw Failure(std::string(given.option) + ": table " + table + " has no column for it; leave it out");
+// Hands over the option, the column and the value as one text of every filter that was given.
+template <typename Visit>
+void eachGiven(const FilterOptions& options, Visit visit) {
+    for (const auto& given : kLists) {
+        if (!(options.*given.value).empty()) {
+            visit(given.option, given.column, InWords(options.*given.value));
         }
     }
-}
-
-// The library would take the whole list "any" for no filter and an empty name for rows without one.
-void checkNames(const char* option, const std::string& names) {
-    const std::list<std::string> list = Tokenize(names, ",");
-    if (list.size() > 1 && std::find(list.begin(), list.end(), "any") != list.end()) {
-        throw Failure(std::string(option) + ": 'any' means every name; give it alone or leave it out");
-    }
-    if (std::find(list.begin(), list.end(), "") != list.end()) {
-        throw Failure(std::string(option) + ": empty name in '" + names + "'; separate names with one comma");
-    }
-}
-
-// The names that other programs and people use, and the numbers.
-int levelIndex(const std::string& text) {
-    constexpr std::pair<const char*, int> kOthers[] = {{"emergency", 0},    {"panic", 0}, {"critical", 2},
-                                                       {"error", 3},        {"warn", 4},  {"information", 6},
-                                                       {"informational", 6}};
-    std::string name = text;
-    std::transform(name.begin(), name.end(), name.begin(),
-                   [](char c) { return c >= 'A' && c <= 'Z' ? static_cast<char>(c + 32) : c; });
-    if (name.size() == 1 && name[0] >= '0' && name[0] <= '7') {
-        return name[0] - '0';
-    }
-    for (const auto& [other, level] : kOthers) {
-        if (name == other) {
-            return level;
+    for (const auto& given : kTexts) {
+        if (!(options.*given.value).empty()) {
+            visit(given.option, given.column, options.*given.value);
         }
     }
-    const auto* found = std::find(std::begin(g_MappingSyslogPrior), std::end(g_MappingSyslogPrior), name);
-    return static_cast<int>(found - std::begin(g_MappingSyslogPrior));
-}
-
-[[noreturn]] void failLevel(const std::string& option, const std::string& name) {
-    std::string names;
-    for (const char* known : g_MappingSyslogPrior) {
-        names += names.empty() ? known : std::string(", ") + known;
-    }
-    throw Failure(option + ": no such level '" + name + "'; give " + names +
-                  ", a number from 0 to 7, or err+ for err and worse");
-}
-
-// "err+" becomes "emerg,alert,crit,err".
-std::string expandLevels(const std::string& levels, const std::string& option) {
-    if (levels.empty() || levels == "any") {
-        return levels;
-    }
-    std::string expanded;
-    for (const std::string& token : Tokenize(levels, ",")) {
-        const bool orWorse = !token.empty() && token.back() == '+';
-        const int last = levelIndex(token.substr(0, token.size() - (orWorse ? 1 : 0)));
-        if (last == static_cast<int>(std::size(g_MappingSyslogPrior))) {
-            failLevel(option, token);
-        }
-        for (int level = orWorse ? 0 : last; level <= last; ++level) {
-            expanded += (expanded.empty() ? "" : ",") + std::string(g_MappingSyslogPrior[level]);
-        }
-    }
-    return expanded;
 }
 
 bool holdsWildcard(const std::string& text) {
@@ -167,74 +121,85 @@ Span spanOf(const FilterOptions& options, time_t now) {
 }
 
 void check(const FilterOptions& options, const std::string& table) {
-    checkColumns(options, table);
-    for (const Given& given : kFilters) {
-        const bool text = given.value == &FilterOptions::sdata || std::string_view(given.column) == "msg" ||
-                          std::string_view(given.column) == "ldate" || std::string_view(given.column) == "llevel";
-        if (!text) {
-            checkNames(given.option, options.*given.value);
+    eachGiven(options, [&](const std::string& option, const char* column, const std::string& value) {
+        if (!HasColumn(table, column)) {
+            throw Failure(option + ": table " + table + " has no column for it; leave it out");
         }
-    }
-    for (const Given& given : kFilters) {
-        if ((options.*given.value).size() > kMaxPattern) {
-            throw Failure(std::string(given.option) + ": too long; give at most " + std::to_string(kMaxPattern) +
-                          " bytes");
+        if (value.size() > kMaxPattern) {
+            throw Failure(option + ": too long; give at most " + std::to_string(kMaxPattern) + " bytes");
         }
-    }
+    });
     if (!comparesExactly(options.glob)) {
         throw Failure("--glob: the pattern is not UTF-8; give --keyword, which takes any bytes");
     }
+    for (const auto& [option, pattern] : {std::pair("--regex", &options.regex), {"--not-regex", &options.notRegex}}) {
+        if (!pattern->empty()) {
+            CheckRegex(*pattern, options.ignoreCase, option);
+        }
+    }
 }
 
-bool isList(const std::string& names) {
-    return !names.empty() && names != "any";
-}
-
-void addTimes(const Span& span, std::list<ColumnCondition>& conditions) {
+// A row without a time of day meets any time of its day.
+void addTimes(const Span& span, bool lenient, std::list<ColumnCondition>& conditions) {
     if (!span.from.time.empty()) {
-        conditions.push_back({"(ldate, ltime)", {span.from.date, span.from.time}, Match::AtLeast});
+        const char* columns = lenient ? "(ldate, ifnull(nullif(ltime, ''), '24'))" : "(ldate, ltime)";
+        conditions.push_back({columns, {span.from.date, span.from.time}, Match::AtLeast});
     }
     if (!span.to.time.empty()) {
-        conditions.push_back({"(ldate, ltime)", {span.to.date, span.to.time}, Match::AtMost});
+        const char* columns = lenient ? "(ldate, ifnull(ltime, ''))" : "(ldate, ltime)";
+        conditions.push_back({columns, {span.to.date, span.to.time}, Match::AtMost});
     }
 }
 
-// What the library has no form for; it leaves it out of `options`.
-std::list<ColumnCondition> takeColumns(FilterOptions& options) {
-    std::list<ColumnCondition> conditions;
-    const Match any = options.patterns ? Match::Like : Match::Any;
-    const auto addList = [&](std::string& names, const char* column, bool negated) {
-        if (isList(names)) {
-            conditions.push_back({column, Tokenize(names, ","), any, negated});
+// Whatever is none of the levels is shown as debug, so it is found as that: by not being one of the other levels.
+void addLevels(const Given<Names>& given, const FilterOptions& options, std::list<ColumnCondition>& conditions) {
+    const std::list<std::string> levels = LevelsOf(options.*given.value, given.option);
+    const bool debug = std::find(levels.begin(), levels.end(), kUnknownLevel) != levels.end();
+    if (debug && (options.lenient || given.negated)) {
+        conditions.push_back({given.column, OtherLevels(levels), Match::Any, !given.negated});
+    } else if (!levels.empty()) {
+        conditions.push_back({given.column, levels, Match::Any, given.negated});
+    }
+}
+
+void refuseNegatedAny(const Given<Names>& given, const FilterOptions& options) {
+    if (given.negated && !(options.*given.value).empty() &&
+        NamesOf(options.*given.value, given.option, false).empty()) {
+        throw Failure(std::string(given.option) + ": 'any' would leave nothing; name what is to be left out");
+    }
+}
+
+void addLists(const FilterOptions& options, std::list<ColumnCondition>& conditions) {
+    for (const auto& given : kLists) {
+        refuseNegatedAny(given, options);
+        if (std::string_view(given.column) == "llevel") {
+            addLevels(given, options, conditions);
+            continue;
         }
-        names.clear();
-    };
-    const auto addPart = [&](std::string& text, const char* column, Match match, bool negated) {
+        std::list<std::string> names = NamesOf(options.*given.value, given.option, options.lenient);
+        if (!names.empty()) {
+            const Match match = options.lenient ? Match::Like : Match::Any;
+            conditions.push_back({given.column, std::move(names), match, given.negated});
+        }
+    }
+}
+
+// What the library has no form for.
+void addTexts(const FilterOptions& options, std::list<ColumnCondition>& conditions) {
+    const auto add = [&](const std::string& text, const char* column, Match match, bool negated) {
         if (!text.empty()) {
             conditions.push_back({column, {text}, match, negated});
         }
-        text.clear();
+    };
+    const auto regex = [&](const std::string& pattern) {
+        return pattern.empty() ? "" : RegexOf(pattern, options.ignoreCase);
     };
     const Match part = options.ignoreCase ? Match::PartNoCase : Match::Part;
-    addList(options.pid, "pid", false);
-    addList(options.msgid, "msgid", false);
-    addList(options.ip, "ip", false);
-    addPart(options.sdata, "sdata", Match::Part, false);
-    addList(options.notHost, "host", true);
-    addList(options.notLevel, "llevel", true);
-    addList(options.notFacility, "fac", true);
-    addList(options.notProgram, "prog", true);
-    addPart(options.notKeyword, "msg", part, true);
-    if (options.patterns && holdsWildcard(options.host)) {
-        addList(options.host, "host", false);
-    }
-    if (options.patterns && holdsWildcard(options.program)) {
-        addList(options.program, "prog", false);
-    }
-    if (options.ignoreCase) {
-        addPart(options.keyword, "msg", part, false);
-    }
-    return conditions;
+    add(options.sdata, "sdata", Match::Part, false);
+    add(options.ignoreCase ? options.keyword : "", "msg", part, false);
+    add(options.notKeyword, "msg", part, true);
+    add(regex(options.regex), "msg", Match::Regex, false);
+    add(regex(options.notRegex), "msg", Match::Regex, true);
 }
 
 std::string spanInWords(const Span& span) {
@@ -262,18 +227,15 @@ bool Filter::accepts(const _SYSLOG_LOG_DATA_tag& record) const {
 Filter BuildFilter(const FilterOptions& options, const std::string& table, time_t now) {
     check(options, table);
     Filter filter;
-    FilterOptions rest = options;  // the library takes its arguments by reference
-    rest.level = expandLevels(options.level, "--level");
-    rest.notLevel = expandLevels(options.notLevel, "--not-level");
-    const Span span = spanOf(options, now);
+    Span span = spanOf(options, now);
+    addLists(options, filter.conditions.columns);
+    addTimes(span, options.lenient, filter.conditions.columns);
+    addTexts(options, filter.conditions.columns);
     std::string pattern = patternOf(options);
-    filter.conditions.columns = takeColumns(rest);
-    addTimes(span, filter.conditions.columns);
-    rest.from = span.from.date;
-    rest.to = span.to.date;
-    LogSearchCondListGen(rest.host, rest.level, rest.facility, rest.program, pattern, rest.from, rest.to,
-                         filter.conditions.attributes);
-    filter.literal = holdsWildcard(rest.keyword) || !comparesExactly(rest.keyword) ? rest.keyword : "";
+    std::string none;  // names may hold what separates them for the library
+    LogSearchCondListGen(none, none, none, none, pattern, span.from.date, span.to.date, filter.conditions.attributes);
+    const bool inexact = holdsWildcard(options.keyword) || !comparesExactly(options.keyword);
+    filter.literal = inexact && !options.ignoreCase ? options.keyword : "";
     return filter;
 }
 
@@ -285,15 +247,19 @@ std::vector<Probe> BuildProbes(const FilterOptions& options, const std::string& 
             probes.push_back({words, std::move(conditions)});
         }
     };
-    for (const Given& given : kFilters) {
-        if (given.isName) {
-            FilterOptions alone;
-            alone.patterns = options.patterns;
+    FilterOptions none;
+    none.lenient = options.lenient;
+    for (const auto& given : kLists) {
+        FilterOptions alone = none;
+        if (!given.negated) {
             alone.*given.value = options.*given.value;
-            add("has " + std::string(given.option) + " " + options.*given.value, alone);
+            add("has " + std::string(given.option) + " " + InWords(options.*given.value), alone);
         }
     }
-    FilterOptions times;
+    FilterOptions sdata = none;
+    sdata.sdata = options.sdata;
+    add("has --sdata " + options.sdata, sdata);
+    FilterOptions times = none;
     times.from = options.from;
     times.to = options.to;
     times.last = options.last;

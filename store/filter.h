@@ -8,6 +8,7 @@
 #include <vector>
 
 #include "dbutil.h"
+#include "store/names.h"
 
 namespace quor::store {
 
@@ -17,6 +18,7 @@ enum class Match {
     Like,        // the same, and values with "*" or "?" are patterns
     Part,        // the one value is part of it
     PartNoCase,  // the same, whatever the case of ASCII letters
+    Regex,       // it holds a match of the one value, made by RegexOf()
     AtLeast,     // two columns, written as such, compared with two values
     AtMost,
 };
@@ -37,28 +39,33 @@ struct Conditions {
     bool empty() const { return attributes.empty() && columns.empty(); }
 };
 
-// As a person gives them; the empty text leaves a filter out. The names of a list are separated by commas.
+// As a person gives them; an empty one is left out.
 struct FilterOptions {
-    std::string host;
-    std::string level;
-    std::string facility;
-    std::string program;
-    std::string pid;
-    std::string msgid;
+    Names host;
+    Names level;
+    Names facility;
+    Names program;
+    Names pid;
+    Names msgid;
+    Names ip;
     std::string sdata;  // a part of the structured data
-    std::string ip;
     std::string keyword;
     std::string glob;
+    std::string regex;
     std::string from;
     std::string to;
     std::string last;  // a time span, in place of from
-    std::string notHost;
-    std::string notLevel;
-    std::string notFacility;
-    std::string notProgram;
+    Names notHost;
+    Names notLevel;
+    Names notFacility;
+    Names notProgram;
     std::string notKeyword;
-    bool ignoreCase = false;  // of the keywords, for ASCII letters
-    bool patterns = false;    // names may hold "*" and "?"; else they are taken as they stand, whatever a sender wrote
+    std::string notRegex;
+    bool ignoreCase = false;  // of the keywords, for ASCII letters, and of the regular expressions
+    // Finds whatever may be meant: names with "*" or "?" are patterns, a list is also one name, a row without a time of
+    // day belongs to the whole day, one without a known level is shown as debug and so found. Else names are taken as
+    // they stand, whatever a sender wrote, and only what is surely meant is found.
+    bool lenient = false;
 };
 
 struct Filter {

@@ -22,13 +22,24 @@ std::string levelOf(const Record& record) {
     return PriorTypeToStr(record.prio);
 }
 
+// As the library reads a level.
+constexpr const char kLevel[] =
+    "iif(llevel IN ('emerg', 'alert', 'crit', 'err', 'warning', 'notice', 'info'), llevel, 'debug')";
+
+// A row without a time of day has its day.
+constexpr const char kHour[] =
+    "ifnull(ldate, '') || iif(ifnull(ltime, '') = '', '', ' ' || substr(ltime, 1, 2) || ':00')";
+
+std::string hourOf(const Record& record) {
+    return record.ltime.empty() ? record.ldate : record.ldate + " " + record.ltime.substr(0, 2) + ":00";
+}
+
 constexpr Grouping kKnown[] = {
     {"host", "host", "host", [](const Record& record) { return record.host; }},
     {"program", "prog", "prog", [](const Record& record) { return record.prog; }},
-    {"level", "llevel", "llevel", levelOf},
+    {"level", "llevel", kLevel, levelOf},
     {"facility", "fac", "fac", [](const Record& record) { return record.fac; }},
-    {"hour", "ltime", "ldate || ' ' || substr(ltime, 1, 2) || ':00'",
-     [](const Record& record) { return record.ldate + " " + record.ltime.substr(0, 2) + ":00"; }},
+    {"hour", "ltime", kHour, hourOf},
     {"day", "ldate", "ldate", [](const Record& record) { return record.ldate; }},
     {"message", "msg", "msg", [](const Record& record) { return record.msg.empty() ? record.event : record.msg; }},
 };
@@ -46,15 +57,17 @@ bool isDigit(char c) {
     return c >= '0' && c <= '9';
 }
 
-// Each number, whatever its length, becomes one "#".
+constexpr char kNumber = '\0';  // stands in no text
+
+// Each number, whatever its length, becomes one mark.
 std::string withoutNumbers(std::string_view text) {
     std::string shape;
     shape.reserve(text.size());
     for (const char c : text) {
         if (!isDigit(c)) {
             shape += c;
-        } else if (shape.empty() || shape.back() != '#') {
-            shape += '#';
+        } else if (shape.empty() || shape.back() != kNumber) {
+            shape += kNumber;
         }
     }
     return shape;
@@ -94,8 +107,9 @@ std::vector<Group> CountBy(const Source& source, const Selection& selection, con
     }
     std::vector<Group> groups;
     groups.reserve(counts.size());
-    for (auto& [name, rows] : counts) {
+    for (const auto& [name, rows] : counts) {
         groups.push_back({name, rows});
+        std::replace(groups.back().name.begin(), groups.back().name.end(), kNumber, '#');
     }
     sortGroups(grouping, groups);
     return groups;

@@ -79,7 +79,7 @@ TEST_F(Store, HostileFiltersFindAndDeleteTheirRowsAlone) {
         const std::string& text = kHostile[i];
         for (const auto member : {&FilterOptions::host, &FilterOptions::program, &FilterOptions::facility}) {
             FilterOptions options;
-            options.*member = text;
+            options.*member = {text};
             EXPECT_EQ(select({"logs", BuildFilter(options, "logs", 0)}), Ids{i + 1}) << text;
         }
         FilterOptions options;
@@ -96,10 +96,10 @@ TEST_F(Store, HostileFiltersFindAndDeleteTheirRowsAlone) {
     }
     for (size_t i = 0; i < kHostile.size(); ++i) {
         FilterOptions options;
-        options.host = kHostile[i];
+        options.host = {kHostile[i]};
         OpenSource(path_)->remove(BuildFilter(options, "logs", 0).conditions);
         EXPECT_EQ(LargestId(*OpenSource(path_), "logs"), i + 1 < kHostile.size() ? kHostile.size() : 0);
-        EXPECT_EQ(select({}).size(), kHostile.size() - i - 1) << options.host;
+        EXPECT_EQ(select({}).size(), kHostile.size() - i - 1) << kHostile[i];
     }
 }
 
@@ -127,14 +127,14 @@ TEST_F(Store, EveryRowOfALargeTableComesInOrder) {
     EXPECT_EQ(select({"logs", {{}, "m?"}, 9000, 100}), Ids(all.begin() + 100, all.begin() + 9100));
     EXPECT_EQ(select({"logs", {{}, "m?"}, 1, 3}), Ids{all[3]});
     FilterOptions rare;
-    rare.host = "rare";
+    rare.host = {"rare"};
     rare.keyword = "m?";
     EXPECT_EQ(select({"logs", BuildFilter(rare, "logs", 0)}), (Ids{1000030000, 1000025000, 20000, 15000, 10000, 5000}));
 }
 
 TEST_F(Store, AFollowerSeesWhatArrivesAndWhatReplacesIt) {
     FilterOptions wanted;
-    wanted.host = "a";
+    wanted.host = {"a"};
     run("INSERT INTO logs(host) VALUES('a'), ('b'), ('a'), ('a')");
     const auto source = OpenSource(path_);
     Follower follower(*source, {"logs", BuildFilter(wanted, "logs", 0), 1, 7, true});

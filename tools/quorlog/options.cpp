@@ -29,9 +29,13 @@ CLI::Option* refuseEmpty(CLI::Option* option) {
     });
 }
 
-// An option that may be given several times; its values are joined like a list.
-void addList(CLI::App& command, const std::string& name, std::string& value, const std::string& help) {
-    refuseEmpty(command.add_option(name, value, help)->type_name("NAMES")->join(',')->group("Filters"));
+// An option that may be given several times. The parser's own lists would take some texts apart.
+void addList(CLI::App& command, const std::string& name, store::Names& value, const std::string& help) {
+    const auto take = [&value](const std::vector<std::string>& given) {
+        value = given;
+        return true;
+    };
+    refuseEmpty(command.add_option(name, take, help)->type_name("NAMES")->take_all()->group("Filters"));
 }
 
 CLI::Option* addFilter(CLI::App& command, const std::string& name, std::string& value, const std::string& type,
@@ -62,9 +66,9 @@ void AddTableOption(CLI::App& command, std::string& table) {
         ->check(namesOf(store::kLogTables));
 }
 
-void AddFilterOptions(CLI::App& command, store::FilterOptions& filters, bool patterns) {
-    filters.patterns = patterns;
-    const std::string like = patterns ? "; * and ? stand for any text" : "";
+void AddFilterOptions(CLI::App& command, store::FilterOptions& filters, bool lenient) {
+    filters.lenient = lenient;
+    const std::string like = lenient ? "; * and ? stand for any text" : "";
     addList(command, "--host", filters.host, "Sending hosts" + like);
     addList(command, "--level", filters.level, "Levels, such as err,crit; err+ is err and worse");
     addList(command, "--facility", filters.facility, "Facilities, such as kern,auth");
@@ -77,7 +81,13 @@ void AddFilterOptions(CLI::App& command, store::FilterOptions& filters, bool pat
     addFilter(command, "--glob", filters.glob, "PATTERN",
               "Messages like this as a whole; * is any text, ? any character")
         ->excludes(keyword);
-    command.add_flag("-i,--ignore-case", filters.ignoreCase, "Keywords in small or capital letters (ASCII)")
+    if (lenient) {
+        addFilter(command, "--regex", filters.regex, "PATTERN", "Messages that hold a match of the regular expression");
+    }
+    command
+        .add_flag("-i,--ignore-case", filters.ignoreCase,
+                  lenient ? "Keywords and expressions in small or capital letters"
+                          : "Keywords in small or capital letters (ASCII)")
         ->group("Filters");
     addFilter(command, "--from,--since", filters.from, "TIME",
               "First day or second: 6h, today, yesterday, 7d, 10:00, YYYY-MM-DD, 'YYYY-MM-DD hh:mm'");
@@ -88,6 +98,9 @@ void AddFilterOptions(CLI::App& command, store::FilterOptions& filters, bool pat
     addList(command, "--not-facility", filters.notFacility, "Any facility but these");
     addList(command, "--not-program", filters.notProgram, "Any program but these");
     addFilter(command, "--not-keyword", filters.notKeyword, "TEXT", "Messages without the text");
+    if (lenient) {
+        addFilter(command, "--not-regex", filters.notRegex, "PATTERN", "Messages without a match of it");
+    }
 }
 
 void AddOutputOptions(CLI::App& command, OutputOptions& output) {

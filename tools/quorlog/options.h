@@ -27,8 +27,8 @@ struct OutputOptions {
 
 void AddDatabaseOption(CLI::App& command, std::string& db);
 void AddTableOption(CLI::App& command, std::string& table);
-// `patterns`: names may hold "*" and "?".
-void AddFilterOptions(CLI::App& command, store::FilterOptions& filters, bool patterns);
+// `lenient`: as in store::FilterOptions; and regular expressions.
+void AddFilterOptions(CLI::App& command, store::FilterOptions& filters, bool lenient);
 void AddOutputOptions(CLI::App& command, OutputOptions& output);
 void AddYesOption(CLI::App& command, bool& yes);
 

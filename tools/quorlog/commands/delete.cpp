@@ -28,24 +28,23 @@ void setup(CLI::App& command, DeleteOptions& options) {
 
 // A deletion has to say what it means: an empty filter is a slip more often than a wish.
 void checkNames(const store::FilterOptions& filters) {
-    for (const std::string* names :
-         {&filters.host, &filters.level, &filters.facility, &filters.program, &filters.pid, &filters.msgid, &filters.ip,
-          &filters.notHost, &filters.notLevel, &filters.notFacility, &filters.notProgram}) {
-        if (*names == "any") {
+    for (const store::Names* names : {&filters.host, &filters.level, &filters.facility, &filters.program, &filters.pid,
+                                      &filters.msgid, &filters.ip}) {
+        if (!names->empty() && store::NamesOf(*names, "", false).empty()) {
             throw Failure("'any' means every row; leave that filter out");
         }
     }
-    for (const std::string* names : {&filters.notHost, &filters.notFacility, &filters.notProgram}) {
-        if (names->find_first_of("*?") != std::string::npos) {
-            throw Failure("rows cannot be kept by a name with * or ?, which stand for themselves here: '" + *names +
-                          "'; name each that is to be kept");
+    for (const store::Names* names : {&filters.notHost, &filters.notFacility, &filters.notProgram}) {
+        if (store::InWords(*names).find_first_of("*?") != std::string::npos) {
+            throw Failure("rows cannot be kept by a name with * or ?, which stand for themselves here: '" +
+                          store::InWords(*names) + "'; name each that is to be kept");
         }
     }
 }
 
 store::Filter filterOf(const DeleteOptions& options) {
-    checkNames(options.filters);
     store::Filter filter = BuildFilter(options.filters, "logs", time(nullptr));
+    checkNames(options.filters);
     const bool filtered = !filter.conditions.empty();
     if (!filter.literal.empty()) {
         throw Failure("--keyword: rows cannot be deleted by a text with * or ?, or one that is not UTF-8; give --glob, "

@@ -1,4 +1,4 @@
-// stats total, device, top, eps: what the accounting database knows.
+// stats: what the accounting database knows, and who was heard when.
 #include <algorithm>
 #include <ctime>
 
@@ -6,6 +6,7 @@
 #include "store/ask.h"
 #include "store/databasefile.h"
 #include "store/dates.h"
+#include "store/statistics.h"
 #include "tools/quorlog/commands/commands.h"
 #include "tools/quorlog/messages.h"
 #include "tools/quorlog/options.h"
@@ -14,15 +15,23 @@ namespace quor::cli {
 namespace {
 
 constexpr size_t kBarWidth = 40;
+constexpr int64_t kMostLines = 40;  // that a person gets without saying how long each is
 
 struct StatsOptions {
     std::string db = paths::kAccountingDb;
     OutputOptions output;
     std::string device;
     uint64_t limit = 10;
-    std::string last = "10m";
+    std::string last;
     std::string from;
     std::string to;
+    std::string every;
+};
+
+struct DevicesOptions {
+    std::string db = paths::kWorkingDb;
+    OutputOptions output;
+    uint64_t limit = 0;
 };
 
 void setup(CLI::App& command, StatsOptions& options) {
@@ -37,19 +46,33 @@ void setupDevice(CLI::App& command, StatsOptions& options) {
     setup(command, options);
 }
 
+void addSpan(CLI::App& command, StatsOptions& options, const std::string& last) {
+    CLI::Option* span = command.add_option("--last", options.last, last)->type_name("SPAN");
+    command.add_option("--from,--since", options.from, "First day or second: 6h, 10:00, today, YYYY-MM-DD")
+        ->type_name("TIME")
+        ->excludes(span);
+    command.add_option("--to,--until", options.to, "Last day or second, inclusive")->type_name("TIME")->excludes(span);
+}
+
 void setupTop(CLI::App& command, StatsOptions& options) {
     setup(command, options);
     AddNumberOption(command, "-n,--limit", options.limit, "Number of devices, 0 for all; 10 by default");
+    addSpan(command, options, "Of this time only: 90s, 10m, 6h, 1d");
 }
 
 void setupEps(CLI::App& command, StatsOptions& options) {
     setup(command, options);
-    CLI::Option* last = command.add_option("--last", options.last, "How far to look back: 90s, 10m, 6h, 2d");
-    last->type_name("SPAN")->capture_default_str();
-    command.add_option("--from", options.from, "First day, instead of --last: YYYY-MM-DD, today, yesterday, 7d")
-        ->type_name("DATE")
-        ->excludes(last);
-    command.add_option("--to", options.to, "Last day")->type_name("DATE")->excludes(last);
+    addSpan(command, options, "How far to look back: 90s, 10m, 6h, 1d; 10m by default");
+    command
+        .add_option("--every", options.every,
+                    "Put samples together: 10s, 1m, 1h; by itself on a terminal when there are many")
+        ->type_name("SPAN");
+}
+
+void setupDevices(CLI::App& command, DevicesOptions& options) {
+    AddDatabaseOption(command, options.db);
+    AddOutputOptions(command, options.output);
+    AddNumberOption(command, "-n,--limit", options.limit, "Number of devices, 0 for all");
 }
 
 // The readers of the library give 0 and nothing for a database that they cannot read.
@@ -88,41 +111,90 @@ int runDevice(const StatsOptions& options) {
     return writeCount(options, options.device, SyslogDBHistGetSingle(db, quoted(options.device)));
 }
 
-int runTop(const StatsOptions& options) {
-    std::string db = requireStatistics(options.db, "histogram");
-    const auto counts = SyslogDBHistGet(db, static_cast<int>(std::min<uint64_t>(options.limit, INT32_MAX)));
-    std::vector<std::pair<std::string, unsigned long long>> sorted(counts.begin(), counts.end());
-    std::stable_sort(sorted.begin(), sorted.end(), [](const auto& a, const auto& b) { return a.second > b.second; });
-    Output out(STDOUT_FILENO);
-    const auto sink = MakeSink(options.output.style(), {{"count", Kind::Number}, {"device"}}, out);
-    for (const auto& [device, count] : sorted) {
-        sink->row({std::to_string(count), device});
-    }
-    sink->finish();
-    return sorted.empty() ? ReportNothing("no logs were counted") : kDone;
-}
-
-struct Span {
-    int64_t first;
-    int64_t last;
-};
-
-Span spanOf(const StatsOptions& options) {
+// Without a time, from the first to the last second that there is.
+store::TimeSpan spanOf(const StatsOptions& options, const std::string& lastByDefault) {
     const time_t now = time(nullptr);
     const store::Moment from = store::ParseMoment(options.from, "--from", now);
     const store::Moment to = store::ParseMoment(options.to, "--to", now);
+    const std::string& last = options.last.empty() ? lastByDefault : options.last;
     if (from.empty() && to.empty()) {
-        return {now - static_cast<int64_t>(store::ParseSpan(options.last, "--last")), now};
+        return {now - static_cast<int64_t>(store::ParseSpan(last, "--last")), now};
     }
-    const Span span{from.empty() ? 0 : BeginOf(from), to.empty() ? now : EndOf(to)};
+    const store::TimeSpan span{from.empty() ? 0 : BeginOf(from), to.empty() ? now : EndOf(to)};
     if (!from.empty() && !to.empty() && span.first > span.last) {
         throw Failure("--from " + options.from + " is after --to " + options.to + "; swap them");
     }
     return span;
 }
 
-int bounded(int64_t seconds) {
-    return static_cast<int>(std::clamp<int64_t>(seconds, 0, INT32_MAX));
+// Since the beginning.
+std::vector<store::DeviceCount> countsOfAll(std::string db, uint64_t limit) {
+    std::vector<store::DeviceCount> devices;
+    for (const auto& [device, logs] : SyslogDBHistGet(db, static_cast<int>(std::min<uint64_t>(limit, INT32_MAX)))) {
+        devices.push_back({device, logs});
+    }
+    std::stable_sort(devices.begin(), devices.end(), [](const auto& a, const auto& b) { return a.logs > b.logs; });
+    return devices;
+}
+
+// Samples are kept for a day only.
+std::vector<store::DeviceCount> countsOf(const std::string& db, const StatsOptions& options) {
+    const store::TimeSpan span = spanOf(options, "");
+    const int64_t oldest = store::OldestSample(db);
+    if (oldest > span.first) {
+        Complain("samples reach back to " + store::LocalTime(oldest) +
+                 "; for what is older: quorlog count --by host --from ...");
+    }
+    return BusiestDevices(db, span, options.limit);
+}
+
+int runTop(const StatsOptions& options) {
+    const bool spanned = !options.last.empty() || !options.from.empty() || !options.to.empty();
+    const std::string db = requireStatistics(options.db, spanned ? "eps" : "histogram");
+    const auto devices = spanned ? countsOf(db, options) : countsOfAll(db, options.limit);
+    Output out(STDOUT_FILENO);
+    const auto sink = MakeSink(options.output.style(), {{"count", Kind::Number}, {"device"}}, out);
+    for (const auto& [device, logs] : devices) {
+        sink->row({std::to_string(logs), device});
+    }
+    sink->finish();
+    return devices.empty() ? ReportNothing("no logs were counted") : kDone;
+}
+
+// A sample holds what was counted since the one before it closed, so its rate needs that distance, which is not known
+// for the first one.
+std::vector<store::Stretch> samplesOf(std::string db, const store::TimeSpan& span) {
+    const auto bounded = [](int64_t seconds) { return static_cast<int>(std::clamp<int64_t>(seconds, 0, INT32_MAX)); };
+    std::vector<store::Stretch> samples;
+    for (const auto& [stamp, sample] : SyslogDBEpsGet(db, bounded(span.first), bounded(span.last))) {
+        const int64_t seconds = samples.empty() ? 0 : sample.stamp - samples.back().begin;
+        samples.push_back({sample.stamp, seconds, sample.eps});
+    }
+    return samples;
+}
+
+// The shortest usual time of which few enough make up the whole.
+int64_t stepFor(const std::vector<store::Stretch>& samples) {
+    constexpr int64_t kSteps[] = {5, 10, 30, 60, 300, 600, 1800, 3600, 7200, 21600};
+    const int64_t seconds = samples.back().begin - samples.front().begin;
+    const auto* step =
+        std::find_if(std::begin(kSteps), std::end(kSteps), [&](int64_t each) { return seconds / each < kMostLines; });
+    return step == std::end(kSteps) ? 86400 : *step;
+}
+
+std::vector<store::Stretch> stretchesOf(const StatsOptions& options, const std::string& db,
+                                        const store::TimeSpan& span) {
+    if (!options.every.empty()) {
+        const auto step = static_cast<int64_t>(store::ParseSpan(options.every, "--every"));
+        if (step == 0) {
+            throw Failure("--every: no time at all; give 10s, 1m or 1h");
+        }
+        return Stretches(db, span, step);
+    }
+    const Style style = options.output.style();
+    std::vector<store::Stretch> samples = samplesOf(db, span);
+    const bool many = static_cast<int64_t>(samples.size()) > kMostLines;
+    return many && style.terminal && style.format == Format::Table ? Stretches(db, span, stepFor(samples)) : samples;
 }
 
 std::string decimal(double value) {
@@ -130,26 +202,14 @@ std::string decimal(double value) {
     return {text, static_cast<size_t>(snprintf(text, sizeof text, "%.2f", value))};
 }
 
-using Samples = std::map<int32_t, SYSLOG_LOG_EPS>;
-
-unsigned long long largestOf(const Samples& samples) {
-    unsigned long long largest = 1;
-    for (const auto& [stamp, sample] : samples) {
-        largest = std::max(largest, sample.eps);
-    }
-    return largest;
+std::vector<std::string> textsOf(const store::Stretch& stretch, bool table) {
+    const bool known = stretch.seconds != 0;
+    return {table ? store::LocalTime(stretch.begin) : std::to_string(stretch.begin), std::to_string(stretch.logs),
+            known ? std::to_string(stretch.seconds) : "",
+            known ? decimal(static_cast<double>(stretch.logs) / static_cast<double>(stretch.seconds)) : ""};
 }
 
-// A sample holds what was counted since the one before it closed, so its rate needs that distance: 0 is an unknown one,
-// as that of the first sample shown.
-std::vector<std::string> textsOf(const SYSLOG_LOG_EPS& sample, int64_t seconds, bool table) {
-    const bool known = seconds != 0;
-    return {table ? store::LocalTime(sample.stamp) : std::to_string(sample.stamp), std::to_string(sample.eps),
-            known ? std::to_string(seconds) : "",
-            known ? decimal(static_cast<double>(sample.eps) / static_cast<double>(seconds)) : ""};
-}
-
-void writeSamples(const Samples& samples, const Style& style, Output& out) {
+void writeStretches(const std::vector<store::Stretch>& stretches, const Style& style, Output& out) {
     const bool table = style.format == Format::Table;
     const bool drawn = table && style.terminal;
     Columns columns = {{"stamp", table ? Kind::Text : Kind::Number},
@@ -160,28 +220,44 @@ void writeSamples(const Samples& samples, const Style& style, Output& out) {
         columns.push_back({"samples"});
     }
     const auto sink = MakeSink(style, columns, out);
-    const unsigned long long largest = largestOf(samples);
-    long long previous = samples.empty() ? 0 : samples.begin()->second.stamp;
-    for (const auto& [stamp, sample] : samples) {
-        std::vector<std::string> texts = textsOf(sample, sample.stamp - previous, table);
+    uint64_t largest = 1;
+    for (const store::Stretch& stretch : stretches) {
+        largest = std::max(largest, stretch.logs);
+    }
+    for (const store::Stretch& stretch : stretches) {
+        std::vector<std::string> texts = textsOf(stretch, table);
         if (drawn) {
-            texts.emplace_back(sample.eps * kBarWidth / largest, '#');
+            texts.emplace_back(static_cast<size_t>(stretch.logs * kBarWidth / largest), '#');
         }
         sink->row(Cells(texts.begin(), texts.end()));
-        previous = sample.stamp;
     }
     sink->finish();
 }
 
 int runEps(const StatsOptions& options) {
-    std::string db = requireStatistics(options.db, "eps");
-    const Span span = spanOf(options);
-    const auto samples = SyslogDBEpsGet(db, bounded(span.first), bounded(span.last));
+    const std::string db = requireStatistics(options.db, "eps");
+    const store::TimeSpan span = spanOf(options, "10m");
+    const std::vector<store::Stretch> stretches = stretchesOf(options, db, span);
     Output out(STDOUT_FILENO);
-    writeSamples(samples, options.output.style(), out);
-    return samples.empty()
+    writeStretches(stretches, options.output.style(), out);
+    return stretches.empty()
                ? ReportNothing("no samples from " + store::LocalTime(span.first) + " to " + store::LocalTime(span.last))
                : kDone;
+}
+
+int runDevices(const DevicesOptions& options) {
+    const std::string db = store::RequireLogDatabase(options.db);
+    std::vector<store::DeviceSeen> devices = store::DevicesSeen(db);
+    if (options.limit != 0 && devices.size() > options.limit) {
+        devices.resize(static_cast<size_t>(options.limit));
+    }
+    Output out(STDOUT_FILENO);
+    const auto sink = MakeSink(options.output.style(), {{"last"}, {"first"}, {"rows", Kind::Number}, {"device"}}, out);
+    for (const store::DeviceSeen& seen : devices) {
+        sink->row({seen.last, seen.first, std::to_string(seen.rows), seen.device});
+    }
+    sink->finish();
+    return devices.empty() ? ReportNothing("no rows in " + db) : kDone;
 }
 
 }  // namespace
@@ -194,6 +270,8 @@ void AddStats(CLI::App& app, int& status) {
                              runDevice);
     AddCommand<StatsOptions>(stats, "top", "Print the devices with the most logs", status, setupTop, runTop);
     AddCommand<StatsOptions>(stats, "eps", "Print samples of the log rate", status, setupEps, runEps);
+    AddCommand<DevicesOptions>(stats, "devices", "Print when each device was heard first and last", status,
+                               setupDevices, runDevices);
 }
 
 }  // namespace quor::cli
