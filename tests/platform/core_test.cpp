@@ -221,9 +221,9 @@ TEST_F(Sections, TouchesNothingElse) {
     EXPECT_EQ(value(file, "added", "k") + value(file, "added", "l"), odd);
     EXPECT_EQ(value(file, "z", "x"), "1");
     EXPECT_EQ(names(file), Strings({"a", "new]name", "z", "added"}));
-    const std::string last = folder_.write("last", "[s]\nx=\"1\"");
-    ASSERT_EQ(set(last, "s", "s", {{"x", "2"}, {"y", "3"}}, "  %s = \"%s\"\n"), 0);
-    EXPECT_EQ(ReadFile(last), "[s]\n  x = \"2\"\n  y = \"3\"\n");
+    const std::string last = folder_.write("last", "[s]\nb=\"1\"\nx=\"1\"");
+    ASSERT_EQ(set(last, "s", "s", {{"b", "1"}, {"x", "2"}, {"y", "3"}}, "  %s = \"%s\"\n"), 0);
+    EXPECT_EQ(ReadFile(last), "[s]\n  b = \"1\"\n  x = \"2\"\n  y = \"3\"\n");
 }
 
 TEST_F(Sections, KeepsModeAndLinkAndLeavesNoDraft) {
