@@ -9,6 +9,7 @@
 #include "store/databasefile.h"
 #include "store/failure.h"
 #include "store/regex.h"
+#include "store/shape.h"
 #include "store/source.h"
 
 namespace quor::store {
@@ -168,6 +169,7 @@ class FileSource : public Source {
     Result ask(const std::string& table, const std::string& sql, const _SYSLOG_SQL_LIMIT_tag* limit = nullptr) const {
         const Connection connection = Connect(path_);
         AddRegexp(connection);
+        AddShape(connection);
         try {
             return Execute(connection, path_, sql, limit);
         } catch (const Failure& failure) {

@@ -6,6 +6,7 @@
 
 #include "store/columns.h"
 #include "store/failure.h"
+#include "store/shape.h"
 
 namespace quor::store {
 namespace {
@@ -22,13 +23,8 @@ std::string levelOf(const Record& record) {
     return PriorTypeToStr(record.prio);
 }
 
-// As the library reads a level.
-constexpr const char kLevel[] =
-    "iif(llevel IN ('emerg', 'alert', 'crit', 'err', 'warning', 'notice', 'info'), llevel, 'debug')";
-
 // A row without a time of day has its day.
-constexpr const char kHour[] =
-    "ifnull(ldate, '') || iif(ifnull(ltime, '') = '', '', ' ' || substr(ltime, 1, 2) || ':00')";
+constexpr const char kHour[] = "ifnull(ldate, '') || iif(ltime > '', ' ' || substr(ltime, 1, 2) || ':00', '')";
 
 std::string hourOf(const Record& record) {
     return record.ltime.empty() ? record.ldate : record.ldate + " " + record.ltime.substr(0, 2) + ":00";
@@ -37,11 +33,12 @@ std::string hourOf(const Record& record) {
 constexpr Grouping kKnown[] = {
     {"host", "host", "host", [](const Record& record) { return record.host; }},
     {"program", "prog", "prog", [](const Record& record) { return record.prog; }},
-    {"level", "llevel", kLevel, levelOf},
+    {"level", "llevel", "llevel", levelOf},
     {"facility", "fac", "fac", [](const Record& record) { return record.fac; }},
     {"hour", "ltime", kHour, hourOf},
     {"day", "ldate", "ldate", [](const Record& record) { return record.ldate; }},
-    {"message", "msg", "msg", [](const Record& record) { return record.msg.empty() ? record.event : record.msg; }},
+    {"message", "msg", "shape(msg)",
+     [](const Record& record) { return ShapeOf(record.msg.empty() ? record.event : record.msg); }},
 };
 
 const Grouping& groupingNamed(const std::string& name, const std::string& table) {
@@ -53,24 +50,10 @@ const Grouping& groupingNamed(const std::string& name, const std::string& table)
     return *found;
 }
 
-bool isDigit(char c) {
-    return c >= '0' && c <= '9';
-}
-
-constexpr char kNumber = '\0';  // stands in no text
-
-// Each number, whatever its length, becomes one mark.
-std::string withoutNumbers(std::string_view text) {
-    std::string shape;
-    shape.reserve(text.size());
-    for (const char c : text) {
-        if (!isDigit(c)) {
-            shape += c;
-        } else if (shape.empty() || shape.back() != kNumber) {
-            shape += kNumber;
-        }
-    }
-    return shape;
+// The library reads whatever is none of the levels as one of them.
+std::string shownAs(const Grouping& how, std::string_view name) {
+    std::string text(name);
+    return std::string_view(how.column) == "llevel" ? PriorTypeToStr(PriorStrToType(text.c_str())) : text;
 }
 
 size_t severity(const std::string& level) {
@@ -93,11 +76,8 @@ void sortGroups(const std::string& grouping, std::vector<Group>& groups) {
 
 std::vector<Group> CountBy(const Source& source, const Selection& selection, const std::string& grouping) {
     const Grouping& how = groupingNamed(grouping, selection.table);
-    const bool shapes = grouping == "message";
     std::unordered_map<std::string, uint64_t> counts;
-    const auto add = [&](std::string_view name, uint64_t rows) {
-        counts[shapes ? withoutNumbers(name) : std::string(name)] += rows;
-    };
+    const auto add = [&](std::string_view name, uint64_t rows) { counts[shownAs(how, name)] += rows; };
     if (selection.filter.literal.empty()) {
         source.groups(selection.table, selection.filter.conditions, how.expression, add);
     } else {
@@ -109,7 +89,7 @@ std::vector<Group> CountBy(const Source& source, const Selection& selection, con
     groups.reserve(counts.size());
     for (const auto& [name, rows] : counts) {
         groups.push_back({name, rows});
-        std::replace(groups.back().name.begin(), groups.back().name.end(), kNumber, '#');
+        std::replace(groups.back().name.begin(), groups.back().name.end(), kNumberMark, '#');
     }
     sortGroups(grouping, groups);
     return groups;
