@@ -4,6 +4,9 @@
 #include <charconv>
 #include <iterator>
 
+#include "base/words.h"
+#include "store/failure.h"
+
 namespace quor::store {
 namespace {
 
@@ -34,49 +37,69 @@ std::string_view process(const Record& record, std::string& scratch) {
 }
 
 constexpr Column kLogs[] = {
-    {"id", Kind::Number, Shown::Always, number<&Record::id>},
-    {"ldate", Kind::Text, Shown::Always, text<&Record::ldate>},
-    {"ltime", Kind::Text, Shown::Always, text<&Record::ltime>},
-    {"utcsec", Kind::Number, Shown::InFull, number<&Record::utcsec>},
-    {"tzoffset", Kind::Text, Shown::InFull, text<&Record::tzoffset>},
-    {"host", Kind::Text, Shown::Always, text<&Record::host>},
-    {"ip", Kind::Text, Shown::InFull, text<&Record::ip>},
-    {"fac", Kind::Text, Shown::Always, text<&Record::fac>},
-    {"prio", Kind::Level, Shown::Always, level},
-    {"tag", Kind::Text, Shown::InFull, text<&Record::tag>},
-    {"prog", Kind::Text, Shown::InFull, text<&Record::prog>},
-    {"prog", Kind::Text, Shown::InBrief, process},
-    {"msg", Kind::Text, Shown::Always, text<&Record::msg>},
-    {"pid", Kind::Text, Shown::InFull, text<&Record::pid>},
-    {"msgid", Kind::Text, Shown::InFull, text<&Record::msgid>},
-    {"sdata", Kind::Text, Shown::InFull, text<&Record::sdata>},
-    {"rsec", Kind::Number, Shown::InFull, received},
+    {"id", "id", Kind::Number, Shown::Always, number<&Record::id>},
+    {"ldate", "date", Kind::Text, Shown::Always, text<&Record::ldate>},
+    {"ltime", "time", Kind::Text, Shown::Always, text<&Record::ltime>},
+    {"utcsec", "sent", Kind::Number, Shown::InFull, number<&Record::utcsec>},
+    {"tzoffset", "zone", Kind::Text, Shown::InFull, text<&Record::tzoffset>},
+    {"host", "host", Kind::Text, Shown::Always, text<&Record::host>},
+    {"ip", "ip", Kind::Text, Shown::InFull, text<&Record::ip>},
+    {"fac", "facility", Kind::Text, Shown::Always, text<&Record::fac>},
+    {"prio", "level", Kind::Level, Shown::Always, level},
+    {"tag", "tag", Kind::Text, Shown::InFull, text<&Record::tag>},
+    {"prog", "program", Kind::Text, Shown::InFull, text<&Record::prog>},
+    {"prog", "program", Kind::Text, Shown::InBrief, process},
+    {"msg", "message", Kind::Text, Shown::Always, text<&Record::msg>},
+    {"pid", "pid", Kind::Text, Shown::InFull, text<&Record::pid>},
+    {"msgid", "msgid", Kind::Text, Shown::InFull, text<&Record::msgid>},
+    {"sdata", "sdata", Kind::Text, Shown::InFull, text<&Record::sdata>},
+    {"rsec", "received", Kind::Number, Shown::InFull, received},
 };
 
 constexpr Column kSystemLogs[] = {
-    {"id", Kind::Number, Shown::Always, number<&Record::id>},
-    {"ldate", Kind::Text, Shown::Always, text<&Record::ldate>},
-    {"ltime", Kind::Text, Shown::Always, text<&Record::ltime>},
-    {"host", Kind::Text, Shown::Always, text<&Record::host>},
-    {"llevel", Kind::Level, Shown::Always, level},
-    {"prog", Kind::Text, Shown::Always, text<&Record::prog>},
-    {"luser", Kind::Text, Shown::Always, text<&Record::luser>},
-    {"msg", Kind::Text, Shown::Always, text<&Record::event>},
+    {"id", "id", Kind::Number, Shown::Always, number<&Record::id>},
+    {"ldate", "date", Kind::Text, Shown::Always, text<&Record::ldate>},
+    {"ltime", "time", Kind::Text, Shown::Always, text<&Record::ltime>},
+    {"host", "host", Kind::Text, Shown::Always, text<&Record::host>},
+    {"llevel", "level", Kind::Level, Shown::Always, level},
+    {"prog", "program", Kind::Text, Shown::Always, text<&Record::prog>},
+    {"luser", "user", Kind::Text, Shown::Always, text<&Record::luser>},
+    {"msg", "message", Kind::Text, Shown::Always, text<&Record::event>},
 };
 
 constexpr Column kTransfers[] = {
-    {"id", Kind::Number, Shown::Always, number<&Record::id>},
-    {"ldate", Kind::Text, Shown::Always, text<&Record::ldate>},
-    {"ltime", Kind::Text, Shown::Always, text<&Record::ltime>},
-    {"host", Kind::Text, Shown::Always, text<&Record::host>},
-    {"ip", Kind::Text, Shown::Always, text<&Record::xferip>},
-    {"prog", Kind::Text, Shown::Always, text<&Record::prog>},
-    {"luser", Kind::Text, Shown::Always, text<&Record::luser>},
-    {"event", Kind::Text, Shown::Always, text<&Record::event>},
-    {"isdir", Kind::Number, Shown::InFull, number<&Record::isdir>},
-    {"fsize", Kind::Text, Shown::Always, text<&Record::fsize>},
-    {"fname", Kind::Text, Shown::Always, text<&Record::fname>},
+    {"id", "id", Kind::Number, Shown::Always, number<&Record::id>},
+    {"ldate", "date", Kind::Text, Shown::Always, text<&Record::ldate>},
+    {"ltime", "time", Kind::Text, Shown::Always, text<&Record::ltime>},
+    {"host", "host", Kind::Text, Shown::Always, text<&Record::host>},
+    {"ip", "ip", Kind::Text, Shown::Always, text<&Record::xferip>},
+    {"prog", "program", Kind::Text, Shown::Always, text<&Record::prog>},
+    {"luser", "user", Kind::Text, Shown::Always, text<&Record::luser>},
+    {"event", "event", Kind::Text, Shown::Always, text<&Record::event>},
+    {"isdir", "folder", Kind::Number, Shown::InFull, number<&Record::isdir>},
+    {"fsize", "size", Kind::Text, Shown::Always, text<&Record::fsize>},
+    {"fname", "file", Kind::Text, Shown::Always, text<&Record::fname>},
 };
+
+std::string titlesOf(const std::vector<Column>& columns) {
+    std::string titles;
+    for (const Column& column : columns) {
+        titles.append(titles.empty() ? "" : ", ").append(column.title);
+    }
+    return titles;
+}
+
+Column columnNamed(const std::vector<Column>& all, std::string_view name, const std::string& table) {
+    for (Column column : all) {
+        for (const char* known : {column.name, column.title}) {
+            if (name == known) {
+                column.name = column.title = known;
+                return column;
+            }
+        }
+    }
+    throw Failure("--columns: table " + table + " has no column '" + std::string(name) + "'; give " + titlesOf(all));
+}
 
 }  // namespace
 
@@ -93,6 +116,24 @@ std::vector<Column> ColumnsOf(const std::string& table, bool brief) {
         add(kTransfers);
     } else {
         add(kSystemLogs);
+    }
+    return columns;
+}
+
+std::vector<Column> ColumnsNamed(const std::string& table, const std::string& list) {
+    const std::vector<Column> all = ColumnsOf(table, false);
+    std::vector<Column> columns;
+    EachWord(list, ", ", [&](std::string_view name) {
+        const Column named = columnNamed(all, name, table);
+        for (const Column& column : columns) {
+            if (column.read == named.read) {
+                throw Failure("--columns: '" + std::string(name) + "' is named twice; leave one out");
+            }
+        }
+        columns.push_back(named);
+    });
+    if (columns.empty()) {
+        throw Failure("--columns: no column in '" + list + "'; give " + titlesOf(all));
     }
     return columns;
 }

@@ -5,6 +5,7 @@
 namespace quor::store {
 namespace {
 
+constexpr uint64_t kFirstPiece = 256;             // small, so that the first rows are there at once
 constexpr uint64_t kMaxSpan = uint64_t{1} << 24;  // ids looked at in one go where few match
 
 // The ids from `first` to `last`.
@@ -72,14 +73,15 @@ class Remainder {
     bool fromBelow_;
 };
 
-// Walks the ids in spans. A span bounds what one statement scans or sorts, the piece what it returns; spans grow while
-// few rows match.
+// Walks the ids in spans. A span bounds what one statement scans or sorts, the piece what it returns. Pieces grow up to
+// kPiece, spans while few rows match.
 uint64_t selectInPieces(const Source& source, const Selection& selection, const RecordHandler& handler) {
     Tally tally(selection, handler);
     Span all{};
     bool more = edges(source, selection.table, all);
     Remainder remainder(all, selection.oldestFirst);
-    uint64_t width = kPiece;
+    uint64_t piece = kFirstPiece;
+    uint64_t width = piece;
     while (more && !tally.full()) {
         const Span span = remainder.next(width);
         uint64_t reached = 0;
@@ -87,11 +89,13 @@ uint64_t selectInPieces(const Source& source, const Selection& selection, const 
             reached = record.id;
             tally.take(record);
         };
-        const uint64_t rows = source.read(selection.table, within(selection.filter.conditions, span), {kPiece, 0},
+        const uint64_t rows = source.read(selection.table, within(selection.filter.conditions, span), {piece, 0},
                                           selection.oldestFirst, take);
         const uint64_t end = selection.oldestFirst ? span.last : span.first;
-        more = remainder.drop(rows == kPiece ? reached : end);
-        width = rows < kPiece / 4 ? std::min(width * 2, kMaxSpan) : kPiece;
+        more = remainder.drop(rows == piece ? reached : end);
+        const bool few = rows < piece / 4;
+        piece = std::min(piece * 2, kPiece);
+        width = few ? std::min(width * 2, kMaxSpan) : piece;
     }
     return tally.taken();
 }

@@ -7,6 +7,7 @@
 
 #include "tests/support/temp_folder.h"
 #include "tools/quorlog/commands/commands.h"
+#include "tools/quorlog/examples.h"
 
 namespace {
 
@@ -33,6 +34,10 @@ void expectDescribed(const CLI::App& app, const std::string& command) {
         words.insert(sub->get_name());
         EXPECT_NE(manual.find(" Cm " + path + "\n"), std::string::npos) << path;
         expectDescribed(*sub, path);
+    }
+    for (const std::string& word :
+         wordsOf(quor::cli::ExampleOfCommand("quorlog" + (command.empty() ? "" : " " + command)))) {
+        EXPECT_TRUE(word.rfind("--", 0) != 0 || words.count(word) != 0 || command.empty()) << command << word;
     }
     const std::string start = "\n    '" + command + "') words='";
     const size_t begin = script.find(start) + start.size();

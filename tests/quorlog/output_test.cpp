@@ -2,10 +2,13 @@
 #include <gtest/gtest.h>
 
 #include <map>
+#include <sstream>
 
 #include "store/dates.h"
 #include "store/failure.h"
 #include "tools/quorlog/display.h"
+#include "tools/quorlog/layout.h"
+#include "tools/quorlog/wrap.h"
 
 using namespace quor::cli;
 using namespace quor::store;
@@ -40,6 +43,44 @@ TEST(Text, IsShownAndEncodedWithoutAnythingRaw) {
         std::string json;
         AppendVisibleJson(json, text);
         EXPECT_EQ(json, encoded);
+    }
+}
+
+TEST(Text, WrapsAtWords) {
+    using Lines = std::vector<std::string_view>;
+    EXPECT_EQ(Wrap("", 5), Lines{""});
+    EXPECT_EQ(Wrap("one two three", 7), (Lines{"one two", "three"}));
+    EXPECT_EQ(Wrap("one two three", 6), (Lines{"one", "two", "three"}));
+    EXPECT_EQ(Wrap("a abcdefgh b", 3), (Lines{"a", "abc", "def", "gh", "b"}));
+    EXPECT_EQ(Wrap("a          b", 4), (Lines{"a", "b"}));
+    EXPECT_EQ(Wrap("\u65e5\u672c\u8a9e", 5), (Lines{"\u65e5\u672c", "\u8a9e"})) << "wide letters";
+    EXPECT_EQ(Wrap("abe\u0301c", 3), (Lines{"abe\u0301", "c"})) << "a mark stays with its letter";
+}
+
+// Whatever the texts are, no line of a table is wider than the screen, and nothing of a text is lost.
+TEST(Text, FitsScreensOfAnyWidth) {
+    const std::string wide = "\u65e5\u672c\U0001f469\u200d\U0001f469\u200d\U0001f467\u2764\ufe0f";
+    const std::string mixed = "e\u0301\u05e9\u05dc\u05d5\u05dd \\x1b[2J " + wide;
+    const Columns columns = {{"id", Kind::Number}, {"host"}, {"level"}, {"message"}, {"advice"}};
+    for (size_t screen = 12; screen < 130; ++screen) {
+        Layout layout(columns, screen);
+        for (const std::string& text : {std::string(), std::string("short"), std::string(300, 'x'), wide, mixed,
+                                        mixed + mixed + mixed + " " + mixed + std::string(60, ' ') + mixed}) {
+            Line line(columns.size());
+            for (Cell& cell : line) {
+                cell.width = AppendVisible(cell.text, text);
+            }
+            layout.widen(line);
+            std::string out;
+            layout.append(out, line);
+            std::istringstream lines(out);
+            for (std::string row; std::getline(lines, row);) {
+                std::string visible;
+                EXPECT_LE(AppendVisible(visible, row), screen) << row;
+            }
+            const auto inked = [](const std::string& all) { return all.size() - count(all.begin(), all.end(), ' '); };
+            EXPECT_EQ(inked(out) - count(out.begin(), out.end(), '\n'), 5 * inked(text)) << out;
+        }
     }
 }
 

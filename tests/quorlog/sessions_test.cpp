@@ -40,6 +40,10 @@ class Session : public testing::TestWithParam<std::string> {
 
 TEST_P(Session, PrintsWhatIsWritten) {
     setenv("TZ", "UTC", 1);
+    setenv("PAGER", "cat", 1);
+    for (const char* variable : {"QUORLOG_PAGER", "COLUMNS", "LINES"}) {
+        unsetenv(variable);
+    }
     setenv("QUORLOG", QUORLOG, 1);
     setenv("QUORLOGD", QUORLOGD, 1);
     setenv("ROOT", QUOR_ROOT, 1);
@@ -61,8 +65,9 @@ TEST_P(Session, PrintsWhatIsWritten) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Quorlog, Session,
-                         testing::Values("daemon", "databases", "events", "failures", "forms", "help", "parse", "rules",
-                                         "search", "statistics", "terminal"),
+                         testing::Values("columns", "completion", "context", "daemon", "databases", "events",
+                                         "failures", "forms", "help", "pager", "parse", "rules", "search", "statistics",
+                                         "terminal", "usage"),
                          [](const auto& test) { return test.param; });
 
 }  // namespace

@@ -4,6 +4,7 @@
 #include <numeric>
 
 #include "store/ask.h"
+#include "store/context.h"
 #include "store/failure.h"
 #include "store/follower.h"
 #include "store/selection.h"
@@ -100,6 +101,49 @@ TEST_F(Store, HostileFiltersFindAndDeleteTheirRowsAlone) {
         OpenSource(path_)->remove(BuildFilter(options, "logs", 0).conditions);
         EXPECT_EQ(LargestId(*OpenSource(path_), "logs"), i + 1 < kHostile.size() ? kHostile.size() : 0);
         EXPECT_EQ(select({}).size(), kHostile.size() - i - 1) << kHostile[i];
+    }
+}
+
+// Every row near a hit once, as grep would: "5* 6 -- 9 ".
+std::string around(const Ids& all, const std::vector<size_t>& hits, size_t lead, size_t trail) {
+    std::string text;
+    size_t last = SIZE_MAX;
+    for (size_t at = 0; at < all.size(); ++at) {
+        const bool near =
+            std::any_of(hits.begin(), hits.end(), [&](size_t hit) { return at + lead >= hit && at <= hit + trail; });
+        const bool hit = std::find(hits.begin(), hits.end(), at) != hits.end();
+        text += !near ? ""
+                      : (last != SIZE_MAX && last + 1 < at ? "-- " : "") + std::to_string(all[at]) + (hit ? "* " : " ");
+        last = near ? at : last;
+    }
+    return text;
+}
+
+TEST_F(Store, RowsAroundHitsComeOnceAndInOrder) {
+    run("WITH RECURSIVE n(i) AS (SELECT 1 UNION ALL SELECT i + 1 FROM n WHERE i < 70) INSERT INTO logs(id, host) "
+        "SELECT i, iif(i IN (1, 2, 10, 11, 13, 20, 33, 34, 40, 57, 70), 'hit', 'x') FROM n WHERE i % 7 OR i = 70");
+    FilterOptions filter;
+    filter.host = {"hit"};
+    for (int variant = 0; variant < 5 * 4 * 2 * 3 * 2; ++variant) {
+        const Context context{Ids{0, 1, 2, 6, 100}[variant % 5], Ids{0, 1, 3, 100}[variant / 5 % 4]};
+        Selection selection{"logs", BuildFilter(filter, "logs", 0)};
+        selection.oldestFirst = variant / 20 % 2 != 0;
+        selection.limit = Ids{0, 1, 4}[variant / 40 % 3];
+        selection.offset = Ids{0, 2}[variant / 120];
+        Selection every;
+        every.oldestFirst = selection.oldestFirst;
+        const Ids all = select(every);
+        std::vector<size_t> hits;
+        for (const uint64_t id : select(selection)) {
+            hits.push_back(static_cast<size_t>(std::find(all.begin(), all.end(), id) - all.begin()));
+        }
+        std::string text;
+        SelectWithContext(*OpenSource(path_), selection, context, [&](const Record& record, bool hit, bool apart) {
+            text += (apart ? "-- " : "") + std::to_string(record.id) + (hit ? "* " : " ");
+        });
+        EXPECT_EQ(text, around(all, hits, selection.oldestFirst ? context.before : context.after,
+                               selection.oldestFirst ? context.after : context.before))
+            << variant;
     }
 }
 

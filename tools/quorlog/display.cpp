@@ -46,10 +46,6 @@ void appendSpelled(std::string& out, char32_t code) {
     }
 }
 
-size_t widthOf(char32_t code) {
-    return static_cast<size_t>(std::max(0, utf8proc_charwidth(static_cast<utf8proc_int32_t>(code))));
-}
-
 bool looksLikeFormula(std::string_view text) {
     return !text.empty() && std::string_view("=+-@\t\r\n'").find(text.front()) != std::string_view::npos;
 }
@@ -76,6 +72,12 @@ bool IsHidden(char32_t code) {
     }
 }
 
+size_t WidthOf(char32_t code) {
+    constexpr char32_t kEmojiForm = 0xFE0F;  // makes the character before it a wide one
+    const int width = utf8proc_charwidth(static_cast<utf8proc_int32_t>(code));
+    return code == kEmojiForm ? 1 : static_cast<size_t>(std::max(0, width));
+}
+
 size_t AppendVisible(std::string& out, std::string_view text) {
     size_t width = 0;
     for (size_t at = 0; at < text.size();) {
@@ -91,7 +93,7 @@ size_t AppendVisible(std::string& out, std::string_view text) {
         const size_t before = out.size();
         if (symbol.valid && !IsHidden(symbol.code)) {
             out.append(text, at, symbol.length);
-            width += widthOf(symbol.code);
+            width += WidthOf(symbol.code);
         } else {
             symbol.valid ? appendSpelled(out, symbol.code) : appendByte(out, symbol.code);
             width += out.size() - before;

@@ -14,6 +14,9 @@ namespace quor::cli {
 // separators, and codes that no character has.
 bool IsHidden(char32_t code);
 
+// The columns that a character takes on a terminal.
+size_t WidthOf(char32_t code);
+
 // Appends the text with everything hidden or invalid spelled out. Returns the columns that it takes on a terminal.
 size_t AppendVisible(std::string& out, std::string_view text);
 std::string Visible(std::string_view text);

@@ -9,6 +9,8 @@
 #include "store/failure.h"
 #include "tools/quorlog/commands/commands.h"
 #include "tools/quorlog/messages.h"
+#include "tools/quorlog/output.h"
+#include "tools/quorlog/usage.h"
 
 namespace {
 
@@ -25,9 +27,7 @@ int parseFailed(const CLI::App& app, const CLI::ParseError& error) {
         app.exit(error);
         return std::cout.flush() ? quor::cli::kDone : fail("cannot write the help; make sure that its disk has room");
     }
-    const bool unknown = app.get_subcommands().empty() && app.remaining_size() != 0;
-    const std::string cause = unknown ? "no such command '" + app.remaining().front() + "'" : error.what();
-    return fail(cause + "; see quorlog --help-all");
+    return fail(quor::cli::Explain(app, error));
 }
 
 int run(int argc, char** argv) {
@@ -41,6 +41,8 @@ int run(int argc, char** argv) {
         return status;
     } catch (const CLI::ParseError& error) {
         return parseFailed(app, error);
+    } catch (const quor::cli::ReaderLeft&) {
+        return quor::cli::kDone;
     } catch (const quor::store::Failure& failure) {
         return fail(failure.what());
     }

@@ -1,19 +1,39 @@
 #include "tools/quorlog/options.h"
 
+#include <sys/ioctl.h>
+
 #include <algorithm>
 #include <charconv>
 #include <cstdlib>
 
+#include "base/numbers.h"
 #include "base/paths.h"
 #include "store/columns.h"
 
 namespace quor::cli {
 namespace {
 
+// A terminal that can do more than print.
+bool isCapable() {
+    const char* terminal = getenv("TERM");
+    return terminal != nullptr && std::string(terminal) != "dumb";
+}
+
 bool wantsColor() {
     const char* noColor = getenv("NO_COLOR");
-    const char* terminal = getenv("TERM");
-    return (noColor == nullptr || *noColor == '\0') && terminal != nullptr && std::string(terminal) != "dumb";
+    return (noColor == nullptr || *noColor == '\0') && isCapable();
+}
+
+// A size of the terminal: as the environment says, as the terminal says, or as most are.
+size_t sizeOf(const char* variable, unsigned short winsize::*told, size_t usual) {
+    constexpr uint64_t kMost = 10000;
+    const char* const text = getenv(variable);
+    const uint64_t set = text == nullptr ? 0 : ToUint64(text);
+    if (set != 0) {
+        return static_cast<size_t>(std::min(set, kMost));
+    }
+    winsize size{};
+    return ioctl(STDOUT_FILENO, TIOCGWINSZ, &size) == 0 && size.*told != 0 ? size.*told : usual;
 }
 
 CLI::IsMember namesOf(const std::array<const char*, 4>& names) {
@@ -29,13 +49,8 @@ CLI::Option* refuseEmpty(CLI::Option* option) {
     });
 }
 
-// An option that may be given several times. The parser's own lists would take some texts apart.
 void addList(CLI::App& command, const std::string& name, store::Names& value, const std::string& help) {
-    const auto take = [&value](const std::vector<std::string>& given) {
-        value = given;
-        return true;
-    };
-    refuseEmpty(command.add_option(name, take, help)->type_name("NAMES")->take_all()->group("Filters"));
+    AddListOption(command, name, value, help)->group("Filters");
 }
 
 CLI::Option* addFilter(CLI::App& command, const std::string& name, std::string& value, const std::string& type,
@@ -52,6 +67,11 @@ Style OutputOptions::style() const {
     style.safeCsv = safeCsv;
     style.terminal = isatty(STDOUT_FILENO) == 1;
     style.color = style.terminal && wantsColor();
+    if (style.terminal) {
+        style.width = sizeOf("COLUMNS", &winsize::ws_col, 80);
+        style.height = sizeOf("LINES", &winsize::ws_row, 24);
+        style.pager = noPager || !isCapable() ? std::vector<std::string>() : FindPager();
+    }
     return style;
 }
 
@@ -110,6 +130,16 @@ void AddOutputOptions(CLI::App& command, OutputOptions& output) {
         ->check(namesOf(kFormatNames));
     command.add_flag("--safe-csv", output.safeCsv,
                      "csv: put ' before cells that a spreadsheet would take for a formula");
+    command.add_flag("--no-pager", output.noPager, "Do not show long output through a pager");
+}
+
+// The parser's own lists would take some texts apart.
+CLI::Option* AddListOption(CLI::App& command, const std::string& name, store::Names& value, const std::string& help) {
+    const auto take = [&value](const std::vector<std::string>& given) {
+        value = given;
+        return true;
+    };
+    return refuseEmpty(command.add_option(name, take, help)->type_name("NAMES")->take_all());
 }
 
 void AddYesOption(CLI::App& command, bool& yes) {

@@ -20,8 +20,9 @@ using store::Failure;
 struct OutputOptions {
     std::string format = "table";
     bool safeCsv = false;
+    bool noPager = false;
 
-    // Colour and visible text depend on what standard output is.
+    // Colour, visible text, width and pager depend on what standard output is.
     Style style() const;
 };
 
@@ -30,6 +31,8 @@ void AddTableOption(CLI::App& command, std::string& table);
 // `lenient`: as in store::FilterOptions; and regular expressions.
 void AddFilterOptions(CLI::App& command, store::FilterOptions& filters, bool lenient);
 void AddOutputOptions(CLI::App& command, OutputOptions& output);
+// An option that may be given several times.
+CLI::Option* AddListOption(CLI::App& command, const std::string& name, store::Names& value, const std::string& help);
 void AddYesOption(CLI::App& command, bool& yes);
 
 // Accepts decimal digits that fit 64 bits.

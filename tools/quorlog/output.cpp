@@ -4,11 +4,14 @@
 
 #include <algorithm>
 #include <cerrno>
+#include <cstdint>
 #include <cstring>
+#include <utility>
 
 #include "base/files.h"
 #include "store/failure.h"
 #include "tools/quorlog/display.h"
+#include "tools/quorlog/wrap.h"
 
 namespace quor::cli {
 namespace {
@@ -22,7 +25,7 @@ void appendObject(std::string& out, const Columns& columns, const Cells& cells) 
         out += '"';
         out += columns[i].name;
         out += "\":";
-        if (columns[i].kind == Kind::Number) {
+        if (columns[i].kind == Kind::Number || columns[i].kind == Kind::Truth) {
             out += cells[i].empty() ? "null" : cells[i];
         } else {
             AppendVisibleJson(out, cells[i]);
@@ -95,26 +98,54 @@ class CsvSink : public RowSink {
     std::string visible_;
 };
 
-void writeBelowEachOther(const std::vector<Value>& values, Output& out) {
+void writeBelowEachOther(const std::vector<Value>& values, size_t screen, Output& out) {
     size_t width = 0;
     for (const Value& value : values) {
-        width = std::max(width, strlen(value.name));
+        width = std::max(width, strlen(value.name) + 2);
     }
     for (const Value& value : values) {
+        const std::string text = Visible(value.text);
         std::string& line = out.buffer().append(value.name);
-        line.append(value.text.empty() ? 0 : width - strlen(value.name) + 2, ' ');
-        AppendVisible(line, value.text);
+        line.append(text.empty() ? 0 : width - strlen(value.name), ' ');
+        AppendWrapped(line, text, screen > 2 * width ? screen - width : SIZE_MAX, width);
         line += '\n';
     }
     out.flush();
 }
 
+// Whether the text takes more lines than there are above the prompt.
+bool isLonger(const std::string& text, const Style& screen) {
+    const auto lines = static_cast<size_t>(std::count(text.begin(), text.end(), '\n'));
+    return std::max(lines, text.size() / std::max<size_t>(screen.width, 1)) >= screen.height;
+}
+
 }  // namespace
 
+std::string Bar(const Style& style, uint64_t part, uint64_t most) {
+    constexpr size_t kLongest = 40;
+    const auto longest = static_cast<double>(std::clamp<size_t>(style.width / 3, 1, kLongest));
+    const double share = most == 0 ? 0 : static_cast<double>(part) / static_cast<double>(most);
+    return std::string(std::max<size_t>(part != 0 ? 1 : 0, static_cast<size_t>(longest * share)), '#');
+}
+
+// Between a terminal and a pager, as soon as there is something to show.
+void Output::choose() {
+    if (!screen_.pager.empty() && !buffer_.empty()) {
+        const std::vector<std::string> command = std::exchange(screen_.pager, {});
+        if (isLonger(buffer_, screen_)) {
+            fd_ = pager_.emplace(command).input();
+        }
+    }
+}
+
 void Output::flush() {
+    choose();
     const bool written = WriteAll(fd_, buffer_);
     const std::string cause = strerror(errno);
     buffer_.clear();
+    if (!written && pager_) {
+        throw ReaderLeft();
+    }
     if (!written) {
         throw store::Failure("cannot write the output: " + cause +
                                  "; make sure that its reader is running and its disk has room",
@@ -123,6 +154,7 @@ void Output::flush() {
 }
 
 std::unique_ptr<RowSink> MakeSink(const Style& style, Columns columns, Output& out) {
+    out.page(style);
     switch (style.format) {
     case Format::Json:
         return std::make_unique<JsonSink>(std::move(columns), out);
@@ -131,7 +163,7 @@ std::unique_ptr<RowSink> MakeSink(const Style& style, Columns columns, Output& o
     case Format::Csv:
         return std::make_unique<CsvSink>(style, std::move(columns), out);
     default:
-        return MakeTable(style.color, std::move(columns), out);
+        return MakeTable(style, std::move(columns), out);
     }
 }
 
@@ -143,7 +175,7 @@ void WriteRecord(const Style& style, const std::vector<Value>& values, Output& o
         cells.emplace_back(value.text);
     }
     if (style.format == Format::Table) {
-        writeBelowEachOther(values, out);
+        writeBelowEachOther(values, style.width, out);
         return;
     }
     const auto sink = MakeSink(style, std::move(columns), out);

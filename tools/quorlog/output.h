@@ -3,14 +3,36 @@
 #define QUORLOG_OUTPUT_H
 
 #include <array>
+#include <cstdint>
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
 
 #include "store/columns.h"
+#include "tools/quorlog/pager.h"
 
 namespace quor::cli {
+
+enum class Format { Table, Json, Csv, Ndjson };
+constexpr std::array<const char*, 4> kFormatNames = {"table", "json", "csv", "ndjson"};  // by Format
+
+struct Style {
+    Format format = Format::Table;
+    bool safeCsv = false;   // defuse what a spreadsheet takes for a formula
+    bool terminal = false;  // a terminal reads: nothing raw may reach it
+    bool color = false;
+    size_t width = 0;  // of the terminal; 0 for any
+    size_t height = 0;
+    std::vector<std::string> pager;  // the command that shows what is longer than the terminal, or none
+};
+
+// A bar as long, of the longest that suits the terminal, as `part` is of `most`.
+std::string Bar(const Style& style, uint64_t part, uint64_t most);
+
+// The person has left the pager: nobody waits for the rest.
+struct ReaderLeft {};
 
 // Buffered writing to a file descriptor. A failed write throws Failure.
 class Output {
@@ -18,6 +40,10 @@ class Output {
     explicit Output(int fd) : fd_(fd) {}
     Output(const Output&) = delete;
     Output& operator=(const Output&) = delete;
+
+    // Lets the style's pager show what is longer than its screen. Then a write throws ReaderLeft as soon as it is left,
+    // and the end of this object waits for that.
+    void page(const Style& style) { screen_ = style; }
 
     // What is appended here is written by the next drain() or flush().
     std::string& buffer() { return buffer_; }
@@ -32,18 +58,12 @@ class Output {
   private:
     static constexpr size_t kFull = size_t{64} * 1024;
 
+    void choose();
+
     std::string buffer_;
     int fd_;
-};
-
-enum class Format { Table, Json, Csv, Ndjson };
-constexpr std::array<const char*, 4> kFormatNames = {"table", "json", "csv", "ndjson"};  // by Format
-
-struct Style {
-    Format format = Format::Table;
-    bool safeCsv = false;   // defuse what a spreadsheet takes for a formula
-    bool terminal = false;  // a terminal reads: nothing raw may reach it
-    bool color = false;
+    Style screen_;  // without a pager once it is decided
+    std::optional<Pager> pager_;
 };
 
 using store::Kind;
@@ -64,6 +84,8 @@ class RowSink {
     virtual ~RowSink() = default;
 
     virtual void row(const Cells& cells) = 0;
+    // Says that rows were left out here.
+    virtual void gap() {}
     // Lets the reader see the rows so far.
     virtual void flush() { out_.flush(); }
     // Ends the output; no row follows.
@@ -78,7 +100,7 @@ class RowSink {
 
 std::unique_ptr<RowSink> MakeSink(const Style& style, Columns columns, Output& out);
 // The aligned table, as MakeSink() makes it. A table of one column has no heading.
-std::unique_ptr<RowSink> MakeTable(bool color, Columns columns, Output& out);
+std::unique_ptr<RowSink> MakeTable(const Style& style, Columns columns, Output& out);
 
 // One thing with named values: a table shows them below each other, the other forms as one row.
 struct Value {

@@ -11,12 +11,21 @@
 
 namespace quor::cli {
 
-// Writes log records; the names of the columns are those of the database.
+// What of the records is shown.
+struct Shape {
+    std::string table;
+    std::string columns;   // names, separated by commas; empty: the usual ones
+    bool context = false;  // tell hits from the rows around them
+};
+
+// Writes log records. A table has the titles of the columns, the other forms have their names in the database; columns
+// that were chosen are called as they were chosen.
 class RecordSink {
   public:
-    RecordSink(const Style& style, const std::string& table, Output& out);
+    RecordSink(const Style& style, const Shape& shape, Output& out);
 
-    void add(const store::Record& record);
+    void add(const store::Record& record, bool hit = true);
+    void gap() { sink_->gap(); }
     void flush() { sink_->flush(); }
     void finish() { sink_->finish(); }
 
@@ -24,6 +33,8 @@ class RecordSink {
     std::vector<store::Column> fields_;
     std::vector<std::string> scratch_;
     Cells cells_;
+    bool context_;
+    bool marked_;  // a table has its mark in front, the other forms have a field behind the others
     std::unique_ptr<RowSink> sink_;
 };
 

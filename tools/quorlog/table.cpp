@@ -5,15 +5,14 @@
 
 #include "dbutil.h"
 #include "tools/quorlog/display.h"
+#include "tools/quorlog/layout.h"
 #include "tools/quorlog/output.h"
 
 namespace quor::cli {
 namespace {
 
-constexpr size_t kSample = 200;   // rows that decide the widths
-constexpr size_t kMaxWidth = 40;  // a longer cell stands out instead of widening every row
-constexpr char kGap[] = "  ";
-constexpr char kReset[] = "\033[0m";
+constexpr size_t kSample = 200;  // rows that decide the widths
+constexpr char kGap[] = "--\n";
 
 constexpr std::array<const char*, 8> kLevelColors = {
     "\033[1;31m", "\033[1;31m", "\033[1;31m",  // emerg, alert, crit
@@ -27,17 +26,10 @@ const char* colorOf(std::string_view level) {
     return index < kLevelColors.size() ? kLevelColors[index] : "";
 }
 
-struct Cell {
-    std::string text;
-    size_t width = 0;
-    const char* color = "";
-};
-using Line = std::vector<Cell>;
-
 class TableSink : public RowSink {
   public:
-    TableSink(bool color, Columns columns, Output& out)
-        : RowSink(std::move(columns), out), color_(color), widths_(columns_.size(), 0) {
+    TableSink(const Style& style, Columns columns, Output& out)
+        : RowSink(std::move(columns), out), color_(style.color), layout_(columns_, style.width) {
         if (columns_.size() < 2) {
             return;
         }
@@ -59,11 +51,10 @@ class TableSink : public RowSink {
                 line[i].color = colorOf(cells[i]);
             }
         }
-        waiting_.push_back(std::move(line));
-        if (waiting_.size() > pending_) {
-            print();
-        }
+        add(std::move(line));
     }
+
+    void gap() override { add({}); }
 
     void flush() override {
         if (anyRow()) {
@@ -78,14 +69,23 @@ class TableSink : public RowSink {
     // A heading alone is not worth a line.
     bool anyRow() const { return printed_ ? !waiting_.empty() : waiting_.size() > (columns_.size() < 2 ? 0 : 1); }
 
+    void add(Line line) {
+        waiting_.push_back(std::move(line));
+        if (waiting_.size() > pending_) {
+            print();
+        }
+    }
+
     void print() {
         for (const Line& line : waiting_) {
-            for (size_t i = 0; i < line.size(); ++i) {
-                widths_[i] = std::max(widths_[i], std::min(line[i].width, kMaxWidth));
-            }
+            layout_.widen(line);
         }
         for (const Line& line : waiting_) {
-            append(line);
+            if (line.empty()) {
+                out_.buffer() += kGap;
+            } else {
+                layout_.append(out_.buffer(), line);
+            }
             out_.drain();
         }
         waiting_.clear();
@@ -93,34 +93,17 @@ class TableSink : public RowSink {
         pending_ = 0;
     }
 
-    void append(const Line& line) {
-        std::string& out = out_.buffer();
-        for (size_t i = 0; i < line.size(); ++i) {
-            const Cell& cell = line[i];
-            const size_t padding = widths_[i] - std::min(cell.width, widths_[i]);
-            const bool right = columns_[i].kind == Kind::Number;
-            out += i == 0 ? "" : kGap;
-            out.append(right ? padding : 0, ' ');
-            out += cell.color;
-            out += cell.text;
-            out += *cell.color != '\0' ? kReset : "";
-            out.append(right ? 0 : padding, ' ');
-        }
-        out.resize(out.find_last_not_of(' ') + 1);
-        out += '\n';
-    }
-
     bool color_;
     bool printed_ = false;
     size_t pending_ = kSample;  // lines that may wait
-    std::vector<size_t> widths_;
-    std::vector<Line> waiting_;
+    Layout layout_;
+    std::vector<Line> waiting_;  // an empty one is a gap
 };
 
 }  // namespace
 
-std::unique_ptr<RowSink> MakeTable(bool color, Columns columns, Output& out) {
-    return std::make_unique<TableSink>(color, std::move(columns), out);
+std::unique_ptr<RowSink> MakeTable(const Style& style, Columns columns, Output& out) {
+    return std::make_unique<TableSink>(style, std::move(columns), out);
 }
 
 }  // namespace quor::cli

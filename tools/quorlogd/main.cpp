@@ -19,7 +19,7 @@ void setUp(CLI::App& app, quor::Options& options) {
     app.add_option("--flush-interval", options.flushSeconds, "Seconds between two writes of the accounting database")
         ->check(CLI::Range(1, 3600))
         ->capture_default_str();
-    app.add_option("--check-interval", options.checkSeconds, "Seconds between two checks of the space that logs take")
+    app.add_option("--check-interval", options.checkSeconds, "Seconds between two checks of space, losses and notices")
         ->check(CLI::Range(1, 86400))
         ->capture_default_str();
     app.add_option("--volume", options.volume, "Folder on the volume that holds the logs")->capture_default_str();

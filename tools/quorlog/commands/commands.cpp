@@ -4,6 +4,9 @@
 #include <algorithm>
 #include <iterator>
 
+#include "base/paths.h"
+#include "tools/quorlog/usage.h"
+
 namespace quor::cli {
 namespace {
 
@@ -19,24 +22,14 @@ constexpr Command kCommands[] = {
     {"backup", AddBackup}, {"doctor", AddDoctor}, {"parse", AddParse},
 };
 
-// Help on every command: the parser's own stops at groups such as stats.
-class WholeHelp : public CLI::Formatter {
-  public:
-    std::string make_expanded(const CLI::App* command) const override {
-        std::string help = CLI::Formatter::make_expanded(command);
-        for (const CLI::App* sub : command->get_subcommands([](const CLI::App*) { return true; })) {
-            help += "\n" + command->get_name() + " " + make_expanded(sub);
-        }
-        return help;
-    }
-};
-
 }  // namespace
 
 void AddCommands(CLI::App& app, int& status, std::string_view only) {
     app.description("Searches, counts and manages the logs that syslog-ng writes to databases.");
-    app.footer("Exit status: 0 found or done, 1 nothing found, 2 wrong usage or failure.");
-    app.formatter(std::make_shared<WholeHelp>());
+    app.footer(std::string("The logs are in ") + paths::kWorkingDb + " unless --db says otherwise.\n" +
+               "Exit status: 0 found or done, 1 nothing found, 2 wrong usage or failure.\n"
+               "Options of a command: quorlog COMMAND --help. All about them: man quorlog");
+    app.formatter(MakeHelp());
     app.require_subcommand(1);
     app.set_help_all_flag("--help-all", "Print the options of every command");
     const auto* chosen =

@@ -40,14 +40,6 @@ void setup(CLI::App& command, CountOptions& options) {
         ->excludes(by);
 }
 
-// Of a length that is to `full` as `rows` to `most`.
-std::string barOf(uint64_t rows, uint64_t most) {
-    constexpr double kFull = 30;
-    const double part = static_cast<double>(rows) / static_cast<double>(most);
-    std::string bar;
-    return bar.append(static_cast<size_t>(std::max(1.0, kFull * part)), '#');
-}
-
 int runBy(const CountOptions& options, const store::Source& source, const store::Selection& selection) {
     std::vector<store::Group> groups = CountBy(source, selection, options.by);
     if (options.limit != 0 && groups.size() > options.limit) {
@@ -67,7 +59,7 @@ int runBy(const CountOptions& options, const store::Source& source, const store:
     const auto sink = MakeSink(style, std::move(columns), out);
     for (const store::Group& group : groups) {
         const std::string count = std::to_string(group.rows);
-        const std::string bar = bars ? barOf(group.rows, most) : "";
+        const std::string bar = bars ? Bar(style, group.rows, most) : "";
         sink->row(bars ? Cells{count, bar, group.name} : Cells{count, group.name});
     }
     sink->finish();

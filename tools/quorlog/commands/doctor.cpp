@@ -233,6 +233,7 @@ void writeMetrics(const std::vector<Finding>& findings) {
 void writeTable(const std::string& format, const std::vector<Finding>& findings) {
     OutputOptions output;
     output.format = format;
+    output.noPager = true;
     Output out(STDOUT_FILENO);
     const auto sink = MakeSink(output.style(), {{"check"}, {"state"}, {"found"}, {"advice"}}, out);
     for (const Finding& finding : findings) {

@@ -32,7 +32,7 @@ struct Tally {
 int run(const OutputOptions& options) {
     std::ios::sync_with_stdio(false);
     Output out(STDOUT_FILENO);
-    RecordSink sink(options.style(), "logs", out);
+    RecordSink sink(options.style(), {"logs", ""}, out);
     LogParser parser;
     Tally tally;
     for (std::string entry; std::getline(std::cin, entry);) {

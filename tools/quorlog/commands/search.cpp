@@ -9,6 +9,7 @@
 
 #include "base/guards.h"
 #include "base/paths.h"
+#include "store/context.h"
 #include "store/follower.h"
 #include "store/selection.h"
 #include "store/whynothing.h"
@@ -23,6 +24,8 @@ namespace {
 constexpr uint64_t kTableRows = 50;   // what a person gets without a limit
 constexpr uint64_t kFollowRows = 10;  // the rows before the new ones
 
+constexpr uint64_t kUnset = UINT64_MAX;
+
 struct SearchOptions {
     std::string db = paths::kWorkingDb;
     std::string table = "logs";
@@ -35,14 +38,26 @@ struct SearchOptions {
     bool oldest = false;
     bool follow = false;
     uint64_t interval = 1;
+    store::Names columns;
+    uint64_t around = 0;
+    uint64_t earlier = kUnset;
+    uint64_t later = kUnset;
 };
+
+// As grep has them: one side by itself goes before both sides together.
+void addContextOptions(CLI::App& command, SearchOptions& options, CLI::Option* following) {
+    AddNumberOption(command, "-C,--context", options.around, "Rows around each hit, such as 3, with the hits marked")
+        ->excludes(following);
+    AddNumberOption(command, "-B,--before-context", options.earlier, "Rows from before each hit")->excludes(following);
+    AddNumberOption(command, "-A,--after-context", options.later, "Rows from after each hit")->excludes(following);
+}
 
 void setup(CLI::App& command, SearchOptions& options) {
     AddDatabaseOption(command, options.db);
     AddTableOption(command, options.table);
     AddFilterOptions(command, options.filters, true);
     AddOutputOptions(command, options.output);
-    AddNumberOption(command, "-n,--limit", options.limit, "Number of rows, 0 for all; a terminal shows 50 by default")
+    AddNumberOption(command, "-n,--limit", options.limit, "Number of rows, 0 for all; 50 on a terminal without a pager")
         ->each([&options](const std::string&) { options.limited = true; });
     CLI::Option* offset = AddNumberOption(command, "--offset", options.offset, "Number of rows to skip");
     CLI::Option* before =
@@ -51,8 +66,27 @@ void setup(CLI::App& command, SearchOptions& options) {
     CLI::Option* oldest = command.add_flag("--oldest", options.oldest, "Oldest rows first, instead of newest");
     CLI::Option* following = command.add_flag("-f,--follow", options.follow, "Print new rows as they arrive, until ^C");
     following->excludes(offset)->excludes(oldest)->excludes(before);
-    AddNumberOption(command, "--interval", options.interval, "Seconds between two checks for new rows")
+    AddNumberOption(command, "--interval", options.interval, "With --follow: seconds between two looks")
         ->needs(following);
+    AddListOption(command, "--columns", options.columns, "Columns to show, in this order, such as time,host,message");
+    addContextOptions(command, options, following);
+}
+
+Shape shapeOf(const SearchOptions& options, const store::Context& context) {
+    Shape shape{options.table, "", context.before + context.after != 0};
+    for (const std::string& list : options.columns) {
+        shape.columns += "," + list;
+    }
+    return shape;
+}
+
+store::Context contextOf(const SearchOptions& options) {
+    const store::Context context{options.earlier == kUnset ? options.around : options.earlier,
+                                 options.later == kUnset ? options.around : options.later};
+    if (std::max(context.before, context.after) > store::kMostContext) {
+        throw Failure("--context: more than " + std::to_string(store::kMostContext) + " rows around a hit; give less");
+    }
+    return context;
 }
 
 store::Selection selectionOf(const SearchOptions& options) {
@@ -99,8 +133,10 @@ class Ticker {
 };
 
 int follow(const SearchOptions& options, const store::Source& source, const store::Selection& selection) {
+    Style style = options.output.style();
+    style.pager.clear();  // it would wait for the end
     Output out(STDOUT_FILENO);
-    RecordSink sink(options.output.style(), selection.table, out);
+    RecordSink sink(style, shapeOf(options, {}), out);
     const auto print = [&](const auto& record) { sink.add(record); };
     const Ticker ticker(options.interval);
     store::Follower follower(source, selection);
@@ -126,29 +162,48 @@ void tellMore(const store::Source& source, store::Selection rest, uint64_t last)
     }
 }
 
+// What was found: how many rows, and the id of the last one.
+struct Found {
+    uint64_t rows = 0;
+    uint64_t last = 0;
+};
+
+Found print(const store::Source& source, const store::Selection& selection, const store::Context& context,
+            RecordSink& sink) {
+    Found found;
+    const auto add = [&](const store::Record& record, bool hit, bool apart) {
+        if (apart) {
+            sink.gap();
+        }
+        sink.add(record, hit);
+        found.last = hit ? record.id : found.last;
+    };
+    const auto addAlone = [&](const store::Record& record) { add(record, true, false); };
+    const bool alone = context.before == 0 && context.after == 0;
+    found.rows = alone ? Select(source, selection, addAlone) : SelectWithContext(source, selection, context, add);
+    sink.finish();
+    return found;
+}
+
 int run(const SearchOptions& options) {
     store::Selection selection = selectionOf(options);
+    const store::Context context = contextOf(options);
     const auto source = store::OpenSource(options.db);
     if (options.follow) {
         return follow(options, *source, selection);
     }
     const Style style = options.output.style();
-    const bool page = !options.limited && style.format == Format::Table && style.terminal;
+    const bool page = !options.limited && style.format == Format::Table && style.terminal && style.pager.empty();
     if (page) {
         selection.limit = kTableRows;
     }
     Output out(STDOUT_FILENO);
-    RecordSink sink(style, selection.table, out);
-    uint64_t last = 0;
-    const uint64_t rows = Select(*source, selection, [&](const auto& record) {
-        sink.add(record);
-        last = record.id;
-    });
-    sink.finish();
-    if (page && rows == kTableRows) {
-        tellMore(*source, selection, last);
+    RecordSink sink(style, shapeOf(options, context), out);
+    const Found found = print(*source, selection, context, sink);
+    if (page && found.rows == kTableRows) {
+        tellMore(*source, selection, found.last);
     }
-    return rows == 0 ? ReportNothing(WhyNothing(*source, selection, options.filters, options.before)) : kDone;
+    return found.rows == 0 ? ReportNothing(WhyNothing(*source, selection, options.filters, options.before)) : kDone;
 }
 
 }  // namespace

@@ -14,7 +14,6 @@
 namespace quor::cli {
 namespace {
 
-constexpr size_t kBarWidth = 40;
 constexpr int64_t kMostLines = 40;  // that a person gets without saying how long each is
 
 struct StatsOptions {
@@ -227,7 +226,7 @@ void writeStretches(const std::vector<store::Stretch>& stretches, const Style& s
     for (const store::Stretch& stretch : stretches) {
         std::vector<std::string> texts = textsOf(stretch, table);
         if (drawn) {
-            texts.emplace_back(static_cast<size_t>(stretch.logs * kBarWidth / largest), '#');
+            texts.push_back(Bar(style, stretch.logs, largest));
         }
         sink->row(Cells(texts.begin(), texts.end()));
     }
