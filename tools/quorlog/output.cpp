@@ -125,7 +125,8 @@ std::string Bar(const Style& style, uint64_t part, uint64_t most) {
     constexpr size_t kLongest = 40;
     const auto longest = static_cast<double>(std::clamp<size_t>(style.width / 3, 1, kLongest));
     const double share = most == 0 ? 0 : static_cast<double>(part) / static_cast<double>(most);
-    return std::string(std::max<size_t>(part != 0 ? 1 : 0, static_cast<size_t>(longest * share)), '#');
+    std::string bar;
+    return bar.append(std::max<size_t>(part != 0 ? 1 : 0, static_cast<size_t>(longest * share)), '#');
 }
 
 // Between a terminal and a pager, as soon as there is something to show.
