@@ -18,6 +18,8 @@ constexpr const char kLogSchema[] = QUOR_ROOT "/usr/quor/syslog/schema/syslog.sq
 
 // Notification.
 constexpr const char kNotifyRules[] = QUOR_ROOT "/etc/quorsyslog/notify.conf";
+constexpr const char kRules[] = QUOR_ROOT "/etc/quorsyslog/rules.conf";
+constexpr const char kRulesState[] = QUOR_ROOT "/var/log/quorlog/.quorrules";  // what is known of the devices
 constexpr const char kNotifyFilter[] = QUOR_ROOT "/etc/quorsyslog/notify.filter";
 constexpr const char kNotifyTexts[] = QUOR_ROOT "/usr/quor/quorman/webman/modules/Orvane/texts/";
 constexpr const char kNotifySpool[] = QUOR_ROOT "/var/spool/quornotify";

@@ -7,7 +7,7 @@
 
 #include "base/guarded.h"
 #include "base/paths.h"
-#include "platform/core/textfile.h"
+#include "base/textfile.h"
 #include "quor/quorcore.h"
 #include "quor/quorservice.h"
 

@@ -4,9 +4,9 @@
 #include <unordered_set>
 
 #include "base/guarded.h"
+#include "base/textfile.h"
 #include "platform/core/sections.h"
 #include "platform/core/sectionwrite.h"
-#include "platform/core/textfile.h"
 #include "quor/quorcore.h"
 
 namespace {

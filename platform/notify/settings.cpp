@@ -8,9 +8,9 @@
 #include "base/guarded.h"
 #include "base/numbers.h"
 #include "base/paths.h"
+#include "base/textfile.h"
 #include "base/words.h"
 #include "platform/core/sections.h"
-#include "platform/core/textfile.h"
 
 namespace quor::notify {
 namespace {

@@ -1,6 +1,6 @@
 // Small text files, read whole and replaced whole.
-#ifndef PLATFORM_CORE_TEXTFILE_H
-#define PLATFORM_CORE_TEXTFILE_H
+#ifndef BASE_TEXTFILE_H
+#define BASE_TEXTFILE_H
 
 #include <cstddef>
 #include <string>

@@ -1,4 +1,4 @@
-#include "platform/core/textfile.h"
+#include "base/textfile.h"
 
 #include <fcntl.h>
 #include <sys/stat.h>
