@@ -36,7 +36,7 @@ if(QUOR_BUILD_TOOLS)
             COMPONENT tools)
     install(FILES ${etc}/systemd/syslog-ng-quorsyslog.conf DESTINATION lib/systemd/system/syslog-ng.service.d
             RENAME quorsyslog.conf COMPONENT tools)
-    install(FILES docs/man/notify.conf.5 docs/man/notify.filter.5 docs/man/quorinfo.conf.5
+    install(FILES docs/man/notify.conf.5 docs/man/notify.filter.5 docs/man/quorinfo.conf.5 docs/man/rules.conf.5
             DESTINATION ${CMAKE_INSTALL_MANDIR}/man5 COMPONENT tools)
 endif()
 install(FILES docs/man/quorsyslog.3 DESTINATION ${CMAKE_INSTALL_MANDIR}/man3 COMPONENT development)

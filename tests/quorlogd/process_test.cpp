@@ -78,6 +78,7 @@ class QuorlogdProcess : public testing::Test {
         }
         WriteFile(paths::kNotifyRules, "");
         std::filesystem::remove(paths::kNotifyFilter);
+        std::filesystem::remove(paths::kRules);
         createLogs();
     }
 };
@@ -242,6 +243,84 @@ TEST_F(QuorlogdProcess, OneDeviceCannotSilenceTheOthers) {
         EXPECT_TRUE(Eventually([&] { return ReadFile(spool).find(text) != std::string::npos; })) << text;
     }
     std::filesystem::remove(paths::kSystemSettings);
+}
+
+std::string rulesFile(const std::string& sections) {
+    return "version=\"1\"\n" + sections;
+}
+
+// A log of a host, received in that second.
+void receive(const std::string& host, int second, const std::string& message = "Failed password") {
+    SqliteFile(paths::kWorkingDb)
+        .run("INSERT INTO logs(host, ip, prog, msg, rsec, ldate, ltime) VALUES('" + host + "', '10.0.0.1', 'sshd', '" +
+             message + "', " + std::to_string(1795238154 + second) + ", '2026-11-21', '05:15:54')");
+}
+
+int eventsWith(const std::string& text) {
+    const Strings all = events();
+    return static_cast<int>(std::count_if(
+        all.begin(), all.end(), [&](const std::string& event) { return event.find(text) != std::string::npos; }));
+}
+
+// Rows that waited count for their own seconds; a damaged file changes nothing.
+TEST_F(QuorlogdProcess, ChecksTheRulesOfItsOwnFile) {
+    WriteFile(paths::kRules, rulesFile("[three]\nkind=match\nprogram=sshd\nnot-host=test\nkeyword=Failed\ncount=3\n"
+                                       "within=5m\n[new]\nkind=newdevice\n"));
+    for (const char* host : {"web", "test"}) {
+        for (const int second : {0, 150, 301, 449}) {
+            receive(host, second);
+        }
+    }
+    Quorlogd daemon;
+    EXPECT_TRUE(Eventually([] { return eventsWith("Rule new: were heard for the first time: web, test") == 1; }))
+        << testing::PrintToString(events());
+    EXPECT_EQ(eventsWith("Rule three, 3 logs within 5m. Log content: [web: 2026-11-21 05:15:54 sshd: Failed password]"),
+              1);
+    EXPECT_EQ(eventsWith("no channel for notices is set up"), 1);
+    WriteFile(paths::kRules, "rubbish");
+    daemon.signal(SIGHUP);
+    EXPECT_TRUE(
+        daemon.says("rules.conf, line 1: neither a comment nor key=\"value\"; the rules of before stay in force"));
+    for (const int second : {1000, 1001, 1002}) {
+        receive("other", second);
+    }
+    EXPECT_TRUE(Eventually([] { return eventsWith("Log content: [other: ") == 1; }))
+        << testing::PrintToString(events());
+    EXPECT_EQ(eventsWith("Rule three"), 2) << testing::PrintToString(events());
+    std::filesystem::remove(paths::kRules);
+}
+
+TEST_F(QuorlogdProcess, TellsWhoWentSilentOnceAcrossKills) {
+    WriteFile(paths::kRules, rulesFile("[s]\nkind=silent\nafter=30m\ninterval=0s\nhost=\"a,b,never\"\n"));
+    const auto talk = [](const std::string& host, int from, int to) {
+        for (int second = from; second < to; second += 40) {
+            receive(host, second);
+        }
+    };
+    {
+        Quorlogd daemon;
+        receive("a", 0);
+        talk("b", 0, 2000);
+        EXPECT_TRUE(Eventually([] { return eventsWith("Rule s: nothing is heard any more of a (last heard ") == 1; }))
+            << testing::PrintToString(events());
+        EXPECT_EQ(eventsWith("a (last heard 2026-11-21T") + eventsWith(", never (never heard)"), 2);
+        EXPECT_EQ(daemon.endOf(SIGKILL), -1);
+    }
+    talk("b", 2000, 4000);
+    {
+        Quorlogd daemon;
+        ASSERT_TRUE(daemon.started());
+        ASSERT_TRUE(daemon.says(" 101 the last row", SIGUSR1)) << daemon.messages();
+        receive("a", 4001);
+        EXPECT_TRUE(Eventually([] { return eventsWith("Rule s: is heard again: a") == 1; }))
+            << testing::PrintToString(events());
+        EXPECT_EQ(daemon.endOf(SIGTERM), 0);
+    }
+    Quorlogd daemon;
+    ASSERT_TRUE(daemon.started());
+    usleep(6000000);
+    EXPECT_EQ(eventsWith("Rule s"), 2) << testing::PrintToString(events());
+    std::filesystem::remove(paths::kRules);
 }
 
 // A socket that nobody reads, after `count` datagrams; what it could not take is lost.

@@ -46,4 +46,11 @@ std::string FitForNotice(const std::string& message) {
     return message.substr(0, characterStart(message, kept)) + kMarker;
 }
 
+std::string ContentOf(const store::Record& record, const std::string& keyword) {
+    const std::string program = record.prog + (record.pid.empty() ? "" : "[" + record.pid + "]");
+    const bool inMessage = record.msg.find(keyword) != std::string::npos;
+    const std::string around = inMessage ? "" : " " + record.msgid + " " + record.sdata;
+    return FitForNotice(record.ldate + " " + record.ltime + " " + program + ": " + record.msg + around);
+}
+
 }  // namespace quor

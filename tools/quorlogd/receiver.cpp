@@ -7,6 +7,7 @@
 #include <cstring>
 #include <ctime>
 #include <filesystem>
+#include <utility>
 
 #include "base/numbers.h"
 #include "base/paths.h"
@@ -14,6 +15,7 @@
 #include "dbhandler.h"
 #include "logger.h"
 #include "store/ask.h"
+#include "store/channels.h"
 #include "store/event.h"
 #include "store/failure.h"
 #include "tools/quorlogd/announce.h"
@@ -49,14 +51,6 @@ int64_t secondOf(const store::Record& record) {
     return record.rsec != 0 ? record.rsec : record.utcsec;
 }
 
-// What a person wants to see of a match; what surrounds the message only when the keyword stands there.
-std::string contentOf(const store::Record& record, const std::string& keyword = "") {
-    const std::string program = record.prog + (record.pid.empty() ? "" : "[" + record.pid + "]");
-    const bool inMessage = record.msg.find(keyword) != std::string::npos;
-    const std::string around = inMessage ? "" : " " + record.msgid + " " + record.sdata;
-    return FitForNotice(record.ldate + " " + record.ltime + " " + program + ": " + record.msg + around);
-}
-
 // The filter's least seconds between two notices of a kind.
 int32_t intervalOf(const char* kind) {
     StringTable section(QLIBCSzHashAlloc(16));
@@ -82,7 +76,7 @@ bool isCountedWithoutPosition() {
 Receiver::Receiver(const Options& options)
     : options_(options), source_(store::ExpectSource(options.db)),
       follower_(*source_, {}, [this](const std::string& identity) { return start(identity); }),
-      alarms_(options.noticesPerMinute, Clock::now()), devices_(options.maxDevices) {
+      alarms_(options.noticesPerMinute, Clock::now()), devices_(options.maxDevices), ruleWatch_(options, alarms_) {
     for (const QUORLOG_LOG_DEVICE_STATISTIC& row : accounting_.HistogramGet()) {
         devices_.know(row.device);
     }
@@ -192,22 +186,39 @@ std::string Receiver::keywordIn(const store::Record& record) {
 }
 
 void Receiver::judge(const store::Record& record, const std::string& device) {
-    const bool severe = rules_.CheckSev(record.prio);
-    const std::string keyword = keywordIn(record);
-    if ((!severe && keyword.empty()) || isOwnLog(record)) {
+    const int64_t second = record.rsec != 0 ? record.rsec : time(nullptr);  // never what a sender claims
+    ruleWatch_.hear(record, device, second);
+    if (isOwnLog(record)) {
         return;
     }
+    const bool severe = rules_.CheckSev(record.prio);
+    const std::string keyword = keywordIn(record);
+    bool announced = ruleWatch_.match(record, device, second);
     // The calls report their own failures.
     if (severe && alarms_.grant(kSeverity, device, Clock::now())) {
-        matched_ = true;
-        (void)rules_.NotificationSendSev(record.host, PriorTypeToStr(record.prio), contentOf(record));
-        (void)Logger().LogAddNotifySev(record.prio, store::EventText(record.host + ": " + contentOf(record)));
+        announced = true;
+        (void)rules_.NotificationSendSev(record.host, PriorTypeToStr(record.prio), ContentOf(record));
+        (void)Logger().LogAddNotifySev(record.prio, store::EventText(record.host + ": " + ContentOf(record)));
     }
     if (!keyword.empty() && alarms_.grant(kKeyword, device, Clock::now())) {
-        matched_ = true;
-        (void)rules_.NotificationSendKeyword(record.host, keyword, contentOf(record, keyword));
+        announced = true;
+        (void)rules_.NotificationSendKeyword(record.host, keyword, ContentOf(record, keyword));
         (void)Logger().LogAddNotifyKw(store::EventText(keyword),
-                                      store::EventText(record.host + ": " + contentOf(record, keyword)));
+                                      store::EventText(record.host + ": " + ContentOf(record, keyword)));
+    }
+    if (announced) {
+        matched_ = true;
+        tellChannels();
+    }
+}
+
+// Once after each reading of the rules: who set them should not wait for notices that cannot come.
+void Receiver::tellChannels() {
+    if (!std::exchange(channelsTold_, true) && !store::IsChannelSet()) {
+        const std::string text = std::string("A rule matched, but no channel for notices is set up in ") +
+                                 paths::kSystemSettings + ": matches become events only";
+        syslog(LOG_WARNING, "%s", text.c_str());
+        RecordEvent(text);
     }
 }
 
@@ -216,6 +227,7 @@ void Receiver::tick() {
     if (caughtUp_) {
         (void)accounting_.RowsUpdate(time(nullptr) - 1);  // cannot fail
     }
+    ruleWatch_.tick(caughtUp_ && trouble_.empty());
 }
 
 bool Receiver::flush() {
@@ -234,6 +246,7 @@ void Receiver::finish() {
     }
     (void)accounting_.RowsUpdate(INT64_MAX);  // cannot fail
     (void)flush();
+    ruleWatch_.finish();
 }
 
 void Receiver::reloadRules() {
@@ -242,6 +255,8 @@ void Receiver::reloadRules() {
     for (const char* kind : {kSeverity, kKeyword}) {
         alarms_.setInterval(kind, intervalOf(kind));
     }
+    ruleWatch_.reload(accounting_);
+    channelsTold_ = false;
 }
 
 void Receiver::announceHeldBack() {

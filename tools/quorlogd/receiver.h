@@ -12,6 +12,7 @@
 #include "tools/quorlogd/alarms.h"
 #include "tools/quorlogd/devices.h"
 #include "tools/quorlogd/options.h"
+#include "tools/quorlogd/rulewatch.h"
 
 namespace quor {
 
@@ -38,6 +39,7 @@ class Receiver {
     void take(const store::Record& record);
     std::string keywordIn(const store::Record& record);
     void judge(const store::Record& record, const std::string& device);
+    void tellChannels();
     void report(const std::string& trouble);
     void replaceDamaged();
 
@@ -53,10 +55,12 @@ class Receiver {
     NotificationManager rules_;
     Alarms alarms_;
     Devices devices_;
+    RuleWatch ruleWatch_;
     unsigned long long judged_ = 0;  // rows up to this one need not be judged any more
     bool matched_ = false;           // since the position was written
     bool caughtUp_ = false;
-    std::string trouble_;  // reported last
+    bool channelsTold_ = false;  // that there is none
+    std::string trouble_;        // reported last
     unsigned damagedLooks_ = 0;
     Counters counters_;
 };

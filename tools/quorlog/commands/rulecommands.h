@@ -1,0 +1,14 @@
+// The commands below "rules", by file.
+#ifndef QUORLOG_COMMANDS_RULECOMMANDS_H
+#define QUORLOG_COMMANDS_RULECOMMANDS_H
+
+#include <CLI/CLI.hpp>
+
+namespace quor::cli {
+
+void AddRuleChanges(CLI::App& rules, int& status);
+void AddRuleTests(CLI::App& rules, int& status);
+
+}  // namespace quor::cli
+
+#endif
