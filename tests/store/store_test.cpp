@@ -105,7 +105,7 @@ TEST_F(Store, HostileFiltersFindAndDeleteTheirRowsAlone) {
 }
 
 // Every row near a hit once, as grep would: "5* 6 -- 9 ".
-std::string around(const Ids& all, const std::vector<size_t>& hits, size_t lead, size_t trail) {
+std::string around(const Ids& all, const std::vector<size_t>& hits, uint64_t lead, uint64_t trail) {
     std::string text;
     size_t last = SIZE_MAX;
     for (size_t at = 0; at < all.size(); ++at) {
@@ -124,7 +124,7 @@ TEST_F(Store, RowsAroundHitsComeOnceAndInOrder) {
         "SELECT i, iif(i IN (1, 2, 10, 11, 13, 20, 33, 34, 40, 57, 70), 'hit', 'x') FROM n WHERE i % 7 OR i = 70");
     FilterOptions filter;
     filter.host = {"hit"};
-    for (int variant = 0; variant < 5 * 4 * 2 * 3 * 2; ++variant) {
+    for (size_t variant = 0; variant < size_t{5} * 4 * 2 * 3 * 2; ++variant) {
         const Context context{Ids{0, 1, 2, 6, 100}[variant % 5], Ids{0, 1, 3, 100}[variant / 5 % 4]};
         Selection selection{"logs", BuildFilter(filter, "logs", 0)};
         selection.oldestFirst = variant / 20 % 2 != 0;
