@@ -5,7 +5,7 @@ FUZZ_SEED := 0
 KILLS := 5
 LOCK_SECONDS := 5
 
-.PHONY: run test bench check format tidy asan fuzz soak try-faults try-full-disk powerpc package try-package linking docs release install clean
+.PHONY: run test bench check format tidy asan fuzz soak try-faults try-full-disk powerpc package package-powerpc try-package linking docs release install clean
 
 run:            ## start the real receiving chain on loopback and show what it received
 	scripts/install-deps.sh build run
@@ -44,9 +44,12 @@ powerpc:        ## cross-build for the appliance (32-bit big-endian) and run the
 	scripts/build.sh powerpc
 	ctest --preset powerpc
 
-package:        ## Debian packages and tarballs for this machine and for the appliance, in build/packages
-	scripts/install-deps.sh build powerpc package
+package:        ## Debian packages and a tarball for this machine, in build/packages
+	scripts/install-deps.sh build package
 	scripts/package.sh release
+
+package-powerpc: ## the same for the appliance (32-bit big-endian)
+	scripts/install-deps.sh build powerpc package
 	scripts/build-powerpc-deps.sh $(BUILD)/powerpc-deps
 	scripts/package.sh release-powerpc
 

@@ -26,18 +26,25 @@ install(DIRECTORY DESTINATION quor/etc COMPONENT tools)
 if(QUOR_BUILD_TOOLS)
     set(etc ${PROJECT_SOURCE_DIR}/etc)
     install(FILES ${etc}/notify.filter DESTINATION ${CMAKE_INSTALL_SYSCONFDIR}/quorsyslog COMPONENT tools)
+    install(FILES ${etc}/syslog-ng/tls-on.conf DESTINATION ${CMAKE_INSTALL_DATADIR}/quorsyslog COMPONENT tools)
     install(FILES ${etc}/syslog-ng/quorsyslog.conf DESTINATION ${CMAKE_INSTALL_DATADIR}/quorsyslog
             RENAME syslog-ng.conf COMPONENT tools)
-    install(PROGRAMS packaging/reserve-buffer DESTINATION lib/quorsyslog COMPONENT tools)
+    install(PROGRAMS packaging/reserve-buffer packaging/limit-connections DESTINATION lib/quorsyslog COMPONENT tools)
+    install(FILES packaging/values.sh DESTINATION lib/quorsyslog COMPONENT tools)
+    install(PROGRAMS packaging/quorlog-tls DESTINATION ${CMAKE_INSTALL_SBINDIR} COMPONENT tools)
     install(PROGRAMS ${etc}/init.d/quorlogd DESTINATION ${CMAKE_INSTALL_SYSCONFDIR}/init.d COMPONENT tools)
     install(FILES ${etc}/sysctl.d/quorsyslog.conf DESTINATION lib/sysctl.d COMPONENT tools)
-    install(FILES ${etc}/systemd/quorlogd.service DESTINATION lib/systemd/system COMPONENT tools)
+    install(FILES ${etc}/systemd/quorlogd.service ${etc}/systemd/quorsyslog-connections.service
+            DESTINATION lib/systemd/system COMPONENT tools)
     install(FILES ${etc}/quorinfo.conf.example DESTINATION ${CMAKE_INSTALL_DATADIR}/doc/quorsyslog/examples
             COMPONENT tools)
     install(FILES ${etc}/systemd/syslog-ng-quorsyslog.conf DESTINATION lib/systemd/system/syslog-ng.service.d
             RENAME quorsyslog.conf COMPONENT tools)
     install(FILES docs/man/notify.conf.5 docs/man/notify.filter.5 docs/man/quorinfo.conf.5 docs/man/rules.conf.5
             DESTINATION ${CMAKE_INSTALL_MANDIR}/man5 COMPONENT tools)
+    install(FILES docs/man/quorlog-tls.8 DESTINATION ${CMAKE_INSTALL_MANDIR}/man8 COMPONENT tools)
+    file(GLOB pages ${PROJECT_SOURCE_DIR}/docs/*.md)
+    install(FILES ${pages} DESTINATION ${CMAKE_INSTALL_DATADIR}/doc/quorsyslog COMPONENT tools)
 endif()
 install(FILES docs/man/quorsyslog.3 DESTINATION ${CMAKE_INSTALL_MANDIR}/man3 COMPONENT development)
 

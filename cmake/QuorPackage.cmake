@@ -38,8 +38,9 @@ set(CPACK_DEBIAN_DEVELOPMENT_PACKAGE_DEPENDS "${same_library}")
 set(CPACK_DEBIAN_TOOLS_PACKAGE_NAME quorsyslog)
 set(CPACK_DEBIAN_TOOLS_PACKAGE_SECTION admin)
 set(CPACK_DEBIAN_TOOLS_PACKAGE_DEPENDS "${same_library}, libre2-9, libutf8proc2, syslog-ng-core (>= 3.38), syslog-ng-mod-sql, libdbd-sqlite3, \
-init-system-helpers, sysvinit-utils, util-linux")
+init-system-helpers, sysvinit-utils, util-linux, openssl")
 set(CPACK_DEBIAN_TOOLS_PACKAGE_RECOMMENDS "ca-certificates")
+set(CPACK_DEBIAN_TOOLS_PACKAGE_SUGGESTS "nftables")
 set(scripts ${PROJECT_SOURCE_DIR}/packaging)
 set(CPACK_DEBIAN_TOOLS_PACKAGE_CONTROL_EXTRA ${scripts}/conffiles ${scripts}/postinst ${scripts}/prerm
     ${scripts}/postrm)

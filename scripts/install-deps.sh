@@ -11,7 +11,7 @@ packages_of() {
     test) echo libgtest-dev openssl ;;
     bench) echo libbenchmark-dev ;;
     powerpc) echo g++-powerpc-linux-gnu qemu-user dpkg-dev make tcl perl python3 unicode-data ;;
-    package) echo dpkg-dev file debootstrap ;;
+    package) echo dpkg-dev file debootstrap lintian ;;
     docs) echo doxygen mandoc ;;
     check) echo clang-14 clang-format-14 clang-tidy-14 libclang-rt-14-dev git ;;
     *) echo "install-deps.sh: unknown set '$1'; use build, run, test, bench, powerpc, package, docs or check" >&2; return 1 ;;

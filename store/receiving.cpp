@@ -9,9 +9,7 @@
 #include <array>
 #include <cerrno>
 #include <cstring>
-#include <filesystem>
 #include <fstream>
-#include <set>
 #include <string_view>
 #include <vector>
 
@@ -123,26 +121,6 @@ int FollowerProcess() {
     const Descriptor file(open(paths::kReceiverPid, O_RDONLY | O_CLOEXEC));
     const bool runs = file && flock(file.get(), LOCK_SH | LOCK_NB) != 0;
     return runs ? std::max(ToInt32(readFile(paths::kReceiverPid).c_str()), 0) : 0;  // others are groups to a signal
-}
-
-unsigned ReceivingPort() {
-    std::set<std::string> files;
-    std::error_code none;
-    for (const auto& entry : std::filesystem::directory_iterator(paths::kReceiverValues, none)) {
-        const std::string name = entry.path().filename();
-        if (name.rfind("receiving", 0) == 0 && entry.path().extension() == ".conf") {
-            files.insert(entry.path());
-        }
-    }
-    uint64_t port = 514;
-    for (const std::string& file : files) {
-        EachWord(readFile(file), "\n", [&](std::string_view line) {
-            const std::vector<std::string> words = wordsOf(line, " \t\"");
-            port = words.size() >= 3 && words[0] == "@define" && words[1] == "quor_port" ? ToUint64(words[2].c_str())
-                                                                                         : port;
-        });
-    }
-    return static_cast<unsigned>(port & 0xFFFFU);
 }
 
 }  // namespace quor::store

@@ -27,9 +27,6 @@ std::map<uint64_t, uint64_t> UdpDrops(unsigned port);
 // The number of the quorlogd that runs, 0 when none does: it holds a lock on the file with its number.
 int FollowerProcess();
 
-// The UDP port in the values of the receiving configuration, or its default.
-unsigned ReceivingPort();
-
 }  // namespace quor::store
 
 #endif

@@ -113,6 +113,7 @@ void Daemon::runTimers() {
     if (now >= nextCheck_) {
         housekeeping_.check();
         losses_.check();
+        crowding_.check();
         receiver_.announceHeldBack();
         RecordGivenUp();
         nextCheck_ = Clock::now() + seconds(options_.checkSeconds);

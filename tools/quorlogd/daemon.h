@@ -5,6 +5,7 @@
 #include <chrono>
 
 #include "base/guards.h"
+#include "tools/quorlogd/crowding.h"
 #include "tools/quorlogd/housekeeping.h"
 #include "tools/quorlogd/losses.h"
 #include "tools/quorlogd/options.h"
@@ -43,6 +44,7 @@ class Daemon {
     Receiver receiver_;
     Housekeeping housekeeping_;
     Losses losses_;
+    Crowding crowding_;
     Clock::time_point nextTick_;
     Clock::time_point nextFlush_;
     Clock::time_point nextCheck_;

@@ -11,6 +11,7 @@
 #include "base/numbers.h"
 #include "base/paths.h"
 #include "store/dates.h"
+#include "store/receivingvalues.h"
 #include "tools/quorlogd/announce.h"
 
 namespace quor {
@@ -53,7 +54,8 @@ void Losses::save() const {
 }
 
 void Losses::lookAtUdp(Totals& totals) const {
-    for (const auto& [socket, drops] : store::UdpDrops(options_.udpPort)) {
+    const unsigned port = options_.udpPort != 0 ? options_.udpPort : store::ReadReceivingValues().port;
+    for (const auto& [socket, drops] : store::UdpDrops(port)) {
         totals[kUdp + Decimal(socket)] = drops;
     }
 }

@@ -6,7 +6,6 @@
 #include <filesystem>
 
 #include "base/paths.h"
-#include "store/receiving.h"
 #include "tools/quorlogd/daemon.h"
 #include "tools/quorlogd/housekeeping.h"
 #include "tools/quorlogd/pidfile.h"
@@ -34,9 +33,9 @@ void setUp(CLI::App& app, quor::Options& options) {
     app.add_option("--control", options.control,
                    "Control socket of syslog-ng, which is asked for losses; empty: it is not")
         ->capture_default_str();
-    app.add_option("--udp-port", options.udpPort, "UDP port whose losses are watched")
-        ->check(CLI::Range(1, 65535))
-        ->capture_default_str();
+    app.add_option("--udp-port", options.udpPort,
+                   "UDP port whose losses are watched; left out: that of syslog-ng's configuration")
+        ->check(CLI::Range(1, 65535));
     app.add_option("--max-notices", options.noticesPerMinute, "Notices a minute; more matching logs are only counted")
         ->check(CLI::Range(0, 100000))
         ->capture_default_str();
@@ -53,7 +52,6 @@ void setUp(CLI::App& app, quor::Options& options) {
 int run(int argc, char** argv) {
     quor::Options options;
     options.volume = std::filesystem::path(options.db).parent_path();
-    options.udpPort = quor::store::ReceivingPort();
     CLI::App app(
         "Follows the log database that syslog-ng writes: accounts every row, checks the notification rules and records "
         "events. Signals: TERM or INT ends, HUP reads the rules anew, USR1 reports statistics, USR2 writes the "

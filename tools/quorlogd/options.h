@@ -14,7 +14,7 @@ struct Options {
     unsigned flushSeconds = 10;
     unsigned checkSeconds = 60;
     std::string control = paths::kReceiverControl;  // of syslog-ng; empty: not asked
-    unsigned udpPort = 0;
+    unsigned udpPort = 0;                           // 0: that of syslog-ng's configuration
     unsigned noticesPerMinute = 60;
     size_t maxDevices = 20000;
     unsigned long long maxWaiting = 200000;  // counts of devices in samples that could not be written

@@ -15,9 +15,11 @@
 #include "base/paths.h"
 #include "notification.h"
 #include "store/ask.h"
+#include "store/connections.h"
 #include "store/databasefile.h"
 #include "store/dates.h"
 #include "store/receiving.h"
+#include "store/receivingvalues.h"
 #include "store/selection.h"
 #include "tools/quorlog/commands/commands.h"
 #include "tools/quorlog/messages.h"
@@ -87,7 +89,7 @@ Finding lookAtReceiver(const std::string& control) {
 }
 
 Finding lookAtUdp() {
-    const unsigned port = store::ReceivingPort();
+    const unsigned port = store::ReadReceivingValues().port;
     const std::map<uint64_t, uint64_t> drops = store::UdpDrops(port);
     uint64_t dropped = 0;
     for (const auto& [socket, count] : drops) {
@@ -102,6 +104,32 @@ Finding lookAtUdp() {
             name + " is open; " + Decimal(dropped) + " datagrams dropped since then",
             dropped == 0 ? "" : "let devices that send much use TCP",
             {{"datagrams_dropped", dropped}}};
+}
+
+Finding lookAtTcp() {
+    const store::ReceivingValues values = store::ReadReceivingValues();
+    const std::map<uint16_t, store::PortUse> uses = store::UseOfPorts(values.tcpPorts());
+    Finding finding{"tcp", State::Good, "", "", {}};
+    uint64_t connections = 0;
+    for (const uint16_t port : values.tcpPorts()) {
+        const auto use = uses.find(port);
+        finding.detail += (finding.detail.empty() ? "port " : "; port ") + std::to_string(port);
+        if (use == uses.end()) {
+            finding.detail += " is not open";
+            finding.state = State::Bad;
+            finding.advice = "see the messages of syslog-ng in the system log";
+            continue;
+        }
+        connections += use->second.connections;
+        finding.detail += " has " + Decimal(use->second.connections) + " of " + Decimal(values.connections) + " connections";
+        if (store::IsCrowded(use->second, values.connections) && finding.state == State::Good) {
+            finding.detail += ", " + Decimal(use->second.busiestHolds) + " of them from " + use->second.busiest;
+            finding.state = State::Doubtful;
+            finding.advice = "see what that device does; systemctl enable --now quorsyslog-connections bounds each address";
+        }
+    }
+    finding.measures = {{"tcp_connections", connections}};
+    return finding;
 }
 
 // Nothing when it has never followed the database.
@@ -207,7 +235,7 @@ Finding guarded(const char* check, const std::function<Finding()>& look) {
 
 std::vector<Finding> examine(const DoctorOptions& options) {
     const std::string db = store::AbsolutePath(options.db);
-    std::vector<Finding> findings = {lookAtReceiver(options.control), lookAtUdp()};
+    std::vector<Finding> findings = {lookAtReceiver(options.control), lookAtUdp(), lookAtTcp()};
     findings.push_back(guarded("quorlogd", [&] { return lookAtFollower(db); }));
     findings.push_back(guarded("rows", [&] { return lookAtRows(*store::OpenSource(db)); }));
     findings.push_back(lookAtSpace(db));
