@@ -41,6 +41,21 @@ function(quor_install_library target header_folder headers)
     install(DIRECTORY ${headers} DESTINATION ${header_folder} COMPONENT development FILES_MATCHING PATTERN "*.h")
 endfunction()
 
+# The same bytes on every machine and at any time.
+function(quor_compress from to)
+    execute_process(COMMAND gzip -9n INPUT_FILE ${from} OUTPUT_FILE ${to} COMMAND_ERROR_IS_FATAL ANY)
+endfunction()
+
+# Manual pages of docs/man, each in the section that its name ends with.
+function(quor_install_manuals component)
+    foreach(page ${ARGN})
+        string(REGEX MATCH "[0-9]$" section ${page})
+        quor_compress(${PROJECT_SOURCE_DIR}/docs/man/${page} ${PROJECT_BINARY_DIR}/${page}.gz)
+        install(FILES ${PROJECT_BINARY_DIR}/${page}.gz DESTINATION ${CMAKE_INSTALL_MANDIR}/man${section}
+                COMPONENT ${component})
+    endforeach()
+endfunction()
+
 # What a test writes before the path of one of our programs, in a shell's words: the emulator of a cross build.
 list(JOIN CMAKE_CROSSCOMPILING_EMULATOR " " QUOR_EMULATOR)
 

@@ -40,13 +40,11 @@ if(QUOR_BUILD_TOOLS)
             COMPONENT tools)
     install(FILES ${etc}/systemd/syslog-ng-quorsyslog.conf DESTINATION lib/systemd/system/syslog-ng.service.d
             RENAME quorsyslog.conf COMPONENT tools)
-    install(FILES docs/man/notify.conf.5 docs/man/notify.filter.5 docs/man/quorinfo.conf.5 docs/man/rules.conf.5
-            DESTINATION ${CMAKE_INSTALL_MANDIR}/man5 COMPONENT tools)
-    install(FILES docs/man/quorlog-tls.8 DESTINATION ${CMAKE_INSTALL_MANDIR}/man8 COMPONENT tools)
+    quor_install_manuals(tools notify.conf.5 notify.filter.5 quorinfo.conf.5 rules.conf.5 quorlog-tls.8)
     file(GLOB pages ${PROJECT_SOURCE_DIR}/docs/*.md)
     install(FILES ${pages} DESTINATION ${CMAKE_INSTALL_DATADIR}/doc/quorsyslog COMPONENT tools)
 endif()
-install(FILES docs/man/quorsyslog.3 DESTINATION ${CMAKE_INSTALL_MANDIR}/man3 COMPONENT development)
+quor_install_manuals(development quorsyslog.3)
 
 # A build with QUOR_ROOT finds the same data below that folder.
 if(QUOR_ROOT)

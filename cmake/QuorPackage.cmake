@@ -23,6 +23,15 @@ set(CPACK_DEBIAN_FILE_NAME DEB-DEFAULT)
 set(CPACK_DEBIAN_PACKAGE_ARCHITECTURE ${architecture})
 set(CPACK_DEBIAN_PACKAGE_CONTROL_STRICT_PERMISSION ON)
 set(CPACK_DEBIAN_PACKAGE_GENERATE_SHLIBS ON)
+set(CPACK_COMPONENT_LIBRARY_DESCRIPTION "Library that searches, counts and accounts logs
+ which syslog-ng stores in SQLite databases, keeps statistics, and sends notices
+ of what a rule matches.")
+set(CPACK_COMPONENT_DEVELOPMENT_DESCRIPTION "Headers of the log library
+ and what a program needs to be built with it.")
+set(CPACK_COMPONENT_TOOLS_DESCRIPTION "Log server on syslog-ng and SQLite
+ syslog-ng receives messages of devices and stores them in a database.
+ quorlog searches and counts them on the command line; quorlogd accounts them
+ by device, checks rules, and sends notices.")
 set(CPACK_DEBIAN_LIBRARY_PACKAGE_NAME libquorsyslog${PROJECT_VERSION_MAJOR})
 set(CPACK_DEBIAN_LIBRARY_PACKAGE_SECTION libs)
 set(CPACK_DEBIAN_LIBRARY_PACKAGE_DEPENDS "libc6 (>= 2.36), libgcc-s1, libstdc++6 (>= 12), libsqlite3-0 (>= 3.40), \
@@ -45,11 +54,12 @@ set(scripts ${PROJECT_SOURCE_DIR}/packaging)
 set(CPACK_DEBIAN_TOOLS_PACKAGE_CONTROL_EXTRA ${scripts}/conffiles ${scripts}/postinst ${scripts}/prerm
     ${scripts}/postrm)
 
+quor_compress(${PROJECT_SOURCE_DIR}/packaging/changelog ${PROJECT_BINARY_DIR}/changelog.gz)
 foreach(pair library=libquorsyslog${PROJECT_VERSION_MAJOR} development=libquorsyslog-dev tools=quorsyslog)
     string(REPLACE "=" ";" pair ${pair})
     list(GET pair 0 component)
     list(GET pair 1 package)
-    install(FILES ${PROJECT_SOURCE_DIR}/LICENSE DESTINATION ${CMAKE_INSTALL_DATADIR}/doc/${package} RENAME copyright
-            COMPONENT ${component})
+    install(FILES packaging/copyright ${PROJECT_BINARY_DIR}/changelog.gz
+            DESTINATION ${CMAKE_INSTALL_DATADIR}/doc/${package} COMPONENT ${component})
 endforeach()
 include(CPack)

@@ -1,5 +1,5 @@
 #!/bin/sh
-# Builds the packages of one release preset: the .deb files and a tarball, in build/packages.
+# Builds the packages of one release preset, the .deb files and a tarball, in build/packages, and has lintian check them.
 # Usage: package.sh PRESET
 set -eu
 cd "$(dirname "$0")/.."
@@ -11,3 +11,5 @@ for kind in DEB TGZ; do
     }
 done
 rm -rf build/packages/_CPack_Packages
+architecture=$(sed -n 's/^set(CPACK_DEBIAN_PACKAGE_ARCHITECTURE "\(.*\)")/\1/p' "build/$1/CPackConfig.cmake")
+lintian --allow-root --fail-on error build/packages/*_"$architecture".deb

@@ -1,9 +1,13 @@
 #include "store/databasefile.h"
 
+#include <sys/stat.h>
 #include <unistd.h>
 
+#include <cerrno>
+#include <cstring>
 #include <filesystem>
 
+#include "store/denial.h"
 #include "store/failure.h"
 
 namespace quor::store {
@@ -19,16 +23,19 @@ std::string AbsolutePath(const std::string& path) {
 
 std::string RequireDatabase(const std::string& path, const std::string& advice) {
     std::string absolute = AbsolutePath(path);
-    std::error_code failed;
-    const auto status = std::filesystem::status(absolute, failed);
-    if (!std::filesystem::exists(status)) {
+    struct stat status {};
+    const bool readable = stat(absolute.c_str(), &status) == 0 && access(absolute.c_str(), R_OK) == 0;
+    if (!readable && errno == EACCES) {
+        throw Failure(WhyDenied(absolute), Cause::Denied);
+    }
+    if (!readable && errno != ENOENT && errno != ENOTDIR) {
+        throw Failure(absolute + ": " + strerror(errno), Cause::Other);
+    }
+    if (!readable) {
         throw Failure("no database " + absolute + "; " + advice, Cause::Missing);
     }
-    if (!std::filesystem::is_regular_file(status)) {
+    if (!S_ISREG(status.st_mode)) {
         throw Failure(absolute + " is not a file; give the path of a database", Cause::Missing);
-    }
-    if (access(absolute.c_str(), R_OK) != 0) {
-        throw Failure("may not read " + absolute + "; run as a user who may", Cause::Denied);
     }
     return absolute;
 }

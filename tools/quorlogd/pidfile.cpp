@@ -2,11 +2,15 @@
 
 #include <fcntl.h>
 #include <sys/file.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include <cerrno>
 #include <cstring>
+#include <filesystem>
 #include <stdexcept>
+
+#include "base/paths.h"
 
 namespace quor {
 
@@ -16,6 +20,11 @@ PidFile::PidFile(const std::string& path) : file_(open(path.c_str(), O_RDWR | O_
     }
     if (flock(file_.get(), LOCK_EX | LOCK_NB) != 0) {
         throw std::runtime_error("another quorlogd is running; see " + path + " for its number");
+    }
+    // Who may read the logs may also see whether somebody follows them.
+    struct stat logs {};
+    if (stat(std::filesystem::path(paths::kWorkingDb).parent_path().c_str(), &logs) == 0) {
+        (void)fchown(file_.get(), static_cast<uid_t>(-1), logs.st_gid);
     }
     const std::string number = std::to_string(getpid()) + "\n";
     if (ftruncate(file_.get(), 0) != 0 || write(file_.get(), number.data(), number.size()) < 0) {

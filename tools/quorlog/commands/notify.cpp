@@ -1,6 +1,11 @@
 // notify test.
+#include <unistd.h>
+
+#include <cerrno>
+
 #include "base/paths.h"
 #include "quor/quornotify.h"
+#include "store/denial.h"
 #include "tools/quorlog/commands/commands.h"
 #include "tools/quorlog/messages.h"
 #include "tools/quorlog/options.h"
@@ -28,6 +33,9 @@ int run(const OutputOptions& options) {
     const auto sink = MakeSink(options.style(), {{"channel"}, {"outcome"}, {"cause"}}, out);
     Deliveries deliveries{*sink};
     const int tried = QUORNotifyTest(reportDelivery, &deliveries);
+    if (tried < 0 && access(paths::kSystemSettings, R_OK) != 0 && errno == EACCES) {
+        throw Failure(store::WhyDenied(paths::kSystemSettings), store::Cause::Denied);
+    }
     if (tried < 0) {
         throw Failure(std::string("cannot read ") + paths::kSystemSettings + "; create it and name the channels there");
     }
