@@ -1,6 +1,6 @@
 # Debian packages of the library, the development files and the programs, and a tarball of everything (cpack -G TGZ).
 set(CPACK_PACKAGE_VENDOR "The quorsyslog maintainers")
-set(CPACK_PACKAGE_CONTACT "The quorsyslog maintainers <root@localhost>")
+set(CPACK_PACKAGE_CONTACT "The quorsyslog maintainers <quorsyslog@example.org>")
 set(CPACK_PACKAGE_DESCRIPTION_SUMMARY ${PROJECT_DESCRIPTION})
 set(CPACK_PACKAGING_INSTALL_PREFIX /usr)
 set(CPACK_SET_DESTDIR ON)
@@ -24,18 +24,18 @@ set(CPACK_DEBIAN_PACKAGE_ARCHITECTURE ${architecture})
 set(CPACK_DEBIAN_PACKAGE_CONTROL_STRICT_PERMISSION ON)
 set(CPACK_DEBIAN_PACKAGE_GENERATE_SHLIBS ON)
 set(CPACK_COMPONENT_LIBRARY_DESCRIPTION "Library that searches, counts and accounts logs
- which syslog-ng stores in SQLite databases, keeps statistics, and sends notices
- of what a rule matches.")
+ The logs are those that syslog-ng stores in SQLite databases. The library
+ keeps statistics of them, and sends notices of what a rule matches.")
 set(CPACK_COMPONENT_DEVELOPMENT_DESCRIPTION "Headers of the log library
- and what a program needs to be built with it.")
+ And what else a program needs to be built with it.")
 set(CPACK_COMPONENT_TOOLS_DESCRIPTION "Log server on syslog-ng and SQLite
  syslog-ng receives messages of devices and stores them in a database.
  quorlog searches and counts them on the command line; quorlogd accounts them
  by device, checks rules, and sends notices.")
 set(CPACK_DEBIAN_LIBRARY_PACKAGE_NAME libquorsyslog${PROJECT_VERSION_MAJOR})
 set(CPACK_DEBIAN_LIBRARY_PACKAGE_SECTION libs)
-set(CPACK_DEBIAN_LIBRARY_PACKAGE_DEPENDS "libc6 (>= 2.36), libgcc-s1, libstdc++6 (>= 12), libsqlite3-0 (>= 3.40), \
-libjsoncpp25 (>= 1.9.5), sqlite3")
+set(common_libraries "libc6 (>= 2.36), libgcc-s1, libstdc++6 (>= 12), libsqlite3-0 (>= 3.40)")
+set(CPACK_DEBIAN_LIBRARY_PACKAGE_DEPENDS "${common_libraries}, libjsoncpp25 (>= 1.9.5), sqlite3")
 if(QUOR_WITH_CURL)
     string(APPEND CPACK_DEBIAN_LIBRARY_PACKAGE_DEPENDS ", libcurl4 (>= 7.88)")
 endif()
@@ -46,8 +46,8 @@ set(CPACK_DEBIAN_DEVELOPMENT_PACKAGE_SECTION libdevel)
 set(CPACK_DEBIAN_DEVELOPMENT_PACKAGE_DEPENDS "${same_library}")
 set(CPACK_DEBIAN_TOOLS_PACKAGE_NAME quorsyslog)
 set(CPACK_DEBIAN_TOOLS_PACKAGE_SECTION admin)
-set(CPACK_DEBIAN_TOOLS_PACKAGE_DEPENDS "${same_library}, libre2-9, libutf8proc2, syslog-ng-core (>= 3.38), syslog-ng-mod-sql, libdbd-sqlite3, \
-init-system-helpers, sysvinit-utils, util-linux, openssl")
+set(CPACK_DEBIAN_TOOLS_PACKAGE_DEPENDS "${same_library}, ${common_libraries}, libre2-9, libutf8proc2, syslog-ng-core (>= 3.38), \
+syslog-ng-mod-sql, libdbd-sqlite3, openssl")
 set(CPACK_DEBIAN_TOOLS_PACKAGE_RECOMMENDS "ca-certificates")
 set(CPACK_DEBIAN_TOOLS_PACKAGE_SUGGESTS "nftables")
 set(scripts ${PROJECT_SOURCE_DIR}/packaging)

@@ -388,6 +388,43 @@ TEST_F(QuorlogdProcess, TellsWhatWasDroppedOnceAndWhatWaits) {
     EXPECT_EQ(events().size(), 4U) << testing::PrintToString(events());
 }
 
+TEST_F(QuorlogdProcess, AnnouncesWhoHoldsTheConnectionsOfAPort) {
+    const Descriptor server(socket(AF_INET6, SOCK_STREAM | SOCK_CLOEXEC, 0));
+    sockaddr_in6 address{};
+    socklen_t size = sizeof address;
+    address.sin6_family = AF_INET6;
+    (void)bind(server.get(), reinterpret_cast<sockaddr*>(&address), size);
+    (void)listen(server.get(), 20);
+    (void)getsockname(server.get(), reinterpret_cast<sockaddr*>(&address), &size);
+    const std::string port = std::to_string(ntohs(address.sin6_port));
+    const std::string values = paths::kReceiverValues + std::string("/receiving-9.conf");
+    WriteFile(values, "@define quor_port_framed \"" + port + "\"\n@define quor_connections \"10\" # few\n");
+    sockaddr_in local{};
+    local.sin_family = AF_INET;
+    local.sin_port = address.sin6_port;
+    local.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
+    std::vector<Descriptor> senders;
+    const auto hold = [&](size_t count) {
+        senders.resize(std::min(senders.size(), count));
+        while (senders.size() < count) {
+            senders.emplace_back(socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0));
+            ASSERT_EQ(connect(senders.back().get(), reinterpret_cast<sockaddr*>(&local), sizeof local), 0);
+        }
+    };
+    hold(8);
+    Quorlogd daemon("--check-interval 1");
+    ASSERT_TRUE(daemon.started());
+    usleep(1500000);
+    EXPECT_EQ(events(), Strings{});
+    for (const size_t count : {9, 7, 9}) {  // told once
+        hold(count);
+        usleep(1500000);
+    }
+    std::filesystem::remove(values);
+    EXPECT_EQ(events(), Strings{"Event detection: TCP port " + port +
+                                " has [9] of 10 connections, [9] of them from 127.0.0.1"});
+}
+
 TEST_F(QuorlogdProcess, RaisesAFullVolumeOnceAndKeepsTheEventLogSmall) {
     SqliteFile(paths::kEventDb)
         .run(ReadFile(paths::kEventSchema) + "WITH n(i) AS (SELECT 1 UNION ALL SELECT i + 1 FROM n WHERE i < 15001) "
