@@ -17,8 +17,8 @@
 namespace quor::store {
 namespace {
 
-// One line of /proc/net/tcp or tcp6. The address is one or four words of eight digits, each a number in the byte order of
-// this machine.
+// One line of /proc/net/tcp or tcp6. The address is one or four words of eight digits, each a number in the byte order
+// of this machine.
 struct Socket {
     uint16_t port;
     std::string_view sender;

@@ -15,7 +15,8 @@ struct PortUse {
     uint64_t busiestHolds = 0;
 };
 
-// Of those of the TCP ports at which a program listens. A sender over IPv4 has its IPv4 address, however it is connected.
+// Of those of the TCP ports at which a program listens. A sender over IPv4 has its IPv4 address, however it is
+// connected.
 std::map<uint16_t, PortUse> UseOfPorts(const std::vector<uint16_t>& ports);
 
 // Whether a port that takes `most` connections soon takes no more.

@@ -7,6 +7,7 @@
 #include <string>
 
 #include "base/guarded.h"
+#include "platform/db/quiet.h"
 
 namespace {
 
@@ -30,9 +31,12 @@ bool isFile(const char* path) {
 
 // A file that cannot be written is opened for reading. One thread at a time uses a connection.
 DBConnect_tag* connect(const char* path) {
-    constexpr int kFlags = SQLITE_OPEN_READWRITE | SQLITE_OPEN_NOMUTEX;
     auto connection = std::make_unique<DBConnect_tag>();
-    if (sqlite3_open_v2(plainName(path).c_str(), quor::Adopt(connection->db), kFlags, nullptr) != SQLITE_OK) {
+    connection->quiet = quor::HoldQuiet(path);
+    const bool quiet = static_cast<bool>(connection->quiet);
+    const std::string name = quiet ? quor::QuietName(path) : plainName(path);
+    const int mode = quiet ? SQLITE_OPEN_READONLY | SQLITE_OPEN_URI : SQLITE_OPEN_READWRITE;
+    if (sqlite3_open_v2(name.c_str(), quor::Adopt(connection->db), mode | SQLITE_OPEN_NOMUTEX, nullptr) != SQLITE_OK) {
         return nullptr;
     }
     sqlite3_busy_timeout(connection->db.get(), kBusyMilliseconds);

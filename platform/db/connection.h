@@ -14,6 +14,7 @@ using Database = Guard<sqlite3, sqlite3_close_v2>;  // statements of its own may
 }  // namespace quor
 
 struct DBConnect_tag {
+    quor::Descriptor quiet;  // held until the database is closed; mostly none
     quor::Database db;
 };
 

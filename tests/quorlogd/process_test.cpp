@@ -421,8 +421,8 @@ TEST_F(QuorlogdProcess, AnnouncesWhoHoldsTheConnectionsOfAPort) {
         usleep(1500000);
     }
     std::filesystem::remove(values);
-    EXPECT_EQ(events(), Strings{"Event detection: TCP port " + port +
-                                " has [9] of 10 connections, [9] of them from 127.0.0.1"});
+    EXPECT_EQ(events(),
+              Strings{"Event detection: TCP port " + port + " has [9] of 10 connections, [9] of them from 127.0.0.1"});
 }
 
 TEST_F(QuorlogdProcess, RaisesAFullVolumeOnceAndKeepsTheEventLogSmall) {

@@ -124,11 +124,13 @@ Finding lookAtTcp() {
             continue;
         }
         connections += use->second.connections;
-        finding.detail += " has " + Decimal(use->second.connections) + " of " + Decimal(values.connections) + " connections";
+        finding.detail +=
+            " has " + Decimal(use->second.connections) + " of " + Decimal(values.connections) + " connections";
         if (store::IsCrowded(use->second, values.connections) && finding.state == State::Good) {
             finding.detail += ", " + Decimal(use->second.busiestHolds) + " of them from " + use->second.busiest;
             finding.state = State::Doubtful;
-            finding.advice = "see what that device does; systemctl enable --now quorsyslog-connections bounds each address";
+            finding.advice =
+                "see what that device does; systemctl enable --now quorsyslog-connections bounds each address";
         }
     }
     finding.measures = {{"tcp_connections", connections}};
@@ -148,6 +150,11 @@ std::optional<uint64_t> positionIn(const store::Source& source) {
     return std::nullopt;
 }
 
+// Before the first message it has no tables.
+bool isNew(const std::string& db) {
+    return store::Ask(db, "SELECT 1 FROM sqlite_schema WHERE name = 'logs'", "1").empty();
+}
+
 Finding lookAtFollower(const std::string& db) {
     if (store::FollowerProcess() == 0) {
         return {"quorlogd",
@@ -160,6 +167,9 @@ Finding lookAtFollower(const std::string& db) {
         return {"quorlogd", State::Doubtful, "runs, and waits for " + db, "start syslog-ng", {{"follower_up", 1}}};
     }
     const auto source = store::OpenSource(db);
+    if (isNew(db)) {
+        return {"quorlogd", State::Good, "runs, and waits for the first message", "", {{"follower_up", 1}}};
+    }
     const std::optional<uint64_t> position = positionIn(*source);
     const uint64_t newest = LargestId(*source, "logs");
     const uint64_t behind = position && newest > *position ? newest - *position : 0;
@@ -172,13 +182,13 @@ Finding lookAtFollower(const std::string& db) {
             {{"follower_up", 1}, {"rows_behind", behind}}};
 }
 
-Finding lookAtRows(const store::Source& source) {
+Finding lookAtRows(const store::Source& source, const std::string& db) {
     store::Record last;
-    if (source.read("logs", {}, {1, 0}, false, [&](const store::Record& record) { last = record; }) == 0) {
+    if (isNew(db) || source.read("logs", {}, {1, 0}, false, [&](const store::Record& record) { last = record; }) == 0) {
         return {"rows",
                 State::Doubtful,
                 "no message was stored yet",
-                "send one: logger -n 127.0.0.1 -d hello",
+                "send one: logger -n 127.0.0.1 -d -P " + std::to_string(store::ReadReceivingValues().port) + " hello",
                 {{"last_row_id", 0}}};
     }
     const int64_t second = last.rsec != 0 ? last.rsec : last.utcsec;
@@ -247,7 +257,7 @@ std::vector<Finding> examine(const DoctorOptions& options) {
     const std::string db = store::AbsolutePath(options.db);
     std::vector<Finding> findings = {lookAtReceiver(options.control), lookAtUdp(), lookAtTcp()};
     findings.push_back(guarded("quorlogd", [&] { return lookAtFollower(db); }));
-    findings.push_back(guarded("rows", [&] { return lookAtRows(*store::OpenSource(db)); }));
+    findings.push_back(guarded("rows", [&] { return lookAtRows(*store::OpenSource(db), db); }));
     findings.push_back(lookAtSpace(db));
     findings.push_back(lookAtNotices());
     return findings;
