@@ -1,18 +1,20 @@
 #!/bin/sh
-# Builds what the PowerPC build links, from Debian's source packages: SQLite, JsonCpp, RE2, utf8proc and GoogleTest, and copies the
-# headers of CLI11. The sources come from where this machine gets its packages.
-# Usage: build-powerpc-deps.sh FOLDER       result: FOLDER/prefix; nothing is done when it is complete
+# Builds what the PowerPC build links, from Debian's source packages: SQLite, JsonCpp, RE2, utf8proc, libcurl (with OpenSSL inside)
+# and GoogleTest, and copies the headers of CLI11. The sources come from where this machine gets its packages.
+# Usage: build-powerpc-deps.sh FOLDER       result: FOLDER/prefix; nothing is done when this script has completed it
 set -eu
 cd "$(dirname "$0")/.."
 toolchain=$PWD/cmake/powerpc.toolchain.cmake
-mkdir -p "$1/apt/lists" "$1/src"
+complete=complete-$(cat scripts/build-powerpc-deps.sh "$toolchain" | sha256sum | cut -c 1-16)
+mkdir -p "$1/apt/lists"
 cd "$1"
 folder=$PWD
 prefix=$folder/prefix
 host=powerpc-linux-gnu
 jobs=$(nproc)
 
-[ -e "$folder/complete" ] && exit 0
+[ -e "$complete" ] && exit 0
+rm -rf "$prefix" complete*
 
 # Debian's own repositories among the machine's package sources, as source entries.
 write_sources() {
@@ -32,13 +34,24 @@ APT::Sandbox::User "root";
 END
 }
 
+# The newest version whose source is there: a mirror may know of one that it does not have yet.
+fetch_package() {
+    for version in $(apt-cache madison "$1" | cut -d '|' -f 2 | sort -ruV); do
+        apt-get source -qq --only-source "$1=$version" >> fetch.log 2>&1 && return
+    done
+    echo "build-powerpc-deps.sh: no source of $1 can be fetched:" >&2
+    cat fetch.log >&2
+    return 1
+}
+
 fetch() {
     export APT_CONFIG=$folder/apt/apt.conf
     apt-get update -qq
-    (cd src && rm -rf ./* && apt-get source -qq --only-source "$@" > fetch.log 2>&1) || {
-        cat src/fetch.log >&2
-        exit 1
-    }
+    rm -rf src
+    mkdir src
+    cd src
+    for package in "$@"; do fetch_package "$package"; done
+    cd ..
 }
 
 # With the options of Debian's own package.
@@ -69,10 +82,36 @@ build_with_cmake() {
     cmake --install "$build" > /dev/null
 }
 
+# What TLS needs and nothing else, to be linked into libcurl.
+build_openssl() {
+    cd "$folder"/src/openssl-*
+    ./Configure linux-ppc --cross-compile-prefix="$(command -v ccache || true) $host-" --prefix="$prefix" --libdir=lib --openssldir=/etc/ssl \
+        -fPIC no-shared no-tests no-module no-engine no-legacy no-cms no-ts no-cmp no-srp no-psk no-idea no-seed no-aria no-camellia \
+        no-bf no-cast no-rc2 no-rc4 no-md2 no-md4 no-rmd160 no-whirlpool no-sm2 no-sm3 no-sm4 no-dtls no-ssl3 no-comp no-ocb \
+        no-siphash no-blake2 no-gost no-ct no-rfc3779 > configure.log
+    make -j"$jobs" build_libs > build.log 2>&1 || {
+        tail build.log >&2
+        exit 1
+    }
+    make install_dev > install.log
+}
+
+# Its symbols have no versions, so that the programs run with any libcurl.so.4, Debian's too.
+build_curl() {
+    build_with_cmake "$(echo "$folder"/src/curl-*/)" -DBUILD_CURL_EXE=OFF -DBUILD_TESTING=OFF -DENABLE_MANUAL=OFF \
+        -DCMAKE_SHARED_LINKER_FLAGS=-Wl,--exclude-libs,ALL,--no-undefined -DCMAKE_C_STANDARD_LIBRARIES=-l:libatomic.a \
+        -DCURL_USE_OPENSSL=ON -DOPENSSL_USE_STATIC_LIBS=ON \
+        -DCURL_CA_BUNDLE=/etc/ssl/certs/ca-certificates.crt -DCURL_CA_PATH=none -DCURL_USE_LIBSSH2=OFF -DCURL_USE_LIBPSL=OFF \
+        -DUSE_LIBIDN2=OFF -DUSE_NGHTTP2=OFF -DCURL_ZLIB=OFF -DCURL_BROTLI=OFF -DCURL_ZSTD=OFF \
+        $(printf -- '-DCURL_DISABLE_%s=ON ' DICT FILE FTP GOPHER IMAP LDAP LDAPS MQTT POP3 RTSP SMB TELNET TFTP NTLM)
+}
+
 write_sources
-fetch sqlite3 libjsoncpp utf8proc re2
+fetch sqlite3 libjsoncpp utf8proc re2 openssl curl
 (build_sqlite)
 build_re2
+(build_openssl)
+build_curl
 build_with_cmake "$(echo "$folder"/src/libjsoncpp-*/)" -DBUILD_SHARED_LIBS=ON -DBUILD_STATIC_LIBS=OFF \
     -DBUILD_OBJECT_LIBS=OFF -DJSONCPP_WITH_TESTS=OFF -DJSONCPP_WITH_POST_BUILD_UNITTEST=OFF
 build_with_cmake "$(echo "$folder"/src/utf8proc-*/)" -DBUILD_SHARED_LIBS=ON
@@ -81,4 +120,4 @@ mkdir -p "$prefix/share/cmake"
 cp -R /usr/include/CLI "$prefix/include/"
 cp -R /usr/share/cmake/CLI11 "$prefix/share/cmake/"
 rm -rf src
-touch complete
+touch "$complete"
