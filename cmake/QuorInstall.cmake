@@ -36,8 +36,8 @@ if(QUOR_BUILD_TOOLS)
     install(FILES ${etc}/sysctl.d/quorsyslog.conf DESTINATION lib/sysctl.d COMPONENT tools)
     install(FILES ${etc}/systemd/quorlogd.service ${etc}/systemd/quorsyslog-connections.service
             DESTINATION lib/systemd/system COMPONENT tools)
-    install(FILES ${etc}/quorinfo.conf.example DESTINATION ${CMAKE_INSTALL_DATADIR}/doc/quorsyslog/examples
-            COMPONENT tools)
+    install(FILES ${etc}/quorinfo.conf.example ${etc}/syslog-ng/forward.conf.example
+            DESTINATION ${CMAKE_INSTALL_DATADIR}/doc/quorsyslog/examples COMPONENT tools)
     install(FILES ${etc}/systemd/syslog-ng-quorsyslog.conf DESTINATION lib/systemd/system/syslog-ng.service.d
             RENAME quorsyslog.conf COMPONENT tools)
     quor_install_manuals(tools notify.conf.5 notify.filter.5 quorinfo.conf.5 rules.conf.5 quorlog-tls.8)
