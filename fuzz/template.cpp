@@ -7,6 +7,7 @@
 #include "base/utf8.h"
 #include "common/handles.h"
 #include "fuzz/fuzz.h"
+#include "platform/notify/chat.h"
 #include "platform/notify/message.h"
 #include "platform/notify/render.h"
 
@@ -53,6 +54,13 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* bytes, size_t size) {
     }
     Require(isOneLine(notice->subject) && quor::IsUtf8(notice->subject), "the subject is one line of UTF-8");
     Require(isJson(quor::notify::NoticeAsJson(*notice)), "the JSON is valid");
+    for (const char* field : {"text", "content"}) {
+        const std::string chat = quor::notify::NoticeAsChat(*notice, *quor::notify::FindChatForm(field));
+        Require(isJson(chat) && quor::IsUtf8(chat), "the chat message is valid");
+        Require(chat.find_first_of("@<>") == std::string::npos && chat.find("://") == std::string::npos,
+                "no markup of a sender is in it");
+        Require(chat.find("```", chat.find("```") + 3) == chat.size() - 5, "nor does one end its block");
+    }
     QUORMAIL mail{};
     snprintf(mail.recipient, sizeof mail.recipient, "a@example.org");
     quor::notify::Notice plain = *notice;

@@ -20,8 +20,12 @@ std::string setting(const char* key) {
 }  // namespace
 
 bool IsChannelSet() {
-    return setting("desktop_notify_enabled") == "yes" ||
-           setting("webhook_url").find_first_not_of(" \t") != std::string::npos || IsNotificationSet();
+    for (const char* key : {"webhook_url", "webhook_text_url", "webhook_content_url", "notify_command"}) {
+        if (setting(key).find_first_not_of(" \t") != std::string::npos) {
+            return true;
+        }
+    }
+    return setting("desktop_notify_enabled") == "yes" || IsNotificationSet();
 }
 
 }  // namespace quor::store

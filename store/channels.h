@@ -4,7 +4,7 @@
 
 namespace quor::store {
 
-// Whether mail, a push service, a webhook or the desktop is set up.
+// Whether mail, a push service, a webhook, a command or the desktop is set up.
 bool IsChannelSet();
 
 }  // namespace quor::store

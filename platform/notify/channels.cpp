@@ -25,7 +25,11 @@ Targets desktops(const Settings& settings) {
 }
 
 Targets webhooks(const Settings& settings) {
-    return settings.webhookUrls;
+    return settings.webhooks;
+}
+
+Targets commands(const Settings& settings) {
+    return oneIf(!settings.command.empty());
 }
 
 Targets mailServers(const Settings& settings) {
@@ -35,6 +39,7 @@ Targets mailServers(const Settings& settings) {
 constexpr std::array<Channel, kChannelCount> kChannels{{
     {"desktop", desktops, DeliverToDesktop, kFailure},
     {"webhook", webhooks, DeliverToWebhook, kFailure},
+    {"command", commands, DeliverToCommand, kFailure},
     {"mail", mailServers, DeliverByMail, "Failed to send email."},
 }};
 
@@ -54,11 +59,11 @@ uint32_t ChannelsNamed(std::string_view names) {
     return bits;
 }
 
-std::string Deliver(const Channel& channel, const Notice& notice) {
+Outcome Deliver(const Channel& channel, const Notice& notice) {
     const std::optional<Settings> settings = LoadSettings();
     const Targets targets = settings ? channel.targets(*settings) : Targets();
     const bool wanted = std::find(targets.begin(), targets.end(), notice.target) != targets.end();
-    return wanted ? channel.deliver(*settings, notice) : "";
+    return wanted ? channel.deliver(*settings, notice) : Outcome();
 }
 
 // Failed mails are left out: callers look for those themselves.

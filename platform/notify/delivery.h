@@ -1,5 +1,4 @@
-// The delivery of one notice on each channel: the cause of the failure, empty when it was delivered. Without libcurl
-// mail and webhooks fail.
+// The delivery of one notice on each channel. Without libcurl mail and webhooks fail.
 #ifndef PLATFORM_NOTIFY_DELIVERY_H
 #define PLATFORM_NOTIFY_DELIVERY_H
 
@@ -10,9 +9,15 @@
 
 namespace quor::notify {
 
-std::string DeliverToDesktop(const Settings& settings, const Notice& notice);
-std::string DeliverByMail(const Settings& settings, const Notice& notice);
-std::string DeliverToWebhook(const Settings& settings, const Notice& notice);
+struct Outcome {
+    std::string cause;      // of the failure, and what to do about it; empty when the notice was delivered
+    bool hopeless = false;  // another try would fail the same way
+};
+
+Outcome DeliverToCommand(const Settings& settings, const Notice& notice);
+Outcome DeliverToDesktop(const Settings& settings, const Notice& notice);
+Outcome DeliverByMail(const Settings& settings, const Notice& notice);
+Outcome DeliverToWebhook(const Settings& settings, const Notice& notice);
 
 }  // namespace quor::notify
 

@@ -24,14 +24,14 @@ std::string append(const std::string& path, const std::string& line) {
 }  // namespace
 
 // When the file has grown to its bound it becomes "desktop.jsonl.1", in place of the one before.
-std::string DeliverToDesktop(const Settings& /*settings*/, const Notice& notice) {
+Outcome DeliverToDesktop(const Settings& /*settings*/, const Notice& notice) {
     const Spool spool(kWaitForever);
     const std::string path = std::string(paths::kNotifySpool) + kFile;
     struct stat found {};
     if (stat(path.c_str(), &found) == 0 && found.st_size >= kMostBytes) {
         (void)rename(path.c_str(), (path + ".1").c_str());
     }
-    return append(path, NoticeAsJson(notice) + "\n");
+    return {append(path, NoticeAsJson(notice) + "\n")};
 }
 
 }  // namespace quor::notify

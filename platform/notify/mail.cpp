@@ -51,17 +51,17 @@ void allowRefusedRecipients(Transfer& transfer) {
 
 }  // namespace
 
-std::string DeliverByMail(const Settings& settings, const Notice& notice) {
+Outcome DeliverByMail(const Settings& settings, const Notice& notice) {
     const QUORMAIL& mail = settings.mail;
     CurlList recipients;
     for (const std::string& address : Recipients(mail)) {
         const std::string cause = Append(recipients, "<" + address + ">");
         if (!cause.empty()) {
-            return cause;
+            return {cause};
         }
     }
     if (!recipients || !isHostName(mail.server)) {
-        return "check smtp_server and smtp_recipient in the settings";
+        return {"check smtp_server and smtp_recipient in the settings"};
     }
     const std::string message = NoticeAsMail(mail, notice);
     const std::string sender = "<" + Sender(mail) + ">";
@@ -75,7 +75,7 @@ std::string DeliverByMail(const Settings& settings, const Notice& notice) {
     transfer.set(CURLOPT_UPLOAD, 1L);
     transfer.set(CURLOPT_READFUNCTION, readUpload);
     transfer.set(CURLOPT_READDATA, static_cast<void*>(&upload));
-    return transfer.run();
+    return {transfer.run()};
 }
 
 }  // namespace quor::notify

@@ -127,13 +127,17 @@ std::string Sender(const QUORMAIL& mail) {
     return "";
 }
 
+std::string HeldBackLine(const Notice& notice) {
+    return notice.heldBack > 0
+               ? "\nEarlier notices of this kind that were held back: " + std::to_string(notice.heldBack)
+               : "";
+}
+
 // A body that is not UTF-8 goes out as Latin-1, which has a character for every byte: either way the bytes in the mail
 // are those that were received, and a reader sees them.
 std::string NoticeAsMail(const QUORMAIL& mail, const Notice& notice) {
-    std::string body = notice.body;
-    if (notice.heldBack > 0) {
-        body += "\nEarlier notices of this kind that were held back: " + std::to_string(notice.heldBack) + "\n";
-    }
+    const std::string held = HeldBackLine(notice);
+    const std::string body = notice.body + (held.empty() ? "" : held + "\n");
     const std::string& subject = notice.subject;
     return "Date: " + mailDate(notice.time) + "\r\nFrom: <" + Sender(mail) + ">\r\nTo: <" +
            joined(Recipients(mail), ">,\r\n <") + ">\r\nMessage-ID: <" + messageId() +

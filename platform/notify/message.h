@@ -17,6 +17,9 @@ std::string NoticeAsJson(const Notice& notice);
 // The whole mail, header and body, with CRLF line ends.
 std::string NoticeAsMail(const QUORMAIL& mail, const Notice& notice);
 
+// A line, with the line break before it, for readers of plain text; empty when none was held back.
+std::string HeldBackLine(const Notice& notice);
+
 // The recipients; text that cannot be an address is left out.
 std::vector<std::string> Recipients(const QUORMAIL& mail);
 // Empty when neither the sender nor a recipient is an address.

@@ -104,13 +104,17 @@ int test(void (*report)(const char*, int, const char*, void*), void* context) {
     notice.subject = "Test notice of the log server";
     notice.body = "This is a test notice of the log server. Nothing needs to be done.\n";
     notice.time = time(nullptr);
-    const std::vector<Target> targets = targetsOf(*settings, ~0U);
-    for (const auto& [channel, name] : targets) {
-        notice.target = name;
-        const std::string cause = channel->deliver(*settings, notice);
-        report(channel->name, cause.empty() ? 1 : 0, cause.c_str(), context);
+    int tried = 0;
+    for (const Channel& channel : Channels()) {
+        const std::vector<std::string> targets = channel.targets(*settings);
+        for (size_t i = 0; i < targets.size(); ++i, ++tried) {
+            const std::string number = targets.size() > 1 ? " " + std::to_string(i + 1) : "";
+            notice.target = targets[i];
+            const std::string cause = channel.deliver(*settings, notice).cause;
+            report((channel.name + number).c_str(), cause.empty() ? 1 : 0, cause.c_str(), context);
+        }
     }
-    return static_cast<int>(targets.size());
+    return tried;
 }
 
 }  // namespace

@@ -17,6 +17,8 @@ namespace {
 
 constexpr std::array<const char*, kSecurities> kSecurityNames{"none", "starttls", "tls"};
 constexpr std::array<int, kSecurities> kDefaultPorts{25, 587, 465};
+constexpr std::pair<const char*, const char*> kWebhookKeys[] = {
+    {"webhook_url", ""}, {"webhook_text_url", "text "}, {"webhook_content_url", "content "}};
 constexpr int32_t kDefaultTimeout = 30;
 constexpr int32_t kLongestTimeout = 300;
 
@@ -86,8 +88,11 @@ Settings readSettings(const Keys& keys) {
     settings.mail = readMail(keys);
     settings.mailEnabled = keys.yes("smtp_mail_enabled");
     settings.desktopEnabled = keys.yes("desktop_notify_enabled");
-    EachWord(keys.text("webhook_url"), " \t",
-             [&settings](std::string_view url) { settings.webhookUrls.emplace_back(url); });
+    for (const auto& [key, form] : kWebhookKeys) {
+        EachWord(keys.text(key), " \t",
+                 [&, form = form](std::string_view url) { settings.webhooks.push_back(form + std::string(url)); });
+    }
+    settings.command = keys.text("notify_command");
     settings.webhookCaFile = keys.text("webhook_ca_file");
     settings.webhookVerify = keys.yes("webhook_tls_verify", true);
     const int32_t timeout = ToInt32(keys.text("notify_timeout").c_str());

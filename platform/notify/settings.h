@@ -18,9 +18,11 @@ struct Settings {
     QUORMAIL mail{};
     bool mailEnabled = false;
     bool desktopEnabled = false;
-    std::vector<std::string> webhookUrls;
+    std::vector<std::string>
+        webhooks;  // addresses; the name of its form and a blank before one that gets less than all
     std::string webhookCaFile;
     bool webhookVerify = true;
+    std::string command;  // a path
     int32_t timeout = 0;  // seconds for one delivery
 };
 

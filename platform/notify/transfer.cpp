@@ -8,6 +8,37 @@ namespace {
 constexpr long kConnectSeconds = 10;
 constexpr const char kLibrary[] = "libcurl.so.4";
 
+struct Advice {
+    CURLcode code;
+    const char* text;
+};
+constexpr Advice kAdvice[] = {
+    {CURLE_COULDNT_RESOLVE_HOST, "check the server's name and this machine's name servers"},
+    {CURLE_COULDNT_CONNECT, "check address and port, that the server runs, and that no firewall is between"},
+    {CURLE_OPERATION_TIMEDOUT,
+     "check address and port, and whether the port begins with TLS (tls) or without (starttls, none)"},
+    {CURLE_SSL_CONNECT_ERROR, "check whether this port begins with TLS (smtp_security tls, https) or without"},
+    {CURLE_USE_SSL_FAILED,
+     "the server offers no STARTTLS here: check smtp_port, or set smtp_security to what it takes"},
+    {CURLE_PEER_FAILED_VERIFICATION,
+     "check that the certificate is for this name, or set smtp_ca_file or webhook_ca_file to the one that issued it"},
+    {CURLE_SSL_CACERT_BADFILE,
+     "install ca-certificates, or set smtp_ca_file and webhook_ca_file to files that can be read"},
+    {CURLE_LOGIN_DENIED, "check smtp_user and smtp_password"},
+    {CURLE_SEND_ERROR, "check smtp_sender and smtp_recipient, and whether the server wants a login (smtp_user)"},
+    {CURLE_WEIRD_SERVER_REPLY, "check that the port is that of such a server"},
+    {CURLE_URL_MALFORMAT, "check how the address is written"},
+};
+
+std::string withAdvice(std::string cause, CURLcode code) {
+    for (const Advice& known : kAdvice) {
+        if (known.code == code) {
+            return cause + "; " + known.text;
+        }
+    }
+    return cause;
+}
+
 size_t discard(const char* /*data*/, size_t size, size_t count, void* /*context*/) {
     return size * count;
 }
@@ -92,7 +123,7 @@ std::string Transfer::run() {
     if (result_ == CURLE_OK) {
         return "";
     }
-    return error_[0] != '\0' ? error_.data() : LoadedCurl().strerror(result_);
+    return withAdvice(error_[0] != '\0' ? error_.data() : LoadedCurl().strerror(result_), result_);
 }
 
 long Transfer::status() const {

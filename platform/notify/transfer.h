@@ -53,7 +53,7 @@ class Transfer {
         }
     }
 
-    // The cause of the failure; empty when all went well.
+    // The cause of the failure, and what to do about it; empty when all went well.
     std::string run();
     // The server's answer to HTTP; 0 when there was none.
     long status() const;

@@ -4,7 +4,6 @@
 #include <sys/file.h>
 #include <sys/prctl.h>
 #include <sys/stat.h>
-#include <sys/syscall.h>
 #include <sys/wait.h>
 #include <syslog.h>
 #include <unistd.h>
@@ -14,6 +13,7 @@
 #include <optional>
 
 #include "platform/notify/oneline.h"
+#include "platform/notify/process.h"
 
 namespace quor::notify {
 namespace {
@@ -36,52 +36,32 @@ class SignalsHeld {
     sigset_t before_{};
 };
 
-void resetSignals() {
-    for (int number = 1; number < NSIG; ++number) {
-        (void)signal(number, SIG_DFL);
-    }
-    (void)signal(SIGPIPE, SIG_IGN);
-    sigset_t none;
-    (void)sigemptyset(&none);
-    (void)sigprocmask(SIG_SETMASK, &none, nullptr);
-}
-
-void closeFrom(int first) {
-#ifdef SYS_close_range
-    if (syscall(SYS_close_range, static_cast<unsigned int>(first), ~0U, 0U) == 0) {
-        return;
-    }
-#endif
-    const auto end = static_cast<int>(sysconf(_SC_OPEN_MAX));
-    for (int descriptor = first; descriptor < end; ++descriptor) {
-        (void)close(descriptor);
-    }
-}
-
 // Keeps the slot alone. The system log's connection must be closed by its owner, or its number would be written to
 // after something else got it.
 void closeInherited(int slot) {
     closelog();
     (void)dup2(fcntl(slot, F_DUPFD, kSlotDescriptor), kSlotDescriptor);
-    closeFrom(kSlotDescriptor + 1);
+    CloseFrom(kSlotDescriptor + 1);
     const int null = open("/dev/null", O_RDWR);
     for (int standard = STDIN_FILENO; standard <= STDERR_FILENO; ++standard) {
         (void)dup2(null, standard);
     }
-    closeFrom(kSlotDescriptor + 1);
+    CloseFrom(kSlotDescriptor + 1);
 }
 
 // Only the first failure and the last are told: the same one every hour helps nobody.
-void conclude(const Channel& channel, const Delivery& delivery, const std::string& cause) {
-    if (cause.empty()) {
+void conclude(const Channel& channel, const Delivery& delivery, const Outcome& outcome) {
+    if (outcome.cause.empty()) {
         delivery.remove();
         return;
     }
-    if (delivery.isLast() || delivery.tries == 1) {
+    const std::string cause = OneLine(outcome.cause, 400);
+    const bool last = outcome.hopeless || delivery.isLast();
+    if (last || delivery.tries == 1) {
         syslog(LOG_ERR, "%s %s: %s; %s", channel.failure, channel.name, cause.c_str(),
-               delivery.isLast() ? "given up" : "it is tried again");
+               last ? "given up" : "it is tried again");
     }
-    if (delivery.isLast()) {
+    if (last) {
         const Spool spool(kWaitForever);
         spool.giveUp(channel.name, delivery.notice, cause);
         delivery.remove();
@@ -101,13 +81,14 @@ void deliverQueue(const Channel& channel) {
                 return;
             }
         }
-        conclude(channel, *delivery, OneLine(Deliver(channel, delivery->notice), 400));
+        conclude(channel, *delivery, Deliver(channel, delivery->notice));
     }
 }
 
 [[noreturn]] void work(const Worker& worker) {
     closeInherited(worker.slot.get());
-    resetSignals();
+    ResetSignals();
+    (void)signal(SIGPIPE, SIG_IGN);
     (void)umask(077);
     openlog("quornotify", LOG_PID, 0);  // in the caller's facility
     (void)prctl(PR_SET_NAME, "quornotify");

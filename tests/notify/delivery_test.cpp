@@ -19,6 +19,17 @@ class Delivery : public Notify {
                ReadFile(process / "comm") == "quornotify\n" && getsid(std::stoi(process.filename())) != getsid(0) &&
                ReadFile(process / "status").find("Umask:\t0077") != std::string::npos;
     }
+
+    // The outcomes of the test notice, a line each.
+    static std::string tested() {
+        std::string heard;
+        const auto report = [](const char* channel, int ok, const char* detail, void* context) {
+            *static_cast<std::string*>(context) += std::string(channel) + (ok != 0 ? " ok" : ": ") + detail + "\n";
+        };
+        const int tried = QUORNotifyTest(report, &heard);
+        EXPECT_EQ(tried, std::count(begin(heard), end(heard), '\n'));
+        return heard;
+    }
 };
 
 TEST_F(Delivery, MailsCarryWhatWasReceivedAndNoHeaderOfItsMaking) {
@@ -49,7 +60,7 @@ TEST_F(Delivery, MailsCarryWhatWasReceivedAndNoHeaderOfItsMaking) {
     }
 }
 
-TEST_F(Delivery, EncryptedMailLogsInAndChecksTheCertificate) {
+TEST_F(Delivery, EncryptedChannelsLogInAndCheckTheCertificate) {
     const std::string key = folder_.path("key.pem");
     const std::string certificate = folder_.path("cert.pem");
     const std::string command = "openssl req -x509 -newkey rsa:2048 -nodes -subj /CN=127.0.0.1 2>/dev/null "
@@ -67,12 +78,17 @@ TEST_F(Delivery, EncryptedMailLogsInAndChecksTheCertificate) {
         };
         std::filesystem::remove(folder_.path("syslog"));
         with("");
-        EXPECT_NE(systemLog(1)[0].find("Failed to send email."), std::string::npos);
+        EXPECT_TRUE(std::regex_search(systemLog(1)[0], std::regex("Failed to send email\\..* or set smtp_ca_file")))
+            << systemLog(1)[0];
         with("smtp_ca_file=\"" + certificate + "\"\n");
         EXPECT_EQ(server.received(1)[3], "user");
         with("smtp_tls_verify=\"no\"\n");
         EXPECT_NE(server.received(2)[0], "") << "not verified";
     }
+    const Server web("https good", files);
+    settings("webhook_url=\"https://127.0.0.1:" + web.port() + "\"\nwebhook_ca_file=\"" + certificate + "\"\n");
+    ASSERT_EQ(send({}), 0);
+    EXPECT_EQ(web.received(1)[0], "post");
 }
 
 TEST_F(Delivery, MailThatFailsIsToldInTheSystemLog) {
@@ -122,6 +138,68 @@ TEST_F(Delivery, WebhooksGetValidJsonAndTellTheirFailures) {
     ASSERT_EQ(send({}), 0);
     EXPECT_NE(systemLog(2)[1], "");
     EXPECT_EQ(systemLog(2).size(), 2U) << "a notice about the failed notice would fail again";
+}
+
+TEST_F(Delivery, ChatServicesGetOneHarmlessField) {
+    const Server text("http good");
+    const Server content("http good");
+    const std::string address = "_url=\"http://127.0.0.1:";
+    settings("webhook_text" + address + text.port() + "\"\nwebhook_content" + address + content.port() + "/x\"\n");
+    folder_.write("T.txt", "About %HOST%\n\n%SYSLOG_CONTENT%\n");
+    const std::string hostile = "@everyone <!channel> ``` [a](http://b) \xE2\x80\xAE\xFF\t&";
+    ASSERT_EQ(send({{"%HOST%", "@here"}, {"%SYSLOG_CONTENT%", hostile}}), 0);
+    EXPECT_EQ(text.received(1), (Strings{"post", "application/json"}));
+    EXPECT_EQ(text.body(1), "{\"text\":\"```\\nAbout ＠here\\n\\n＠everyone ‹!channel› ˋˋˋ [a](http：//b) "
+                            "\xEF\xBF\xBD\xEF\xBF\xBD &\\n```\"}");
+    EXPECT_EQ(content.received(1)[0], "post");
+    EXPECT_EQ(content.body(1).substr(0, 11), "{\"content\":");
+
+    std::string faces;  // two units each of the 4,000 or 2,000, of which 22 stand around them
+    for (int i = 0; i < 2100; ++i) {
+        faces += "\xF0\x9F\x98\x80";
+    }
+    ASSERT_EQ(send({{"%SYSLOG_CONTENT%", faces}}), 0);
+    EXPECT_EQ(text.received(2)[0] + content.received(2)[0], "postpost");
+    EXPECT_EQ(text.body(2), "{\"text\":\"```\\nAbout \\n\\n" + faces.substr(0, size_t{4} * 1989) + " [...]\\n```\"}");
+    EXPECT_EQ(content.body(2).size(), text.body(2).size() + 3 - size_t{4} * 1000);
+}
+
+TEST_F(Delivery, ACommandGetsTheNoticeAndNothingElse) {
+    const std::string seen = folder_.path("seen");
+    const auto command = [&](const std::string& script) {
+        std::string path = folder_.write("command", "#!/bin/sh\n" + script + "\n");
+        std::filesystem::permissions(path, std::filesystem::perms{0700});
+        settings("notify_command=\"" + path + "\"\nnotify_timeout=\"1\"\n");
+        return path;
+    };
+    const std::string path =
+        command("{ cat; env | grep -v ^PWD= | cut -d= -f1 | sort; echo $# $NOTICE_TAG $(pwd); } > " + seen +
+                "\nsleep 60 & echo $! > " + seen + ".child");
+    ASSERT_EQ(send({{"%HOST%", "$(h)"}}), 0);
+    const Strings lines = awaitLines(seen + ".child", 1);
+    const std::string json = awaitLines(seen, 8)[0];
+    EXPECT_TRUE(json.rfind("{\"tag\":\"T\",", 0) == 0 && json.find("\"host\":\"$(h)\"") != std::string::npos) << json;
+    EXPECT_EQ(ReadFile(seen).substr(json.size() + 1),
+              "HOME\nLANG\nNOTICE_SUPPRESSED\nNOTICE_TAG\nNOTICE_TIME\nPATH\n0 T /\n");
+    EXPECT_TRUE(Eventually([&] { return kill(std::stoi(lines[0]), 0) != 0; })) << "what it started goes on";
+
+    command("echo 'no @!\tline'; exit 3");
+    EXPECT_EQ(tested(), "command: the command ended with status 3; it said: no @! line \n");
+    command("yes | head -c 1000000; exec sleep 60");
+    EXPECT_EQ(tested().substr(0, 50), "command: the command took longer than 1 seconds an");
+    std::filesystem::permissions(path, std::filesystem::perms{0720});
+    EXPECT_NE(tested().find(" && chmod go-w "), std::string::npos);
+    std::filesystem::permissions(path, std::filesystem::perms{0600});
+    EXPECT_NE(tested().find("; run: chmod +x "), std::string::npos);
+    std::filesystem::create_symlink(path, folder_.path("link"));
+    for (const std::string& wrong : Strings{"command", folder_.path("none"), folder_.path("link")}) {
+        settings("notify_command=\"" + wrong + "\"\n");
+        EXPECT_TRUE(std::regex_search(tested(), std::regex("set notify_command|an absolute path"))) << tested();
+    }
+    EXPECT_EQ(ReadFile(folder_.path("syslog")), "");
+    command("exit 100");
+    ASSERT_EQ(send({}), 0);
+    EXPECT_EQ(systemLog(1)[0], "Failed to send notice. command: the command ended with status 100; given up");
 }
 
 TEST_F(Delivery, TheCallerNeitherWaitsNorKeepsAnything) {
@@ -225,21 +303,19 @@ TEST_F(Delivery, TheTestNoticeTellsTheOutcomeOfEachChannel) {
     const Server server("http good");
     const std::string webhook = "webhook_url=\"http://127.0.0.1:" + server.port() + "\"\n";
     settings(mailTo("9", "desktop_notify_enabled=\"yes\"\n" + webhook));  // nobody listens there
-    Strings heard;
-    const auto report = [](const char* channel, int ok, const char* detail, void* context) {
-        static_cast<Strings*>(context)->push_back(std::string(channel) + (ok != 0 ? " ok" : " failed") +
-                                                  (*detail != '\0' ? ", cause" : ""));
-    };
     const mode_t mask = umask(0);
     SetClock(1'700'000'000);
-    EXPECT_EQ(QUORNotifyTest(report, &heard), 3);
+    const std::string heard = tested();
     umask(mask);
-    EXPECT_EQ(QUORNotifyTest(nullptr, &heard), -1);
+    EXPECT_EQ(QUORNotifyTest(nullptr, nullptr), -1);
     EXPECT_EQ(std::filesystem::status(std::string(paths::kNotifySpool) + "/desktop.jsonl").permissions(),
               std::filesystem::perms{0600});
     EXPECT_NE(awaitLines(std::string(paths::kNotifySpool) + "/desktop.jsonl", 1)[0].find("1700000000"),
               std::string::npos);
-    EXPECT_EQ(heard, (Strings{"desktop ok", "webhook ok", "mail failed, cause"}));
+    EXPECT_TRUE(std::regex_match(heard, std::regex("desktop ok\nwebhook ok\nmail: .*; check address and port.*\n")))
+        << heard;
+    settings("webhook_url=\"http://127.0.0.1:" + server.port() + " x\"\n");
+    EXPECT_EQ(tested().substr(0, 25), "webhook 1 ok\nwebhook 2: t");
 }
 
 }  // namespace

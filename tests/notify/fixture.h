@@ -80,13 +80,14 @@ class Notify : public ::testing::Test {
         return QUORSysNotifySendNotificationCustomized(tag.c_str(), texts_.c_str(), filter_.c_str(), table.get(), 0);
     }
 
-    static constexpr size_t kSlots = 6;
+    static constexpr size_t kSlots = 8;
 
     // The workers' slots that are free, held as long as the result lives.
     static std::vector<Descriptor> takeSlots() {
         std::filesystem::create_directories(paths::kNotifySpool);
         std::vector<Descriptor> taken;
-        for (const char* name : {"desktop0", "desktop1", "webhook0", "webhook1", "mail0", "mail1"}) {
+        for (const char* name :
+             {"desktop0", "desktop1", "webhook0", "webhook1", "command0", "command1", "mail0", "mail1"}) {
             Descriptor slot(open((paths::kNotifySpool + std::string("/worker-") + name).c_str(),
                                  O_RDWR | O_CREAT | O_CLOEXEC, 0600));
             if (flock(slot.get(), LOCK_EX | LOCK_NB) == 0) {

@@ -1,4 +1,4 @@
-"""A mail or web server on loopback: servers.py smtp|smtp-starttls|smtp-tls|http MOOD FOLDER [CERTIFICATE KEY]
+"""A mail or web server on loopback: servers.py smtp|smtp-starttls|smtp-tls|http|https MOOD FOLDER [CERTIFICATE KEY]
 
 MOOD is good, slow (1.5 s before an answer), stuck (never answers) or refuse. Prints its port, ends with its standard
 input, and writes what real parsers made of each message to FOLDER/1, FOLDER/2 ... with the most sessions at a time, its
@@ -70,15 +70,16 @@ async def answer_http(reader, writer):
 async def main():
     loop = asyncio.get_running_loop()
     context, options = None, {}
-    if kind.startswith("smtp-"):
+    if len(sys.argv) > 4:
         context = ssl.SSLContext(ssl.PROTOCOL_TLS_SERVER)
         context.load_cert_chain(*sys.argv[4:6])
+    if kind.startswith("smtp-"):
         options = {"auth_required": True, "authenticator": login, "auth_require_tls": kind == "smtp-starttls"}
     if kind == "smtp-starttls":
         options.update(tls_context=context, require_starttls=True)
         context = None
-    if kind == "http":
-        server = await asyncio.start_server(answer_http, "127.0.0.1", 0)
+    if kind.startswith("http"):
+        server = await asyncio.start_server(answer_http, "127.0.0.1", 0, ssl=context)
     else:
         server = await loop.create_server(lambda: SMTP(Mails(), loop=loop, **options), "127.0.0.1", 0, ssl=context)
     print(server.sockets[0].getsockname()[1], end="", flush=True)

@@ -33,8 +33,9 @@ typedef struct QUORMAIL_tag {
     int verify;       /* 0: any certificate will do */
 } QUORMAIL;
 
-/* Delivers a test notice on every configured channel, past the filter and the queue, and waits for each. `report` hears
- * of each mail server, desktop and webhook: the channel's name, 1 or 0, and the cause of a failure (else empty). Their
+/* Delivers a test notice to the desktop, each webhook, the command and the mail server, past the filter and the queue,
+ * and waits for each. `report` hears of each: the channel's name, with a number where there are several ("webhook 2":
+ * in the order of the settings), 1 or 0, and the cause of a failure with what to do about it (else empty). Their
  * number, negative when the settings cannot be read. */
 int QUORNotifyTest(void (*report)(const char* channel, int ok, const char* detail, void* context), void* context);
 

@@ -13,8 +13,8 @@
 
 #include "base/numbers.h"
 #include "base/paths.h"
-#include "notification.h"
 #include "store/ask.h"
+#include "store/channels.h"
 #include "store/connections.h"
 #include "store/databasefile.h"
 #include "store/dates.h"
@@ -236,7 +236,7 @@ Finding lookAtNotices() {
                 "run as root to hear whether a channel is set up",
                 {}};
     }
-    const bool set = IsNotificationSet();
+    const bool set = store::IsChannelSet();
     return {"notices",
             set ? State::Good : State::Doubtful,
             set ? "a channel is set up" : "no channel is set up: matches of the rules are events only",

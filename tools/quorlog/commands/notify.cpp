@@ -28,6 +28,12 @@ void reportDelivery(const char* channel, int ok, const char* detail, void* conte
     deliveries.sink.row({channel, ok != 0 ? "sent" : "failed", detail});
 }
 
+int reportNoChannel() {
+    Complain(std::string("no channel for notices is set up in ") + paths::kSystemSettings +
+             ", so matches of the rules become events only; see quorinfo.conf(5)");
+    return kNothing;
+}
+
 int run(const OutputOptions& options) {
     Output out(STDOUT_FILENO);
     const auto sink = MakeSink(options.style(), {{"channel"}, {"outcome"}, {"cause"}}, out);
@@ -39,12 +45,15 @@ int run(const OutputOptions& options) {
     if (tried < 0) {
         throw Failure(std::string("cannot read ") + paths::kSystemSettings + "; create it and name the channels there");
     }
+    if (tried == 0) {
+        return reportNoChannel();
+    }
     sink->finish();
     if (deliveries.failed != 0) {
         throw Failure(std::to_string(deliveries.failed) + " of " + std::to_string(tried) +
                       " channels failed; correct their settings in " + paths::kSystemSettings);
     }
-    return tried == 0 ? ReportNothing(std::string("no channels are configured in ") + paths::kSystemSettings) : kDone;
+    return kDone;
 }
 
 }  // namespace
