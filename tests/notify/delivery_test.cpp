@@ -256,12 +256,11 @@ TEST_F(Delivery, AFailureIsTriedAgainUntilItIsGivenUp) {
 
     settings(mailTo(stuck.port()));
     ASSERT_EQ(send({{"%HOST%", "stuck"}}), 0);
-    const std::filesystem::directory_iterator processes("/proc");
     ASSERT_TRUE(Eventually([] {
         const std::filesystem::directory_iterator all("/proc");
         return std::any_of(begin(all), end(all), isCleanWorker);
     }));
-    for (const auto& process : processes) {
+    for (const auto& process : std::filesystem::directory_iterator("/proc")) {
         if (isCleanWorker(process)) {
             kill(std::stoi(process.path().filename()), SIGKILL);
         }
