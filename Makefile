@@ -5,7 +5,7 @@ FUZZ_SEED := 0
 KILLS := 5
 LOCK_SECONDS := 5
 
-.PHONY: run test bench check format tidy asan fuzz soak try-faults try-full-disk powerpc package package-powerpc try-package linking docs release install clean
+.PHONY: run test bench check format tidy asan fuzz soak try-faults try-recovery try-full-disk powerpc package package-powerpc try-package linking docs release install clean
 
 run:            ## start the real receiving chain on loopback and show what it received
 	scripts/install-deps.sh build run
@@ -78,6 +78,11 @@ try-faults:     ## the receiving chain under bursts, locks, KILLS kills and rest
 	scripts/install-deps.sh build run
 	scripts/build.sh run
 	scripts/try-faults.sh $(BUILD)/run $(KILLS) $(LOCK_SECONDS)
+
+try-recovery:   ## backups, restores, merges and compactions while messages arrive: every message stays, and is counted once
+	scripts/install-deps.sh build run
+	scripts/build.sh run
+	scripts/try-recovery.sh $(BUILD)/run
 
 try-full-disk:  ## the receiving chain on a small disk that fills up and is freed again (root)
 	scripts/install-deps.sh build run

@@ -1,12 +1,16 @@
 #include "store/databasefile.h"
 
+#include <fcntl.h>
+#include <sys/file.h>
 #include <sys/stat.h>
+#include <sys/statvfs.h>
 #include <unistd.h>
 
 #include <cerrno>
 #include <cstring>
 #include <filesystem>
 
+#include "store/ask.h"
 #include "store/denial.h"
 #include "store/failure.h"
 
@@ -47,6 +51,55 @@ std::string RequireLogDatabase(const std::string& path) {
 void RemoveCompanions(const std::string& path) {
     for (const char* companion : {"-wal", "-shm"}) {
         (void)unlink((path + companion).c_str());
+    }
+}
+
+std::string RequireReplaceable(const std::string& path) {
+    std::string absolute = AbsolutePath(path);
+    std::error_code failed;
+    const auto status = std::filesystem::symlink_status(absolute, failed);
+    if (std::filesystem::is_symlink(status)) {
+        throw Failure(absolute + " is a symbolic link; give the file that it leads to");
+    }
+    if (std::filesystem::exists(status) && !std::filesystem::is_regular_file(status)) {
+        throw Failure(absolute + " is not a file; give the path of a database", Cause::Missing);
+    }
+    return absolute;
+}
+
+uint64_t FreeBytes(const std::string& db) {
+    const std::vector<std::string> bytes =
+        Ask(db, "SELECT freelist_count * page_size AS bytes FROM pragma_freelist_count, pragma_page_size", "bytes");
+    return bytes.empty() ? 0 : ToUint64(bytes.front().c_str());
+}
+
+void RequireRoom(const std::string& folder, uint64_t bytes, const std::string& what, const std::string& advice) {
+    constexpr uint64_t kMega = uint64_t{1} << 20U;
+    struct statvfs volume {};
+    if (statvfs(folder.c_str(), &volume) != 0) {
+        throw Failure("cannot write to " + folder + ": " + strerror(errno) + "; " + advice);
+    }
+    const uint64_t left = static_cast<uint64_t>(volume.f_bavail) * volume.f_frsize;
+    if (left < bytes) {
+        throw Failure(what + " may take " + std::to_string(bytes / kMega + 1) + " MiB, and " + folder + " has only " +
+                          std::to_string(left / kMega) + " MiB left; " + advice,
+                      Cause::Other);
+    }
+}
+
+uint64_t WholeSizeOf(const std::string& path) {
+    return SizeOf(path) + SizeOf(path + "-wal");
+}
+
+FolderLock::FolderLock(const std::string& file) {
+    const std::string folder = std::filesystem::path(file).parent_path();
+    folder_ = Descriptor(open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+    if (!folder_) {
+        throw Failure("cannot read " + folder + ": " + strerror(errno) + "; run as a user who may", Cause::Denied);
+    }
+    if (flock(folder_.get(), LOCK_EX | LOCK_NB) != 0) {
+        throw Failure("another quorlog restores, merges or compacts in " + folder + "; try again when it has ended",
+                      Cause::Busy);
     }
 }
 

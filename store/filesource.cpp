@@ -150,6 +150,23 @@ class FileSource : public Source {
         }
     }
 
+    std::vector<IdRange> brought(uint64_t after) const override try {
+        const Connection connection = Connect(path_);
+        const Result result =
+            Execute(connection, path_,
+                    "SELECT first, last FROM store_merged WHERE last > " + Decimal(after) + " ORDER BY first");
+        std::vector<IdRange> ranges;
+        for (Row row(result.get()); row.next();) {
+            ranges.push_back({ToUint64(row["first"]), ToUint64(row["last"])});
+        }
+        return ranges;
+    } catch (const Failure& failure) {
+        if (failure.cause() != Cause::Missing) {
+            throw;
+        }
+        return {};  // only a database that rows were put into has the table
+    }
+
     // A database says who it is. One that does not is known by the number of its file and the time when that was made.
     std::string identity() const override {
         struct statx status = {};

@@ -7,6 +7,22 @@
 #include "store/failure.h"
 
 namespace quor::store {
+namespace {
+
+bool isBrought(const std::vector<IdRange>& ranges, uint64_t id) {
+    return std::any_of(ranges.begin(), ranges.end(),
+                       [id](const IdRange& range) { return range.first <= id && id <= range.last; });
+}
+
+// Behind the rows put there that begin right after `after`: there may be millions.
+uint64_t behind(const std::vector<IdRange>& ranges, uint64_t after) {
+    for (const IdRange& range : ranges) {
+        after = range.first <= after + 1 ? std::max(after, range.last) : after;
+    }
+    return after;
+}
+
+}  // namespace
 
 Follower::Follower(const Source& source, Selection selection)
     : source_(source), selection_(std::move(selection)), start_([](const std::string&) { return 0; }),
@@ -42,6 +58,11 @@ bool Follower::enter(const std::string& identity) {
     return true;
 }
 
+// Read after the newest id, so that a row that is looked at is known for what it is.
+std::vector<IdRange> Follower::broughtInto(const std::string& table) const {
+    return table == "logs" ? source_.brought(after_) : std::vector<IdRange>();
+}
+
 // Every row up to the newest is done with, whether the filter takes it or not. The file may have been replaced since
 // its identity was read: rows that are at hand are of the same collection when that is still there.
 uint64_t Follower::look(const RecordHandler& handler) {
@@ -50,21 +71,22 @@ uint64_t Follower::look(const RecordHandler& handler) {
         after_ = newest;  // rows that were put back from a copy may end before: what follows them is new
         return 0;
     }
+    const std::vector<IdRange> brought = broughtInto(selection_.table);
     Selection arrived = selection_;
     arrived.filter.conditions.attributes.push_back(IdCondition(SYSLOG_OP_AT_MOST, newest));
-    uint64_t reached = after_;
+    uint64_t reached = behind(brought, after_);
     bool first = true;
     bool same = true;
     const uint64_t rows = SelectAfter(source_, arrived, reached, [&](const Record& record) {
         same = first ? source_.identity() == identity_ : same;
         first = false;
-        if (same) {
+        if (same && !isBrought(brought, record.id)) {
             handler(record);
         }
     });
     same = first ? source_.identity() == identity_ : same;
     if (same) {
-        after_ = rows < kPiece ? newest : reached;
+        after_ = rows < kPiece ? std::max(newest, reached) : reached;
     }
     return same ? rows : 0;
 }

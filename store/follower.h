@@ -5,6 +5,7 @@
 #include <cstdint>
 #include <functional>
 #include <string>
+#include <vector>
 
 #include "store/selection.h"
 
@@ -25,7 +26,8 @@ class Follower {
 
     // Hands over the last `rows` (0: all) up to where it stands, oldest first.
     void last(uint64_t rows, const RecordHandler& handler) const;
-    // Hands over what has arrived since the last look, oldest first: one piece of it. Rows that
+    // Hands over what has arrived since the last look, oldest first: one piece of it. Rows that were put there from
+    // another database have not arrived. Rows that
     // took the place of those before (the database was removed and begun anew) are followed from their start; while a
     // new database has no table yet, or others lock it, nothing has arrived. False when there is no more for now.
     bool poll(const RecordHandler& handler);
@@ -37,6 +39,7 @@ class Follower {
   private:
     bool enter(const std::string& identity);
     uint64_t look(const RecordHandler& handler);
+    std::vector<IdRange> broughtInto(const std::string& table) const;
 
     const Source& source_;
     Selection selection_;

@@ -1,7 +1,6 @@
 #include "store/receiving.h"
 
 #include <fcntl.h>
-#include <sys/file.h>
 #include <sys/socket.h>
 #include <sys/un.h>
 
@@ -119,7 +118,11 @@ std::map<uint64_t, uint64_t> UdpDrops(unsigned port) {
 
 int FollowerProcess() {
     const Descriptor file(open(paths::kReceiverPid, O_RDONLY | O_CLOEXEC));
-    const bool runs = file && flock(file.get(), LOCK_SH | LOCK_NB) != 0;
+    struct flock held {};
+    held.l_type = F_RDLCK;
+    held.l_whence = SEEK_SET;
+    // Asked, not taken: a quorlogd that starts in this moment would take us for another one.
+    const bool runs = file && fcntl(file.get(), F_OFD_GETLK, &held) == 0 && held.l_type != F_UNLCK;
     return runs ? std::max(ToInt32(readFile(paths::kReceiverPid).c_str()), 0) : 0;  // others are groups to a signal
 }
 

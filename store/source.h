@@ -9,6 +9,7 @@
 #include <memory>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "store/filter.h"
 #include "store/record.h"
@@ -21,6 +22,12 @@ using GroupHandler = std::function<void(std::string_view name, uint64_t rows)>;
 struct Window {
     uint64_t limit = 0;  // 0: no limit
     uint64_t offset = 0;
+};
+
+// The ids from `first` to `last`.
+struct IdRange {
+    uint64_t first;
+    uint64_t last;
 };
 
 // Every question is answered from the state of that moment. One that cannot be answered throws a Failure.
@@ -44,6 +51,9 @@ class Source {
     virtual std::list<std::string> values(_SYSLOG_DB_ATTRI_tag attribute, const Window& window) const = 0;
     // Deletes the rows of table logs that meet all conditions: every row when there is none.
     virtual void remove(const Conditions& conditions) const = 0;
+
+    // Rows of table logs that were put there from another database and not received, as far as they end behind `after`.
+    virtual std::vector<IdRange> brought(uint64_t after) const = 0;
 
     // The name of this collection of rows: another one as soon as other rows have taken their place. Empty while there
     // is none to read.

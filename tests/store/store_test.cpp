@@ -5,8 +5,10 @@
 
 #include "store/ask.h"
 #include "store/context.h"
+#include "store/counted.h"
 #include "store/failure.h"
 #include "store/follower.h"
+#include "store/merge.h"
 #include "store/selection.h"
 #include "tests/support/testing.h"
 
@@ -219,6 +221,34 @@ TEST_F(Store, AFollowerSeesWhatArrivesAndWhatReplacesIt) {
     EXPECT_EQ(poll(follower), Ids{2});
     run("DROP TABLE logs");
     EXPECT_NE(failureOf([&] { poll(follower); }).find("missing: "), std::string::npos) << "the table was there";
+}
+
+TEST_F(Store, WhatWasPutThereHasNotArrived) {
+    const auto source = OpenSource(path_);
+    Follower follower(*source, {});
+    run("CREATE TABLE store_merged(first INTEGER PRIMARY KEY, last INTEGER)");
+    run("INSERT INTO store_merged VALUES(1, 20000), (20002, 20003), (20005, 20006)");
+    run("WITH RECURSIVE n(i) AS (SELECT 1 UNION ALL SELECT i + 1 FROM n WHERE i < 20006) INSERT INTO logs(id) SELECT i "
+        "FROM n");
+    EXPECT_EQ(poll(follower), (Ids{20001, 20004}));
+    EXPECT_EQ(NewestReceived(*source), 20004);
+    run("INSERT INTO logs(host) VALUES('a')");
+    EXPECT_EQ(poll(follower), Ids{20007});
+}
+
+TEST_F(Store, AMergeAddsWhatIsMissingOnceInTheOrderOfItsDates) {
+    const std::string other = folder_.path("other.db");
+    SqliteFile(other).run("CREATE TABLE logs(id INTEGER PRIMARY KEY, host TEXT, ldate TEXT, ltime, msg)");
+    SqliteFile(other).run(
+        "INSERT INTO logs(host, ldate, ltime, msg) VALUES('a', '2', '1', 5), ('a', '1', '1', x'00'), "
+        "('a', '1', '1', x'0001'), ('b', NULL, NULL, NULL), ('c', '1', '1', 'c'), ('c', '1', '1', 'c')");
+    run("INSERT INTO logs(host, ldate, ltime, msg) VALUES('c', '1', '1', 'c'), ('a', '2', '1', 5), ('d', '', '', '')");
+    const MergeProgress ignore = [](uint64_t /*part*/, uint64_t /*parts*/) {};
+    const Merged first = MergeRows(other, path_, ignore);
+    EXPECT_EQ(std::make_pair(first.added, first.there), std::make_pair(uint64_t{4}, uint64_t{2}));
+    EXPECT_EQ(MergeRows(other, path_, ignore).added, 0U);
+    EXPECT_EQ(Ask(path_, "SELECT quote(msg) AS msg FROM logs WHERE id > 3 ORDER BY id", "msg"),
+              (std::vector<std::string>{"NULL", "X'00'", "X'0001'", "'c'"}));
 }
 
 TEST_F(Store, FailuresSayWhyAndWhatToDo) {

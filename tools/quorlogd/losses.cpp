@@ -1,8 +1,10 @@
 #include "tools/quorlogd/losses.h"
 
 #include <syslog.h>
+#include <unistd.h>
 
 #include <cerrno>
+#include <cstdio>
 #include <cstring>
 #include <ctime>
 #include <fstream>
@@ -43,14 +45,20 @@ void Losses::load() {
     since_ = since.empty() ? 0 : static_cast<int64_t>(since.mapped());
 }
 
-// Where services keep what ends with the machine, as sockets do.
+// Where services keep what ends with the machine, as sockets do. Written after the announcement: when the process dies
+// in between, the loss is told twice, which is better than not at all. The file changes whole, so that no other moment
+// does.
 void Losses::save() const {
     std::ostringstream text;
     text << "since " << since_ << '\n';
     for (const auto& [who, count] : totals_) {
         text << who << ' ' << count << '\n';
     }
-    std::ofstream(kState) << text.str();  // without it a loss is told again
+    const std::string fresh = kState + ".new";
+    const bool written = static_cast<bool>(std::ofstream(fresh) << text.str() << std::flush);
+    if (!written || rename(fresh.c_str(), kState.c_str()) != 0) {
+        (void)unlink(fresh.c_str());
+    }
 }
 
 void Losses::lookAtUdp(Totals& totals) const {

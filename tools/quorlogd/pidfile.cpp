@@ -1,7 +1,6 @@
 #include "tools/quorlogd/pidfile.h"
 
 #include <fcntl.h>
-#include <sys/file.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -18,7 +17,10 @@ PidFile::PidFile(const std::string& path) : file_(open(path.c_str(), O_RDWR | O_
     if (!file_) {
         throw std::runtime_error("cannot write " + path + ": " + strerror(errno) + "; run as a user who may");
     }
-    if (flock(file_.get(), LOCK_EX | LOCK_NB) != 0) {
+    struct flock whole {};
+    whole.l_type = F_WRLCK;
+    whole.l_whence = SEEK_SET;
+    if (fcntl(file_.get(), F_OFD_SETLK, &whole) != 0) {
         throw std::runtime_error("another quorlogd is running; see " + path + " for its number");
     }
     // Who may read the logs may also see whether somebody follows them.

@@ -21,11 +21,14 @@ void AddRules(CLI::App& app, int& status);
 void AddNotify(CLI::App& app, int& status);
 void AddDb(CLI::App& app, int& status);
 void AddBackup(CLI::App& app, int& status);
+void AddRestore(CLI::App& app, int& status);
 void AddDoctor(CLI::App& app, int& status);
 void AddParse(CLI::App& app, int& status);
 
 // Below db.
 void AddDbCheck(CLI::App& db, int& status);
+void AddDbCompact(CLI::App& db, int& status);
+void AddDbMerge(CLI::App& db, int& status);
 void AddDbSalvage(CLI::App& db, int& status);
 
 // All of them, or the command of this name alone, when there is one: adding all takes longer than a search.

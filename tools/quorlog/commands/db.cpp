@@ -57,6 +57,24 @@ int runCreate(const DbOptions& options) {
     return kDone;
 }
 
+// The largest tables and indexes; nothing where SQLite cannot tell.
+std::string largestParts(const std::string& db) try {
+    std::string list;
+    for (const std::string& part :
+         store::Ask(db,
+                    "SELECT name || ' ' || pgsize AS part FROM dbstat WHERE aggregate = TRUE ORDER BY pgsize DESC "
+                    "LIMIT 3",
+                    "part")) {
+        list += (list.empty() ? "" : ", ") + part;
+    }
+    return list;
+} catch (const Failure& failure) {
+    if (failure.cause() != store::Cause::Missing) {
+        throw;
+    }
+    return "";
+}
+
 int runInfo(const DbOptions& options) {
     const auto source = store::OpenSource(options.db);
     const std::string& db = source->name();
@@ -70,6 +88,8 @@ int runInfo(const DbOptions& options) {
                 {{"path", db},
                  {"bytes", std::to_string(store::SizeOf(db)), Kind::Number},
                  {"wal_bytes", std::to_string(store::SizeOf(db + "-wal")), Kind::Number},
+                 {"free_bytes", std::to_string(store::FreeBytes(db)), Kind::Number},
+                 {"largest", largestParts(db)},
                  {"device", described ? info.device : ""},
                  {"logs", std::to_string(rows), Kind::Number},
                  {"oldest", rows == 0 ? "" : handle->DBInfoStartStrGet()},
@@ -100,6 +120,8 @@ void AddDb(CLI::App& app, int& status) {
     AddCommand<DbOptions>(db, "info", "Print the size, rows and dates of a log database", status, setupInfo, runInfo);
     AddCommand<DbOptions>(db, "checkpoint", "Move the write-ahead log into the database", status, setup, runCheckpoint);
     AddDbSalvage(db, status);
+    AddDbMerge(db, status);
+    AddDbCompact(db, status);
     AddDbCheck(db, status);
 }
 

@@ -1,8 +1,11 @@
 // doctor: what is wrong with receiving, following, space and notices, and what to do about it.
+#include <fcntl.h>
 #include <sys/stat.h>
 #include <sys/statvfs.h>
 #include <unistd.h>
 
+#include <algorithm>
+#include <array>
 #include <cerrno>
 #include <cstring>
 #include <ctime>
@@ -11,11 +14,13 @@
 #include <map>
 #include <optional>
 
+#include "base/files.h"
 #include "base/numbers.h"
 #include "base/paths.h"
 #include "store/ask.h"
 #include "store/channels.h"
 #include "store/connections.h"
+#include "store/counted.h"
 #include "store/databasefile.h"
 #include "store/dates.h"
 #include "store/receiving.h"
@@ -137,17 +142,16 @@ Finding lookAtTcp() {
     return finding;
 }
 
-// Nothing when it has never followed the database.
-std::optional<uint64_t> positionIn(const store::Source& source) {
-    const std::vector<std::string> found =
-        store::Ask(paths::kAccountingDb, "SELECT source || ' ' || last AS position FROM followed", "position");
-    const std::string begin = source.identity() + " ";
-    for (const std::string& position : found) {
-        if (position.rfind(begin, 0) == 0) {
-            return ToUint64(position.c_str() + begin.size());
-        }
+// Rows that were received and are not counted; those put there from another database never are.
+uint64_t rowsBehind(const store::Source& source, uint64_t position) {
+    const uint64_t newest = store::NewestReceived(source);
+    uint64_t behind = newest > position ? newest - position : 0;
+    for (const store::IdRange& range : source.brought(position)) {
+        const uint64_t first = std::max(range.first, position + 1);
+        const uint64_t last = std::min(range.last, newest);
+        behind -= last >= first ? std::min(behind, last - first + 1) : 0;
     }
-    return std::nullopt;
+    return behind;
 }
 
 // Before the first message it has no tables.
@@ -170,14 +174,13 @@ Finding lookAtFollower(const std::string& db) {
     if (isNew(db)) {
         return {"quorlogd", State::Good, "runs, and waits for the first message", "", {{"follower_up", 1}}};
     }
-    const std::optional<uint64_t> position = positionIn(*source);
-    const uint64_t newest = LargestId(*source, "logs");
-    const uint64_t behind = position && newest > *position ? newest - *position : 0;
-    const bool late = !position || behind > 50000;
+    const std::optional<uint64_t> position = store::CountedUpTo(*source);
+    const uint64_t behind = rowsBehind(*source, position.value_or(0));
+    const bool late = (!position && behind != 0) || behind > 50000;
     return {"quorlogd",
             late ? State::Doubtful : State::Good,
-            position ? "runs; " + Decimal(behind) + " rows are not written to its counts yet"
-                     : "runs, but has not counted this database yet",
+            position || !late ? "runs; " + Decimal(behind) + " rows are not written to its counts yet"
+                              : "runs, but has not counted this database yet",
             late ? "wait; if it stays so, see its messages in the system log" : "",
             {{"follower_up", 1}, {"rows_behind", behind}}};
 }
@@ -202,6 +205,58 @@ Finding lookAtRows(const store::Source& source, const std::string& db) {
             : age > 86400 ? "no message for a day: see that the devices send to this machine"
                           : "",
             {{"last_row_id", last.id}, {"last_row_seconds", static_cast<uint64_t>(std::max<int64_t>(second, 0))}}};
+}
+
+// Whether the header is one, and the file as long as it says. A checkpoint may just be making it longer.
+std::string wrongHeader(const std::string& db) {
+    constexpr size_t kHeader = 100;
+    constexpr useconds_t kMoment = 50000;
+    const Descriptor file(open(db.c_str(), O_RDONLY | O_CLOEXEC));
+    for (int tried = 0; tried < 2; ++tried) {
+        std::array<unsigned char, kHeader> header{};
+        if (ReadAt(file, 0, header.data(), kHeader) != kHeader || memcmp(header.data(), "SQLite format 3", 16) != 0) {
+            return store::SizeOf(db) == 0 ? "" : "its header is not that of a database";
+        }
+        const uint64_t pageSize = header[16] == 0 && header[17] == 1 ? 65536 : header[16] * 256U + header[17];
+        const uint64_t pages = ((header[28] * 256ULL + header[29]) * 256 + header[30]) * 256 + header[31];
+        if (pages * pageSize <= store::SizeOf(db)) {
+            return "";
+        }
+        (void)usleep(kMoment);
+    }
+    return "its file is shorter than its header says";
+}
+
+// Rows all over the table, each on a page of its own: few enough not to keep a slow disk busy.
+void readHereAndThere(const std::string& db) {
+    constexpr int kPlaces = 12;
+    const Connection connection = store::Connect(db);
+    for (int place = 0; place <= kPlaces; ++place) {
+        (void)store::Execute(
+            connection, db,
+            "SELECT * FROM logs WHERE id >= (SELECT min(id) FROM logs) + ((SELECT max(id) FROM logs) - "
+            "(SELECT min(id) FROM logs)) / " +
+                std::to_string(kPlaces) + " * " + std::to_string(place) + " ORDER BY id LIMIT 1");
+    }
+}
+
+Finding lookAtFile(const std::string& db) {
+    std::string wrong = wrongHeader(store::RequireLogDatabase(db));
+    try {
+        readHereAndThere(db);
+    } catch (const Failure& failure) {
+        if (failure.cause() == store::Cause::Damaged) {
+            wrong = failure.what();
+        } else if (failure.cause() != store::Cause::Missing) {
+            throw;
+        }
+    }
+    return {"database",
+            wrong.empty() ? State::Good : State::Bad,
+            wrong.empty() ? "its header and places all over it are sound; quorlog db check looks at everything"
+                          : wrong,
+            wrong.empty() ? "" : "quorlog db check --db " + db + " tells more",
+            {}};
 }
 
 Finding lookAtSpace(const std::string& db) {
@@ -258,6 +313,7 @@ std::vector<Finding> examine(const DoctorOptions& options) {
     std::vector<Finding> findings = {lookAtReceiver(options.control), lookAtUdp(), lookAtTcp()};
     findings.push_back(guarded("quorlogd", [&] { return lookAtFollower(db); }));
     findings.push_back(guarded("rows", [&] { return lookAtRows(*store::OpenSource(db), db); }));
+    findings.push_back(guarded("database", [&] { return lookAtFile(db); }));
     findings.push_back(lookAtSpace(db));
     findings.push_back(lookAtNotices());
     return findings;
