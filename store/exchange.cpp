@@ -154,7 +154,8 @@ void stamp(const std::string& draft, uint64_t counted) {
           std::string("INSERT OR REPLACE INTO store_identity VALUES (1, lower(hex(randomblob(16))))"),
           std::string("CREATE TABLE IF NOT EXISTS store_merged (first INTEGER PRIMARY KEY, last INTEGER NOT NULL)"),
           "DELETE FROM store_merged WHERE last <= " + last + " OR last > (SELECT ifnull(max(id), 0) FROM logs)",
-          "INSERT OR REPLACE INTO store_merged SELECT 1, " + last + " WHERE " + last + " > 0",
+          "INSERT OR REPLACE INTO store_merged SELECT 1, counted FROM (SELECT " + last +
+              " AS counted) WHERE counted > 0",
           std::string("PRAGMA journal_mode = WAL")}) {
         (void)Execute(connection, draft, sql);
     }

@@ -37,10 +37,19 @@ bool contains(const std::vector<StoredColumn>& columns, const std::string& name)
                        [&name](const StoredColumn& column) { return column.name == name; });
 }
 
+[[noreturn]] void failWithout(const std::string& db, const std::string& column) {
+    throw Failure("the logs of " + db + " have no column " + column + kAdvice, Cause::Missing);
+}
+
+[[noreturn]] void failWith(const std::string& from, const std::string& column, const std::string& into) {
+    throw Failure("the logs of " + from + " have a column " + column + " that " + into +
+                  " lacks; start syslog-ng once with the present configuration, or merge into a database that has it");
+}
+
 void requireColumns(const std::string& db, const std::vector<StoredColumn>& columns) {
     for (const char* name : {"\"ldate\"", "\"ltime\"", "\"host\"", "\"msg\""}) {
         if (!contains(columns, name)) {
-            throw Failure("the logs of " + db + " have no column " + name + kAdvice, Cause::Missing);
+            failWithout(db, name);
         }
     }
 }
@@ -53,9 +62,7 @@ std::vector<StoredColumn> sharedColumns(const std::string& from, const std::stri
     requireColumns(into, target);
     for (const StoredColumn& column : given) {
         if (!contains(target, column.name)) {
-            throw Failure("the logs of " + from + " have a column " + column.name + " that " + into +
-                          " lacks; start syslog-ng once with the present configuration, or merge into a database "
-                          "that has it");
+            failWith(from, column.name, into);
         }
     }
     std::vector<StoredColumn> shared;
@@ -122,8 +129,8 @@ class Merger {
 
     void split() const {
         pair_.run(std::string("CREATE TEMP TABLE parts AS SELECT min(at) AS first FROM (SELECT at, sum(bytes) OVER "
-                              "(ORDER BY at ROWS UNBOUNDED PRECEDING) / 33554432 AS part FROM (SELECT ") +
-                  kTime + " AS at, ifnull(length(msg), 0) + 300 AS bytes FROM other.logs)) GROUP BY part ORDER BY 1");
+                              "(ORDER BY at ROWS UNBOUNDED PRECEDING) / 67108864 AS part FROM (SELECT ") +
+                  kTime + " AS at, ifnull(length(msg), 0) + 200 AS bytes FROM other.logs)) GROUP BY part ORDER BY 1");
     }
 
     std::string within(uint64_t part) const {

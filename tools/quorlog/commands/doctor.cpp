@@ -253,8 +253,7 @@ Finding lookAtFile(const std::string& db) {
     }
     return {"database",
             wrong.empty() ? State::Good : State::Bad,
-            wrong.empty() ? "its header and places all over it are sound; quorlog db check looks at everything"
-                          : wrong,
+            wrong.empty() ? "its header and places all over it are sound; quorlog db check looks at everything" : wrong,
             wrong.empty() ? "" : "quorlog db check --db " + db + " tells more",
             {}};
 }
