@@ -44,9 +44,12 @@ constexpr Example kCommands[] = {
     {"quorlog db checkpoint", ""},
     {"quorlog db check", "--full"},
     {"quorlog db salvage", "syslog.db.corrupt saved.db"},
+    {"quorlog db merge", "saved.db"},
+    {"quorlog db compact", ""},
     {"quorlog db wal", ""},
     {"quorlog db limit", "2097152"},
     {"quorlog backup", "/srv/backup/syslog.db"},
+    {"quorlog restore", "/srv/backup/syslog.db"},
     {"quorlog doctor", ""},
     {"quorlog parse", "<entries"},
 };
