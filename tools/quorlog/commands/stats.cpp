@@ -14,6 +14,7 @@
 namespace quor::cli {
 namespace {
 
+constexpr size_t kWideTerminal = 60;
 constexpr int64_t kMostLines = 40;  // that a person gets without saying how long each is
 
 struct StatsOptions {
@@ -211,10 +212,11 @@ std::vector<std::string> textsOf(const store::Stretch& stretch, bool table) {
 void writeStretches(const std::vector<store::Stretch>& stretches, const Style& style, Output& out) {
     const bool table = style.format == Format::Table;
     const bool drawn = table && style.terminal;
-    Columns columns = {{"stamp", table ? Kind::Text : Kind::Number},
-                       {"logs", Kind::Number},
-                       {"seconds", Kind::Number},
-                       {"per_second", Kind::Number}};
+    const bool narrow = drawn && style.width < kWideTerminal;  // no room for the rates beside the bars
+    Columns columns = {{"stamp", table ? Kind::Text : Kind::Number}, {"logs", Kind::Number}};
+    if (!narrow) {
+        columns.insert(columns.end(), {{"seconds", Kind::Number}, {"per_second", Kind::Number}});
+    }
     if (drawn) {
         columns.push_back({"samples"});
     }
@@ -225,6 +227,9 @@ void writeStretches(const std::vector<store::Stretch>& stretches, const Style& s
     }
     for (const store::Stretch& stretch : stretches) {
         std::vector<std::string> texts = textsOf(stretch, table);
+        if (narrow) {
+            texts = {texts[0].substr(texts[0].find('-') + 1), texts[1]};  // nor for the year
+        }
         if (drawn) {
             texts.push_back(Bar(style, stretch.logs, largest));
         }
