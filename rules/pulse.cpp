@@ -9,7 +9,7 @@ constexpr int64_t kLeastPatience = 10 * kMinute;
 constexpr int64_t kRhythmMinutes = 30;  // heard in so many of them
 constexpr int64_t kForgotten = 7 * kDay;
 constexpr double kLeastLimit = 60;  // logs a minute that are never too many
-constexpr int64_t kRateHistory = 6 * 60 * kMinute;
+constexpr int64_t kRateHistory = kDay / 4;
 constexpr int64_t kMeanMinutes = kDay / kMinute;
 
 double kept(int64_t silence, int64_t forgotten) {

@@ -19,9 +19,9 @@ class Windows {
     // `count` logs whose seconds differ by less than `span`.
     Windows(int64_t count, int64_t span, size_t mostSeconds) : count_(count), span_(span), mostSeconds_(mostSeconds) {}
 
-    // One more log of the device in that second. True when it completes the count, which begins anew then. Logs that
-    // come a little late are put in their place; when the clock was set back, the count begins anew.
-    bool add(const std::string& device, int64_t second);
+    // One more log of the device of that name in that second. True when it completes the count, which begins anew then.
+    // Logs that come a little late are put in their place; when the clock was set back, the count begins anew.
+    bool add(const std::string& name, int64_t second);
     size_t seconds() const { return seconds_; }
 
   private:

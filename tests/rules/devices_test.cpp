@@ -171,7 +171,7 @@ TEST_F(Rates, AreToldOnceUntilTheyFall) {
     };
     flood(5000);
     EXPECT_EQ(told(), Strings()) << "nothing is known yet";
-    run(7 * 86400, {"a", "b"});
+    run(604800, {"a", "b"});
     EXPECT_EQ(told(), Strings());
     flood(50);
     run(60, {"a", "b"});
@@ -183,7 +183,7 @@ TEST_F(Rates, AreToldOnceUntilTheyFall) {
     EXPECT_EQ(told(), Strings{"loud a"});
     restart(true);
     flood(1000);
-    run(7 * 86400, {"a", "b"});
+    run(604800, {"a", "b"});
     EXPECT_EQ(told(), Strings()) << "held until it fell";
     flood(1000);
     run(20, {"a", "b"});

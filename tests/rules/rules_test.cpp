@@ -113,7 +113,7 @@ TEST(Matcher, NeedsEverythingThatIsGiven) {
         return Matcher(parsed("kind=match\n" + lines)).matches(Subject(record));
     };
     for (const char* lines : {"host=web*", "host=\"nas,web1\"", "program=sshd\nfacility=auth\nlevel=err", "level=info",
-                              "keyword=\"y=\"z\"\"", "keyword=\"for root\"\nignore-case=yes", "glob=\"Failed*ROOT\"",
+                              R"(keyword="y="z"")", "keyword=\"for root\"\nignore-case=yes", "glob=\"Failed*ROOT\"",
                               "not-host=\"web2,nas*\"", "keyword=Failed\nnot-keyword=root"}) {
         EXPECT_TRUE(meets(lines)) << lines;
     }

@@ -36,7 +36,7 @@ class RuleWatch {
   private:
     using Clock = std::chrono::steady_clock;
 
-    void apply(const std::vector<rules::Rule>& rules, AccountingManager& counted);
+    void apply(const std::vector<rules::Rule>& all, AccountingManager& counted);
     void load();
     void save(bool clean);
     void announce(const std::vector<rules::Report>& reports);

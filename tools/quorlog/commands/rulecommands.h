@@ -6,8 +6,8 @@
 
 namespace quor::cli {
 
-void AddRuleChanges(CLI::App& rules, int& status);
-void AddRuleTests(CLI::App& rules, int& status);
+void AddRuleChanges(CLI::App& parent, int& status);
+void AddRuleTests(CLI::App& parent, int& status);
 
 }  // namespace quor::cli
 
