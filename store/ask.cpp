@@ -29,7 +29,7 @@ Cause causeOf(int code) {
     }
 }
 
-const char* adviceFor(Cause cause) {
+const char* adviceFor(Cause cause, int code) {
     switch (cause) {
     case Cause::Missing:
         return "choose another --table or --db";
@@ -40,7 +40,7 @@ const char* adviceFor(Cause cause) {
     case Cause::Denied:
         return "make sure that you may read and write it and its folder";
     default:
-        return "see the system log";
+        return code == SQLITE_FULL ? "make room on its disk, and try again" : "see the system log";
     }
 }
 
@@ -64,8 +64,9 @@ Result Execute(const Connection& connection, const std::string& db, const std::s
                            : QUORDBSelectLimit(connection.get(), sql.c_str(), static_cast<uint32_t>(limit->limit),
                                                static_cast<uint32_t>(limit->offset), Adopt(result));
     if (status < 0) {
-        const Cause cause = causeOf(ErrorCode(connection.get()));
-        throw Failure(db + ": " + QUORDBErrorGet(connection.get()) + "; " + adviceFor(cause), cause);
+        const int code = ErrorCode(connection.get());
+        const Cause cause = causeOf(code);
+        throw Failure(db + ": " + QUORDBErrorGet(connection.get()) + "; " + adviceFor(cause, code), cause);
     }
     return result;
 }

@@ -231,7 +231,7 @@ TEST_F(Store, WhatWasPutThereHasNotArrived) {
     run("WITH RECURSIVE n(i) AS (SELECT 1 UNION ALL SELECT i + 1 FROM n WHERE i < 20006) INSERT INTO logs(id) SELECT i "
         "FROM n");
     EXPECT_EQ(poll(follower), (Ids{20001, 20004}));
-    EXPECT_EQ(NewestReceived(*source), 20004);
+    EXPECT_EQ(NewestReceived(*source), 20004U);
     run("INSERT INTO logs(host) VALUES('a')");
     EXPECT_EQ(poll(follower), Ids{20007});
 }

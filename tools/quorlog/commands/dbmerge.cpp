@@ -1,6 +1,7 @@
 // db merge.
 #include <unistd.h>
 
+#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
@@ -41,8 +42,10 @@ int run(const MergeOptions& options) {
     }
     const store::FolderLock alone(into);
     const std::string folder = std::filesystem::path(into).parent_path();
-    constexpr uint64_t kTemporary = uint64_t{256} << 20;
-    store::RequireRoom(folder, store::WholeSizeOf(from) + kTemporary, "the merge", "make room there");
+    constexpr uint64_t kMostTemporary = uint64_t{256} << 20;
+    const uint64_t size = store::WholeSizeOf(from);
+    const uint64_t temporary = std::min(kMostTemporary, 2 * (size + store::WholeSizeOf(into)));
+    store::RequireRoom(folder, size + temporary, "the merge", "make room there");
     (void)setenv("SQLITE_TMPDIR", folder.c_str(), 0);  // there is room for it, and /tmp may be memory
     const store::Merged merged = store::MergeRows(from, into, showProgress);
     const std::string rows = std::to_string(merged.added) + (merged.added == 1 ? " row" : " rows");
