@@ -7,6 +7,7 @@
 #include <string>
 
 #include "base/guarded.h"
+#include "platform/archive/table.h"
 #include "platform/db/quiet.h"
 
 namespace {
@@ -19,11 +20,6 @@ constexpr int kBusyMilliseconds = 3000;
 // connections restart the log at the same moment.
 constexpr int kCheckpointPages = 10000;
 
-// SQLite takes some relative names for a URI or a database in memory.
-std::string plainName(const char* path) {
-    return path[0] == '/' ? path : std::string("./") + path;
-}
-
 bool isFile(const char* path) {
     struct stat status {};
     return stat(path, &status) == 0 && S_ISREG(status.st_mode);
@@ -34,17 +30,24 @@ DBConnect_tag* connect(const char* path) {
     auto connection = std::make_unique<DBConnect_tag>();
     connection->quiet = quor::HoldQuiet(path);
     const bool quiet = static_cast<bool>(connection->quiet);
-    const std::string name = quiet ? quor::QuietName(path) : plainName(path);
+    const std::string name = quiet ? quor::QuietName(path) : quor::PlainName(path);
     const int mode = quiet ? SQLITE_OPEN_READONLY | SQLITE_OPEN_URI : SQLITE_OPEN_READWRITE;
     if (sqlite3_open_v2(name.c_str(), quor::Adopt(connection->db), mode | SQLITE_OPEN_NOMUTEX, nullptr) != SQLITE_OK) {
         return nullptr;
     }
     sqlite3_busy_timeout(connection->db.get(), kBusyMilliseconds);
     sqlite3_wal_autocheckpoint(connection->db.get(), kCheckpointPages);
+    if (quor::archive::IsArchive(connection->db.get())) {
+        (void)quor::archive::Register(connection->db.get());  // if that fails, so does every statement
+    }
     return connection.release();
 }
 
 }  // namespace
+
+std::string quor::PlainName(const char* path) {
+    return path[0] == '/' ? path : std::string("./") + path;
+}
 
 DBConnect_tag* QUORDBConnect(const char* /*host*/, const char* /*user*/, const char* /*password*/, const char* path) {
     if (path == nullptr || !isFile(path)) {
