@@ -35,7 +35,7 @@ set(CPACK_COMPONENT_TOOLS_DESCRIPTION "Log server on syslog-ng and SQLite
 set(CPACK_DEBIAN_LIBRARY_PACKAGE_NAME libquorsyslog${PROJECT_VERSION_MAJOR})
 set(CPACK_DEBIAN_LIBRARY_PACKAGE_SECTION libs)
 set(common_libraries "libc6 (>= 2.36), libgcc-s1, libstdc++6 (>= 12), libsqlite3-0 (>= 3.40)")
-set(CPACK_DEBIAN_LIBRARY_PACKAGE_DEPENDS "${common_libraries}, libjsoncpp25 (>= 1.9.5), sqlite3")
+set(CPACK_DEBIAN_LIBRARY_PACKAGE_DEPENDS "${common_libraries}, libjsoncpp25 (>= 1.9.5), libxxhash0 (>= 0.8), libzstd1 (>= 1.5), sqlite3")
 if(QUOR_WITH_CURL)
     string(APPEND CPACK_DEBIAN_LIBRARY_PACKAGE_DEPENDS ", libcurl4 (>= 7.88)")
 endif()

@@ -1,5 +1,5 @@
 #!/bin/sh
-# Builds what the PowerPC build links, from Debian's source packages: SQLite, JsonCpp, RE2, utf8proc, libcurl (with OpenSSL inside)
+# Builds what the PowerPC build links, from Debian's source packages: SQLite, JsonCpp, RE2, utf8proc, zstd, xxHash, libcurl (with OpenSSL inside)
 # and GoogleTest, and copies the headers of CLI11. The sources come from where this machine gets its packages.
 # Usage: build-powerpc-deps.sh FOLDER       result: FOLDER/prefix; nothing is done when this script has completed it
 set -eu
@@ -107,7 +107,7 @@ build_curl() {
 }
 
 write_sources
-fetch sqlite3 libjsoncpp utf8proc re2 openssl curl
+fetch sqlite3 libjsoncpp utf8proc re2 libzstd xxhash openssl curl
 (build_sqlite)
 build_re2
 (build_openssl)
@@ -115,6 +115,8 @@ build_curl
 build_with_cmake "$(echo "$folder"/src/libjsoncpp-*/)" -DBUILD_SHARED_LIBS=ON -DBUILD_STATIC_LIBS=OFF \
     -DBUILD_OBJECT_LIBS=OFF -DJSONCPP_WITH_TESTS=OFF -DJSONCPP_WITH_POST_BUILD_UNITTEST=OFF
 build_with_cmake "$(echo "$folder"/src/utf8proc-*/)" -DBUILD_SHARED_LIBS=ON
+build_with_cmake "$(echo "$folder"/src/libzstd-*/build/cmake/)" -DZSTD_BUILD_PROGRAMS=OFF -DZSTD_BUILD_STATIC=OFF
+build_with_cmake "$(echo "$folder"/src/xxhash-*/cmake_unofficial/)" -DXXHASH_BUILD_XXHSUM=OFF
 build_with_cmake /usr/src/googletest
 mkdir -p "$prefix/share/cmake"
 cp -R /usr/include/CLI "$prefix/include/"

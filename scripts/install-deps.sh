@@ -6,7 +6,7 @@ set -eu
 packages_of() {
     case "$1" in
     build) echo g++ cmake ninja-build pkg-config libsqlite3-dev sqlite3 libjsoncpp-dev \
-        libcurl4-openssl-dev libutf8proc-dev libre2-dev libcli11-dev ;;
+        libcurl4-openssl-dev libutf8proc-dev libre2-dev libcli11-dev libxxhash-dev libzstd-dev ;;
     run) echo syslog-ng-core syslog-ng-mod-sql libdbd-sqlite3 bsdutils procps python3 python3-aiosmtpd ;;
     test) echo libgtest-dev openssl ;;
     bench) echo libbenchmark-dev ;;

@@ -95,9 +95,9 @@ void prepareFile(sqlite3* db) {
 }
 
 void fillDates(const Storage& storage, QUORARCHIVE& report) {
-    const Statement query = Prepared(storage.db(), "SELECT min(value), max(value) FROM " +
-                                                       storage.table("logs_values") +
-                                                       " WHERE name = 'ldate' AND typeof(value) = 'text'");
+    const Statement query =
+        Prepared(storage.db(), "SELECT min(value), max(value) FROM " + storage.table("logs_values") +
+                                   " WHERE name = 'ldate' AND typeof(value) = 'text'");
     if (NextRow(storage.db(), query)) {
         (void)snprintf(report.firstDate, sizeof report.firstDate, "%s", TextOf(query, 0).c_str());
         (void)snprintf(report.lastDate, sizeof report.lastDate, "%s", TextOf(query, 1).c_str());
@@ -157,7 +157,8 @@ void extract(const std::string& archive, const std::string& fresh, QUORARCHIVE& 
         const Definition columns = ReadDefinition(db, "source");
         prepareFile(db);
         Run(db, "PRAGMA page_size = " + std::to_string(Remembered(source, "page_size")) + "; BEGIN");
-        AuditArchive(source, columns, [](uint64_t) {}, report);
+        AuditArchive(
+            source, columns, [](uint64_t) {}, report);
         CopyTables(db);
         CreateTable(db);
         const std::string names = WrittenNames(ReadDefinition(db, "main"));
@@ -173,8 +174,9 @@ void info(const std::string& archive, QUORARCHIVE& report) {
     requireArchive(archive);
     const File file(archive);
     const Storage storage(file.db(), "main");
-    const Statement query = Prepared(file.db(), "SELECT count(*), (SELECT min(id) FROM logs), (SELECT max(id) FROM logs)"
-                                                " FROM logs_blocks");
+    const Statement query =
+        Prepared(file.db(), "SELECT count(*), (SELECT min(id) FROM logs), (SELECT max(id) FROM logs)"
+                            " FROM logs_blocks");
     (void)NextRow(file.db(), query);
     report.rows = Remembered(storage, "rows");
     report.checksum = Remembered(storage, "checksum");

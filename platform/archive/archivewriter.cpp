@@ -51,7 +51,8 @@ void ArchiveWriter::addRow(sqlite3_stmt* row) {
         bytes += cells_[i].bytes.size();
         sum_.add(cells_[i]);
         if (cells_[i].bytes.size() > kLongestValue) {
-            throw Problem("row " + std::to_string(id) + " has a value of more than 16 MiB, which no archive takes; "
+            throw Problem("row " + std::to_string(id) +
+                          " has a value of more than 16 MiB, which no archive takes; "
                           "shorten or delete it");
         }
     }

@@ -19,8 +19,7 @@ std::string PartReader::read(Blob& blob, const char* table, const char* column, 
     sqlite3* const db = storage_.db();
     if (blob == nullptr || sqlite3_blob_reopen(blob.get(), key) != SQLITE_OK) {
         blob.reset();
-        const int status =
-            sqlite3_blob_open(db, storage_.schema().c_str(), table, column, key, 0, Adopt(blob));
+        const int status = sqlite3_blob_open(db, storage_.schema().c_str(), table, column, key, 0, Adopt(blob));
         Demand(status != SQLITE_ERROR, "a part of it is missing");
         requireReadable(db, status);
     }

@@ -112,7 +112,7 @@ ColumnHead TakeColumnHead(Bytes& bytes, size_t number, uint64_t rows, uint64_t& 
 
 void Widen(Range& range, const Cell& cell, bool first) {
     if (first) {
-        range.kind = cell.isText()                            ? Range::Kind::Texts
+        range.kind = cell.isText()                      ? Range::Kind::Texts
                      : cell.kind == Cell::Kind::Integer ? Range::Kind::Integers
                                                         : Range::Kind::Unknown;
     }

@@ -41,11 +41,11 @@ struct Range {
 
 struct ColumnHead {
     Encoding encoding = Encoding::Constant;
-    size_t same = 0;         // the column that it equals
-    Cell constant;           // of a Constant
-    size_t entries = 0;      // of a Dictionary
+    size_t same = 0;          // the column that it equals
+    Cell constant;            // of a Constant
+    size_t entries = 0;       // of a Dictionary
     bool dictionary = false;  // the values stand here, not with the rows
-    Entries values;          // if so
+    Entries values;           // if so
     Range range;
     uint64_t offset = 0;  // of the compressed bytes in the data of the block
     uint64_t size = 0;

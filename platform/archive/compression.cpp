@@ -25,8 +25,8 @@ Compressor::Compressor() : context_(ZSTD_createCCtx()) {
 size_t Compressor::append(std::string& out, std::string_view bytes) {
     const size_t before = out.size();
     out.resize(before + ZSTD_compressBound(bytes.size()));
-    const size_t size = ZSTD_compressCCtx(context_.get(), out.data() + before, out.size() - before, bytes.data(),
-                                          bytes.size(), kLevel);
+    const size_t size =
+        ZSTD_compressCCtx(context_.get(), out.data() + before, out.size() - before, bytes.data(), bytes.size(), kLevel);
     if (ZSTD_isError(size) != 0) {
         throw std::bad_alloc();  // there is room and the level is right: nothing else can be missing
     }

@@ -105,8 +105,9 @@ void FinishTable(sqlite3* db) {
         define(db, item.sql);
     }
     if (hasTable(db, "main", "sqlite_sequence")) {
-        Run(db, "DELETE FROM main.sqlite_sequence WHERE name = 'logs';"
-                "INSERT INTO main.sqlite_sequence SELECT 'logs', value FROM source.logs_archive WHERE name = 'sequence'");
+        Run(db,
+            "DELETE FROM main.sqlite_sequence WHERE name = 'logs';"
+            "INSERT INTO main.sqlite_sequence SELECT 'logs', value FROM source.logs_archive WHERE name = 'sequence'");
     }
     if (hasTable(db, "source", "logs_statistics")) {
         Run(db, "ANALYZE main.sqlite_schema;"

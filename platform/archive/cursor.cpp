@@ -18,9 +18,9 @@ void Cursor::ask(Question question) {
     }
     const Storage& storage = table_.storage;
     const std::optional<int64_t> start = storage.keyFor(question_.least);
-    heads_ = Prepared(storage.db(), "SELECT id, head FROM " + storage.table("logs_blocks") +
-                                        " WHERE id >= ?1 AND id <= ?2 ORDER BY id" +
-                                        (question_.descending ? " DESC" : ""));
+    heads_ =
+        Prepared(storage.db(), "SELECT id, head FROM " + storage.table("logs_blocks") +
+                                   " WHERE id >= ?1 AND id <= ?2 ORDER BY id" + (question_.descending ? " DESC" : ""));
     sqlite3_bind_int64(heads_.get(), 1, start.value_or(question_.least));
     sqlite3_bind_int64(heads_.get(), 2, question_.most);
     nextBlock();
@@ -104,9 +104,9 @@ void Cursor::column(sqlite3_context* context, size_t number) {
 
 void Cursor::askForValues(size_t column, int number) {
     const Storage& storage = table_.storage;
-    values_ = Prepared(storage.db(), "SELECT value, rows FROM " + storage.table("logs_values") +
-                                         " WHERE name = ?1 ORDER BY value" +
-                                         ((number & kDescending) != 0 ? " DESC" : ""));
+    values_ =
+        Prepared(storage.db(), "SELECT value, rows FROM " + storage.table("logs_values") +
+                                   " WHERE name = ?1 ORDER BY value" + ((number & kDescending) != 0 ? " DESC" : ""));
     const std::string& name = table_.shape.columns[column].name;
     sqlite3_bind_text64(values_.get(), 1, name.data(), name.size(), SQLITE_STATIC, SQLITE_UTF8);
     once_ = (number & kDistinctOnly) != 0;
@@ -120,7 +120,8 @@ void Cursor::nextValue() {
         return;
     }
     ended_ = !NextRow(table_.storage.db(), values_);
-    repeats_ = once_ || ended_ ? 1 : static_cast<uint64_t>(std::max<int64_t>(sqlite3_column_int64(values_.get(), 1), 1));
+    repeats_ =
+        once_ || ended_ ? 1 : static_cast<uint64_t>(std::max<int64_t>(sqlite3_column_int64(values_.get(), 1), 1));
 }
 
 }  // namespace quor::archive

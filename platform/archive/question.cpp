@@ -40,9 +40,8 @@ bool mayMeet(const Term& term, const Range& range) {
     switch (term.how) {
     case Compared::Equal:
     case Compared::Among:
-        return std::any_of(term.values.begin(), term.values.end(), [&](const std::string& value) {
-            return range.leastText <= value && reaches(value);
-        });
+        return std::any_of(term.values.begin(), term.values.end(),
+                           [&](const std::string& value) { return range.leastText <= value && reaches(value); });
     case Compared::Below:
     case Compared::AtMost:
         return range.leastText <= term.values.front();

@@ -169,8 +169,8 @@ std::string TextOfGlob(std::string_view pattern) {
         return {};
     }
     const std::string_view text = pattern.substr(1, pattern.size() - 2);
-    const bool plain = std::none_of(text.begin(), text.end(),
-                                    [](char c) { return isSpecial(c) || static_cast<uint8_t>(c) >= 0x80; });
+    const bool plain =
+        std::none_of(text.begin(), text.end(), [](char c) { return isSpecial(c) || static_cast<uint8_t>(c) >= 0x80; });
     return plain ? std::string(text) : std::string();
 }
 

@@ -12,17 +12,17 @@ extern "C" {
 #pragma GCC visibility push(default)
 
 typedef struct QUORARCHIVE_tag {
-    unsigned long long rows;          /* of table logs, in sound blocks */
-    unsigned long long blocks;        /* damaged ones among them */
+    unsigned long long rows;   /* of table logs, in sound blocks */
+    unsigned long long blocks; /* damaged ones among them */
     unsigned long long damagedBlocks;
-    unsigned long long damagedRows;   /* in damaged blocks, as far as that is known */
-    unsigned long long bytes;         /* of the file */
-    unsigned long long checksum;      /* of all rows, whatever their order */
-    long long firstId;                /* 0 when there is no row */
+    unsigned long long damagedRows; /* in damaged blocks, as far as that is known */
+    unsigned long long bytes;       /* of the file */
+    unsigned long long checksum;    /* of all rows, whatever their order */
+    long long firstId;              /* 0 when there is no row */
     long long lastId;
-    char firstDate[16];               /* smallest and largest ldate; empty when unknown */
+    char firstDate[16]; /* smallest and largest ldate; empty when unknown */
     char lastDate[16];
-    char error[1024];                 /* why it failed, and what to do */
+    char error[1024]; /* why it failed, and what to do */
 } QUORARCHIVE;
 
 /* Called from time to time with the rows done so far and their number; nonzero gives up. */

@@ -19,7 +19,7 @@ struct Command {
 constexpr Command kCommands[] = {
     {"search", AddSearch}, {"count", AddCount},     {"delete", AddDelete}, {"values", AddValues}, {"names", AddNames},
     {"stats", AddStats},   {"events", AddEvents},   {"rules", AddRules},   {"notify", AddNotify}, {"db", AddDb},
-    {"backup", AddBackup}, {"restore", AddRestore}, {"doctor", AddDoctor}, {"parse", AddParse},
+    {"backup", AddBackup}, {"restore", AddRestore}, {"archive", AddArchive}, {"doctor", AddDoctor}, {"parse", AddParse},
 };
 
 }  // namespace

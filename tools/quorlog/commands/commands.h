@@ -22,6 +22,7 @@ void AddNotify(CLI::App& app, int& status);
 void AddDb(CLI::App& app, int& status);
 void AddBackup(CLI::App& app, int& status);
 void AddRestore(CLI::App& app, int& status);
+void AddArchive(CLI::App& app, int& status);
 void AddDoctor(CLI::App& app, int& status);
 void AddParse(CLI::App& app, int& status);
 

@@ -3,6 +3,7 @@
 
 namespace quor::cli {
 
+void AddArchive(CLI::App& /*app*/, int& /*status*/) {}
 void AddNotify(CLI::App& /*app*/, int& /*status*/) {}
 void AddDbSalvage(CLI::App& /*db*/, int& /*status*/) {}
 
