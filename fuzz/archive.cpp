@@ -22,7 +22,7 @@ std::string soundArchive() {
         db,
         "CREATE TABLE logs (id INTEGER PRIMARY KEY, msg TEXT, host TEXT, utcsec INTEGER, pid TEXT, other);"
         "WITH RECURSIVE n(i) AS (SELECT 1 UNION ALL SELECT i + 1 FROM n WHERE i < 9000) INSERT INTO logs SELECT "
-        "i * 2 - i % 3, 'a message of some length ' || i, 'host' || i % 5, i * 7, hex(i * 31), iif(i % 3, i, 'x')"
+        "i * 2 - i % 3, 'a message of some length ' || i, 'host' || (i % 5), i * 7, hex(i * 31), iif(i % 3, i, 'x')"
         " FROM n",
         nullptr, nullptr, nullptr);
     sqlite3_close(db);

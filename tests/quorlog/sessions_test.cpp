@@ -65,9 +65,9 @@ TEST_P(Session, PrintsWhatIsWritten) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Quorlog, Session,
-                         testing::Values("archives", "columns", "completion", "context", "daemon", "databases", "events",
-                                         "failures", "forms", "help", "pager", "parse", "recovery", "rules", "search",
-                                         "statistics", "terminal", "usage"),
+                         testing::Values("archives", "columns", "completion", "context", "daemon", "databases",
+                                         "events", "failures", "forms", "help", "pager", "parse", "recovery", "rules",
+                                         "search", "statistics", "terminal", "usage"),
                          [](const auto& test) { return test.param; });
 
 }  // namespace

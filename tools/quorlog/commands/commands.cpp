@@ -17,8 +17,8 @@ struct Command {
 
 // In the order in which help names them.
 constexpr Command kCommands[] = {
-    {"search", AddSearch}, {"count", AddCount},     {"delete", AddDelete}, {"values", AddValues}, {"names", AddNames},
-    {"stats", AddStats},   {"events", AddEvents},   {"rules", AddRules},   {"notify", AddNotify}, {"db", AddDb},
+    {"search", AddSearch}, {"count", AddCount},     {"delete", AddDelete},   {"values", AddValues}, {"names", AddNames},
+    {"stats", AddStats},   {"events", AddEvents},   {"rules", AddRules},     {"notify", AddNotify}, {"db", AddDb},
     {"backup", AddBackup}, {"restore", AddRestore}, {"archive", AddArchive}, {"doctor", AddDoctor}, {"parse", AddParse},
 };
 
