@@ -24,26 +24,26 @@ std::string BytesOf(const BlockHead& head) {
     return all + bytes;
 }
 
-BlockHead ReadBlockHead(std::string_view all, size_t columns) {
-    Bytes bytes(all);
-    Demand(bytes.fixed() == Checksum(bytes.left()), "its head has another checksum");
+BlockHead ReadBlockHead(std::string_view bytes, size_t columns) {
+    Bytes left(bytes);
+    Demand(left.fixed() == Checksum(left.left()), "its head has another checksum");
     BlockHead head;
-    head.rows = bytes.numberUpTo(kMostRows);
-    head.first = bytes.signedNumber();
-    head.last = bytes.signedNumber();
+    head.rows = left.numberUpTo(kMostRows);
+    head.first = left.signedNumber();
+    head.last = left.signedNumber();
     Demand(head.rows > 0 && head.first <= head.last &&
                static_cast<uint64_t>(head.last) - static_cast<uint64_t>(head.first) >= head.rows - 1,
            "it has no such rows");
     uint64_t offset = 0;
-    head.ids = TakeColumnHead(bytes, 0, head.rows, offset);
+    head.ids = TakeColumnHead(left, 0, head.rows, offset);
     for (size_t i = 0; i < columns; ++i) {
-        head.columns.push_back(TakeColumnHead(bytes, i, head.rows, offset));
+        head.columns.push_back(TakeColumnHead(left, i, head.rows, offset));
     }
-    const uint64_t bloomColumn = bytes.numberUpTo(columns);
+    const uint64_t bloomColumn = left.numberUpTo(columns);
     head.bloomColumn = bloomColumn != 0 ? static_cast<size_t>(bloomColumn - 1) : SIZE_MAX;
-    head.bloomSize = bytes.numberUpTo(kLargestBloom);
-    head.bloomChecksum = bytes.fixed();
-    Demand(bytes.left().empty(), "its head is too long");
+    head.bloomSize = left.numberUpTo(kLargestBloom);
+    head.bloomChecksum = left.fixed();
+    Demand(left.left().empty(), "its head is too long");
     return head;
 }
 

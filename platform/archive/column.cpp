@@ -20,15 +20,16 @@ bool keepCell(Keepsake& keepsake, Cell& cell) {
 
 const std::string* Keepsake::keep(std::string_view text) {
     constexpr size_t kRoom = size_t{1} << 20U;
+    constexpr size_t kOverhead = sizeof(std::string);
     std::string own(text);
     const auto found = texts_.find(own);
     if (found != texts_.end()) {
         return &*found;
     }
-    if (text.size() + sizeof own > kRoom - bytes_) {
+    if (text.size() + kOverhead > kRoom - bytes_) {
         return nullptr;
     }
-    bytes_ += text.size() + sizeof own;
+    bytes_ += text.size() + kOverhead;
     return &*texts_.insert(std::move(own)).first;
 }
 
