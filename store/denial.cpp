@@ -14,7 +14,7 @@ namespace {
 // The first of the folders that lead to a file which lets nobody like us through, or else the file.
 std::string refusing(const std::string& path) {
     for (size_t slash = path.find('/', 1); slash != std::string::npos; slash = path.find('/', slash + 1)) {
-        const std::string folder = path.substr(0, slash);
+        std::string folder = path.substr(0, slash);
         if (access(folder.c_str(), X_OK) != 0) {
             return folder;
         }
