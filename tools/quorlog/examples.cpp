@@ -81,7 +81,8 @@ constexpr Example kOptions[] = {
     {"--limit", "100"},
     {"--offset", "100"},
     {"--before", "12345"},
-    {"--interval", "5"},
+    {"--interval", "5m"},
+    {"search --interval", "5"},
     {"--columns", "time,host,message"},
     {"--context", "3"},
     {"--before-context", "3"},
@@ -119,8 +120,9 @@ std::string ExampleOfCommand(std::string_view command) {
     return joined(find(std::begin(kCommands), std::end(kCommands), command));
 }
 
-std::string ExampleOfOption(std::string_view option) {
-    return joined(find(std::begin(kOptions), std::end(kOptions), option));
+std::string ExampleOfOption(const std::string& command, const std::string& option) {
+    const Example* ofCommand = find(std::begin(kOptions), std::end(kOptions), command + " " + option);
+    return joined(ofCommand != nullptr ? ofCommand : find(std::begin(kOptions), std::end(kOptions), option));
 }
 
 }  // namespace quor::cli

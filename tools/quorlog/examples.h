@@ -10,8 +10,9 @@ namespace quor::cli {
 // `command`: as "quorlog db check". The whole line; empty when there is none.
 std::string ExampleOfCommand(std::string_view command);
 
-// `option`: as "--host". The option with a value; empty when there is none.
-std::string ExampleOfOption(std::string_view option);
+// `command`: as "db check"; `option`: as "--host". The option with a value, after the command where others take another
+// form of it; empty when there is none.
+std::string ExampleOfOption(const std::string& command, const std::string& option);
 
 }  // namespace quor::cli
 

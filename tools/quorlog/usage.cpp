@@ -104,7 +104,7 @@ std::string namesOf(const CLI::App& app) {
 
 // The last part of a message. An option that has no example has its command's help.
 std::string example(const Place& place, const std::string& option) {
-    const std::string line = option.empty() ? ExampleOfCommand(place.path) : ExampleOfOption(option);
+    const std::string line = option.empty() ? ExampleOfCommand(place.path) : ExampleOfOption(nameOf(place), option);
     return line.empty() ? "; see " + place.path + " --help" : "; for example: " + line;
 }
 
