@@ -32,7 +32,7 @@ Cause causeOf(int code) {
 const char* adviceFor(Cause cause, int code) {
     switch (cause) {
     case Cause::Missing:
-        return "choose another --table or --db";
+        return "choose another --table or --db; table logs comes with the first message";
     case Cause::Damaged:
         return "run quorlog db check on it";
     case Cause::Busy:
