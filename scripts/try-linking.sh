@@ -18,7 +18,7 @@ cmake --build "$folder/static-user"
 
 mkdir -p "$folder/libraries"
 g++ -shared -Wl,-soname,libquordb.so -Wl,--whole-archive "$folder/static/platform/libquorplatform.a" \
-    -Wl,--no-whole-archive -lsqlite3 -o "$folder/libraries/libquordb.so"
+    -Wl,--no-whole-archive -lsqlite3 -lzstd -lxxhash -o "$folder/libraries/libquordb.so"
 for library in quorcore quornotify; do
     echo | g++ -shared -x c++ - -Wl,-soname,lib$library.so -o "$folder/libraries/lib$library.so"
 done

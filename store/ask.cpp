@@ -40,7 +40,9 @@ const char* adviceFor(Cause cause, int code) {
     case Cause::Denied:
         return "make sure that you may read and write it and its folder";
     default:
-        return code == SQLITE_FULL ? "make room on its disk, and try again" : "see the system log";
+        return code == SQLITE_FULL    ? "make room on its disk, and try again"
+               : code == SQLITE_IOERR ? "check its disk; quorlog archive extract saves the sound rows of an archive"
+                                      : "see the system log";
     }
 }
 

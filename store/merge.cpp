@@ -222,6 +222,20 @@ void RequireSoundLogs(const std::string& db) {
     (void)Ask(db, "SELECT id FROM logs LIMIT 1", "id");
 }
 
+void RequireWritableLogs(const std::string& db) {
+    const Connection connection = Connect(db);
+    (void)Execute(connection, db, "BEGIN");
+    try {
+        requireColumns(db, StoredColumns(db));
+        (void)Execute(connection, db,
+                      "INSERT INTO logs (ldate, ltime, host, msg) VALUES ('', '', '', ''), ('', '', '', '')");
+    } catch (const Failure& failure) {
+        throw Failure("syslog-ng could not write to the logs of that database" + kAdvice + " or a backup of one",
+                      failure.cause());
+    }
+    (void)Execute(connection, db, "ROLLBACK");
+}
+
 Merged MergeRows(const std::string& from, const std::string& into, const MergeProgress& progress) {
     RequireSoundLogs(from);
     RequireTable(into, "logs");

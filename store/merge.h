@@ -35,6 +35,9 @@ std::vector<StoredColumn> StoredColumns(const std::string& db);
 // Failure unless `db` is sound and its logs are a plain table.
 void RequireSoundLogs(const std::string& db);
 
+// Failure unless its logs take two equal messages. `db` is a copy that nobody reads; it is left as it was.
+void RequireWritableLogs(const std::string& db);
+
 }  // namespace quor::store
 
 #endif

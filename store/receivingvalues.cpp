@@ -2,12 +2,12 @@
 
 #include <algorithm>
 #include <filesystem>
-#include <fstream>
 #include <functional>
 #include <set>
 #include <string_view>
 
 #include "base/numbers.h"
+#include "base/textfile.h"
 #include "base/words.h"
 
 namespace quor::store {
@@ -28,14 +28,16 @@ std::set<std::string> valueFiles(const std::string& folder) {
 
 // A line reads @define NAME "VALUE".
 void eachDefinition(const std::string& file, const std::function<void(const std::string&, const std::string&)>& take) {
-    std::ifstream lines(file);
-    for (std::string line; std::getline(lines, line);) {
+    constexpr size_t kMostBytes = 1U << 20U;
+    std::string text;
+    (void)ReadTextFile(file, kMostBytes, text);
+    EachWord(text, "\n", [&](std::string_view line) {
         std::vector<std::string> words;
         EachWord(line, " \t\r\"'", [&](std::string_view word) { words.emplace_back(word); });
         if (words.size() >= 3 && words[0] == "@define") {
             take(words[1], words[2]);
         }
-    }
+    });
 }
 
 void set(uint16_t& port, const std::string& value) {

@@ -26,7 +26,7 @@ class File {
         if (handle_ == nullptr) {
             throw Problem("cannot open " + path + "; make sure that it is there and that you may read it");
         }
-        Require(db(), Register(db()));
+        Require(db(), Register(db(), Damage::IsLeftOut));
     }
     sqlite3* db() const { return handle_->db.get(); }
 
@@ -106,11 +106,16 @@ void fillDates(const Storage& storage, QUORARCHIVE& report) {
 
 void audit(const File& file, const Teller& tell, QUORARCHIVE& report) {
     const Storage storage(file.db(), "main");
+    const Statement pages = Prepared(file.db(), "PRAGMA quick_check(1)");
+    if (!NextRow(file.db(), pages) || TextOf(pages, 0) != "ok") {
+        throw Problem("its pages are damaged (" + TextOf(pages, 0) + "); restore the archive from a copy");
+    }
     AuditArchive(storage, ReadDefinition(file.db(), "main"), tell, report);
     fillDates(storage, report);
     if (report.damagedBlocks != 0) {
         throw Problem(std::to_string(report.damagedBlocks) + " of " + std::to_string(report.blocks) +
-                      " blocks are damaged; searches leave their rows out: restore the archive from a copy");
+                      " blocks are damaged; restore the archive from a copy, or save the other rows with quorlog "
+                      "archive extract");
     }
     if (report.rows != Remembered(storage, "rows") || report.checksum != Remembered(storage, "checksum")) {
         throw Problem("the rows are not those that were written; restore the archive from a copy");
@@ -159,6 +164,7 @@ void extract(const std::string& archive, const std::string& fresh, QUORARCHIVE& 
         Run(db, "PRAGMA page_size = " + std::to_string(Remembered(source, "page_size")) + "; BEGIN");
         AuditArchive(
             source, columns, [](uint64_t) {}, report);
+        report.damagedRows = std::max<uint64_t>(Remembered(source, "rows"), report.rows) - report.rows;
         CopyTables(db);
         CreateTable(db);
         const std::string names = WrittenNames(ReadDefinition(db, "main"));
@@ -216,8 +222,10 @@ int reported(QUORARCHIVE* report, const Body& body) {
         body(out);
         return 0;
     } catch (const Refused& refusal) {
-        (void)snprintf(out.error, sizeof out.error, "%s; look at the space left and the rights of both files",
-                       refusal.what());
+        const bool damaged = refusal.status() == SQLITE_CORRUPT || refusal.status() == SQLITE_NOTADB;
+        (void)snprintf(out.error, sizeof out.error, "%s; %s", refusal.what(),
+                       damaged ? "restore the archive from a copy"
+                               : "look at the space left and the rights of both files");
     } catch (const std::bad_alloc&) {
         (void)snprintf(out.error, sizeof out.error, "out of memory");
     } catch (const std::exception& problem) {

@@ -34,7 +34,7 @@ void Cursor::next() {
     }
 }
 
-// A damaged block costs its own rows.
+// A search that left rows out would look whole.
 void Cursor::nextBlock() {
     sqlite3* const db = table_.storage.db();
     while (NextRow(db, heads_)) {
@@ -44,7 +44,10 @@ void Cursor::nextBlock() {
                 return;
             }
         } catch (const Damaged& damage) {
-            table_.report(key, damage.what());
+            if (table_.damage == Damage::Fails) {
+                throw Damaged("the block of the ids from " + std::to_string(key) + " on is damaged (" + damage.what() +
+                              ")");
+            }
         }
     }
     heads_.reset();

@@ -1,7 +1,6 @@
 #include "platform/archive/draft.h"
 
 #include <fcntl.h>
-#include <sys/file.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -28,18 +27,16 @@ Draft::Draft(std::string target, const std::string& like) : target_(std::move(ta
     if (lstat(target_.c_str(), &there) == 0) {
         throw Problem(target_ + " exists already; name another file, or move it away");
     }
-    Descriptor file(open(path_.c_str(), O_RDWR | O_CREAT | O_NOFOLLOW | O_CLOEXEC, 0600));
-    if (!file) {
+    file_ = Descriptor(open(path_.c_str(), O_RDWR | O_CREAT | O_EXCL | O_CLOEXEC, 0600));
+    if (!file_ && errno == EEXIST) {
+        throw Problem(path_ +
+                      " exists already; another program writes it, or it is left of an earlier try: remove it then");
+    }
+    if (!file_) {
         fail("create");
     }
-    if (flock(file.get(), LOCK_EX | LOCK_NB) != 0) {
-        throw Problem("another program is writing " + path_ + "; wait until it has ended");
-    }
-    (void)fchown(file.get(), status.st_uid, status.st_gid);  // allowed to root only
-    if (ftruncate(file.get(), 0) != 0 || fchmod(file.get(), status.st_mode & 0666U) != 0) {
-        fail("write");
-    }
-    file_ = std::move(file);
+    (void)fchown(file_.get(), status.st_uid, status.st_gid);  // allowed to root only
+    (void)fchmod(file_.get(), status.st_mode & 0666U);        // a file system without rights
 }
 
 Draft::~Draft() {

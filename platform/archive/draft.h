@@ -15,7 +15,7 @@ class Problem : public std::runtime_error {
     using std::runtime_error::runtime_error;
 };
 
-// Only one process at a time writes the file of a name; what another one left of it is written over.
+// Nothing that is there is written over.
 class Draft {
   public:
     // With the rights of the file `like`. Throws Problem.

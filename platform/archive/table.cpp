@@ -1,7 +1,6 @@
 #include "platform/archive/table.h"
 
 #include <sys/types.h>
-#include <syslog.h>
 
 #include <cstring>
 #include <new>
@@ -65,6 +64,8 @@ std::vector<std::string> namesOf(const Shape& shape) {
 
 // ---- what SQLite calls
 
+constexpr char kLeftOut = 0;  // its address tells a connection that goes on behind damaged blocks
+
 Table& tableOf(sqlite3_vtab* table) {
     return *static_cast<Table*>(table);
 }
@@ -88,6 +89,9 @@ int guarded(char** message, const Body& body) {
     } catch (const Refused& refusal) {
         setMessage(message, refusal.what());
         return refusal.status();
+    } catch (const Damaged& damage) {
+        setMessage(message, damage.what());
+        return SQLITE_IOERR_DATA;  // what is called corrupt is moved out of the way, as if it were being written
     } catch (const std::exception& problem) {
         setMessage(message, problem.what());
         return SQLITE_ERROR;
@@ -99,13 +103,13 @@ int guarded(sqlite3_vtab* table, const Body& body) {
     return guarded(&table->zErrMsg, body);
 }
 
-int xConnect(sqlite3* db, void* /*context*/, int count, const char* const* words, sqlite3_vtab** table, char** error) {
+int xConnect(sqlite3* db, void* damage, int count, const char* const* words, sqlite3_vtab** table, char** error) {
     return guarded(error, [&] {
         std::string columns;
         Shape shape = readShape(count, words, columns);
         Require(db, sqlite3_declare_vtab(db, ("CREATE TABLE x(" + columns + ")").c_str()));
         Require(db, sqlite3_vtab_config(db, SQLITE_VTAB_INNOCUOUS));  // it reads tables of its own, and nothing else
-        *table = new Table(db, words[1], std::move(shape));
+        *table = new Table(db, words[1], std::move(shape), damage == &kLeftOut ? Damage::IsLeftOut : Damage::Fails);
     });
 }
 
@@ -234,8 +238,8 @@ constexpr sqlite3_module kMethods = makeModule();
 
 }  // namespace
 
-Table::Table(sqlite3* db, const std::string& schema, Shape columns)
-    : sqlite3_vtab(), storage(db, schema), shape(std::move(columns)), remover(storage, namesOf(shape)) {}
+Table::Table(sqlite3* db, const std::string& schema, Shape columns, Damage found)
+    : sqlite3_vtab(), storage(db, schema), shape(std::move(columns)), remover(storage, namesOf(shape)), damage(found) {}
 
 Listing Table::listing(size_t column) const {
     const Statement query = Prepared(storage.db(), "SELECT listing FROM " + storage.table("logs_columns") +
@@ -244,15 +248,9 @@ Listing Table::listing(size_t column) const {
     return listing == 0 ? Listing::No : listing == 1 ? Listing::Yes : Listing::Sorted;
 }
 
-void Table::report(int64_t key, const char* what) {
-    if (reported.insert(key).second) {
-        syslog(LOG_ERR, "archive %s: the block of the ids from %lld on is damaged (%s); its rows are left out",
-               sqlite3_db_filename(storage.db(), storage.schema().c_str()), static_cast<long long>(key), what);
-    }
-}
-
-int Register(sqlite3* db) {
-    return sqlite3_create_module_v2(db, kModule, &kMethods, nullptr, nullptr);
+int Register(sqlite3* db, Damage damage) {
+    void* mark = damage == Damage::IsLeftOut ? const_cast<char*>(&kLeftOut) : nullptr;
+    return sqlite3_create_module_v2(db, kModule, &kMethods, mark, nullptr);
 }
 
 // Read through the open file: to open and close it once more would drop this process's locks on it.

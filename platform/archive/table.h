@@ -4,7 +4,6 @@
 
 #include <sqlite3.h>
 
-#include <set>
 #include <string>
 
 #include "platform/archive/question.h"
@@ -13,19 +12,20 @@
 
 namespace quor::archive {
 
+// What a damaged block does to a statement that needs it.
+enum class Damage { Fails, IsLeftOut };
+
 // What is found below the name of its module: see table.cpp for what SQLite calls.
 struct Table : sqlite3_vtab {
-    Table(sqlite3* db, const std::string& schema, Shape columns);
+    Table(sqlite3* db, const std::string& schema, Shape columns, Damage found);
 
     Listing listing(size_t column) const;
-    // Names a damaged block in the system log, once.
-    void report(int64_t key, const char* what);
 
     Storage storage;
     Shape shape;
     Remover remover;
     Keepsake keepsake;
-    std::set<int64_t> reported;
+    Damage damage;
 };
 
 // One walk over the rows that a question asks for.
@@ -66,7 +66,7 @@ class Cursor : public sqlite3_vtab_cursor {
 };
 
 // Makes archives readable on a connection; a status of SQLite's.
-int Register(sqlite3* db);
+int Register(sqlite3* db, Damage damage = Damage::Fails);
 // Whether the file behind a fresh connection is one.
 bool IsArchive(sqlite3* db);
 

@@ -62,11 +62,13 @@ TEST(Text, WrapsAtWords) {
 TEST(Text, FitsScreensOfAnyWidth) {
     const std::string wide = "\u65e5\u672c\U0001f469\u200d\U0001f469\u200d\U0001f467\u2764\ufe0f";
     const std::string mixed = "e\u0301\u05e9\u05dc\u05d5\u05dd \\x1b[2J " + wide;
+    std::string longer = mixed + mixed + mixed;
+    longer.append(" ").append(mixed).append(60, ' ').append(mixed);
     const Columns columns = {{"id", Kind::Number}, {"host"}, {"level"}, {"message"}, {"advice"}};
     for (size_t screen = 12; screen < 130; ++screen) {
         Layout layout(columns, screen);
-        for (const std::string& text : {std::string(), std::string("short"), std::string(300, 'x'), wide, mixed,
-                                        mixed + mixed + mixed + " " + mixed + std::string(60, ' ') + mixed}) {
+        for (const std::string& text :
+             {std::string(), std::string("short"), std::string(300, 'x'), wide, mixed, longer}) {
             Line line(columns.size());
             for (Cell& cell : line) {
                 cell.width = AppendVisible(cell.text, text);

@@ -40,25 +40,24 @@ CLI::IsMember namesOf(const std::array<const char*, 4>& names) {
     return CLI::IsMember(std::vector<std::string>(names.begin(), names.end()));
 }
 
-// An empty value is a slip, of a script mostly: left out, it would mean every row.
-CLI::Option* refuseEmpty(CLI::Option* option) {
-    return option->each([option](const std::string& value) {
-        if (value.empty()) {
-            throw Failure(option->get_name() + ": the value is empty; leave the option out, or give one");
-        }
-    });
-}
-
 void addList(CLI::App& command, const std::string& name, store::Names& value, const std::string& help) {
     AddListOption(command, name, value, help)->group("Filters");
 }
 
 CLI::Option* addFilter(CLI::App& command, const std::string& name, std::string& value, const std::string& type,
                        const std::string& help) {
-    return refuseEmpty(command.add_option(name, value, help)->type_name(type)->group("Filters"));
+    return RefuseEmpty(command.add_option(name, value, help)->type_name(type)->group("Filters"));
 }
 
 }  // namespace
+
+CLI::Option* RefuseEmpty(CLI::Option* option) {
+    return option->each([option](const std::string& value) {
+        if (value.empty()) {
+            throw Failure(option->get_name() + ": the value is empty; leave the option out, or give one");
+        }
+    });
+}
 
 Style OutputOptions::style() const {
     Style style;
@@ -139,7 +138,7 @@ CLI::Option* AddListOption(CLI::App& command, const std::string& name, store::Na
         value = given;
         return true;
     };
-    return refuseEmpty(command.add_option(name, take, help)->type_name("NAMES")->take_all());
+    return RefuseEmpty(command.add_option(name, take, help)->type_name("NAMES")->take_all());
 }
 
 void AddYesOption(CLI::App& command, bool& yes) {

@@ -31,6 +31,8 @@ void AddTableOption(CLI::App& command, std::string& table);
 // `lenient`: as in store::FilterOptions; and regular expressions.
 void AddFilterOptions(CLI::App& command, store::FilterOptions& filters, bool lenient);
 void AddOutputOptions(CLI::App& command, OutputOptions& output);
+// An empty value is a slip, of a script mostly: left out, it would mean every row.
+CLI::Option* RefuseEmpty(CLI::Option* option);
 // An option that may be given several times.
 CLI::Option* AddListOption(CLI::App& command, const std::string& name, store::Names& value, const std::string& help);
 void AddYesOption(CLI::App& command, bool& yes);

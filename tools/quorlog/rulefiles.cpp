@@ -1,9 +1,13 @@
 #include "tools/quorlog/rulefiles.h"
 
+#include <fcntl.h>
+#include <sys/file.h>
+
 #include <algorithm>
 #include <cerrno>
 #include <csignal>
 #include <cstring>
+#include <filesystem>
 
 #include "base/paths.h"
 #include "base/sectionlines.h"
@@ -47,6 +51,12 @@ void changeSection(const std::string& name, Change change) {
 }
 
 }  // namespace
+
+// Who may not read the folder may not write it either, and hears so then.
+RulesLock::RulesLock()
+    : folder_(open(std::filesystem::path(kFile).parent_path().c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC)) {
+    (void)flock(folder_.get(), LOCK_EX);
+}
 
 std::vector<std::string> NotifyRuleNames() {
     StringList list(QLIBCSzListAlloc(16));

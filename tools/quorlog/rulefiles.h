@@ -7,6 +7,7 @@
 #include <string>
 #include <vector>
 
+#include "base/guards.h"
 #include "notification.h"
 #include "rules/rule.h"
 
@@ -16,6 +17,15 @@ using NotifyRule = _SYSLOG_NOTIFY_RULES_tag;
 
 enum NotifyType : int32_t { kSeverity = 0, kEps = 1, kKeyword = 2 };
 constexpr std::array<const char*, 3> kNotifyTypeNames = {"severity", "eps", "keyword"};
+
+// One change at a time, from reading the rules to writing them; waits for the one before.
+class RulesLock {
+  public:
+    RulesLock();
+
+  private:
+    Descriptor folder_;
+};
 
 std::vector<std::string> NotifyRuleNames();
 bool IsNotifyRule(const std::string& name);

@@ -9,6 +9,8 @@
 #include <csignal>
 #include <cstdlib>
 #include <cstring>
+#include <filesystem>
+#include <vector>
 
 #include "base/guards.h"
 #include "store/ask.h"
@@ -20,7 +22,11 @@ namespace quor::cli {
 
 using store::Failure;
 
-Draft::Draft(std::string target) : target_(std::move(target)), path_(target_ + ".XXXXXX") {
+namespace {
+constexpr const char kDraft[] = ".draft-";
+}
+
+Draft::Draft(std::string target) : target_(std::move(target)), path_(target_ + kDraft + "XXXXXX") {
     if (!Descriptor(mkstemp(path_.data()))) {
         throw Failure("cannot write " + target_ + ": " + strerror(errno) + "; give another file", store::Cause::Denied);
     }
@@ -30,6 +36,21 @@ Draft::~Draft() {
     (void)unlink(path_.c_str());
     (void)unlink((path_ + "-journal").c_str());
     store::RemoveCompanions(path_);
+}
+
+void RemoveDrafts(const std::string& target) {
+    const std::filesystem::path path(target);
+    const std::string begin = path.filename().string() + kDraft;
+    std::error_code none;
+    std::vector<std::filesystem::path> left;
+    for (const auto& entry : std::filesystem::directory_iterator(path.parent_path(), none)) {
+        if (entry.path().filename().string().rfind(begin, 0) == 0 && entry.is_regular_file(none)) {
+            left.push_back(entry.path());
+        }
+    }
+    for (const auto& draft : left) {
+        (void)unlink(draft.c_str());
+    }
 }
 
 void Draft::finish() const {

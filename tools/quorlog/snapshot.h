@@ -23,6 +23,9 @@ class Draft {
     std::string path_;
 };
 
+// Those of the target that a program left which was killed. Nobody else may be making one.
+void RemoveDrafts(const std::string& target);
+
 // Copies the database into the draft, without the space that deleted rows left. A signal ends that, and nothing else.
 // The exit status, and what failed on standard error.
 int CopyDatabase(const std::string& db, const std::string& draft);

@@ -30,7 +30,7 @@ typedef int (*QUORARCHIVEPROGRESS)(unsigned long long done, unsigned long long r
 
 /* Every int result: 0 on success; negative, with `report->error` set, otherwise. `progress` and `report` may be null.
  * A new file is written beside its place as "FILE.partial", forced to the disk and then renamed, so that it is whole
- * or not there; what an earlier try left of it is written over. It must not exist. */
+ * or not there. Neither may exist: what an earlier try left is to be removed first. */
 
 /* Writes the log database `source` as an archive, reads it back and compares. The source is only read; it may be in
  * use. */

@@ -6,6 +6,7 @@
 #include <cstdio>
 #include <filesystem>
 #include <iostream>
+#include <optional>
 
 #include "base/paths.h"
 #include "quor/quorarchive.h"
@@ -23,6 +24,7 @@ namespace fs = std::filesystem;
 struct ArchiveOptions {
     std::string archive;
     std::string source;
+    std::optional<std::string> compared;
     std::string target;
     OutputOptions output;
 };
@@ -53,7 +55,7 @@ void setupList(CLI::App& command, ArchiveOptions& options) {
 
 void setupVerify(CLI::App& command, ArchiveOptions& options) {
     addArchive(command, options);
-    command.add_option("source", options.source, "The log database that it was made of, to compare all rows")
+    command.add_option("source", options.compared, "The log database that it was made of, to compare all rows")
         ->type_name("PATH");
 }
 
@@ -198,7 +200,7 @@ int runList(const ArchiveOptions& options) {
 
 int runVerify(const ArchiveOptions& options) {
     const std::string archive = store::RequireLogDatabase(options.archive);
-    const std::string source = options.source.empty() ? "" : store::RequireLogDatabase(options.source);
+    const std::string source = options.compared ? store::RequireLogDatabase(*options.compared) : "";
     QUORARCHIVE report;
     {
         const Watch watch;

@@ -9,6 +9,7 @@
 #include "dbhandler.h"
 #include "store/ask.h"
 #include "store/databasefile.h"
+#include "store/merge.h"
 #include "tools/quorlog/commands/commands.h"
 #include "tools/quorlog/deeds.h"
 #include "tools/quorlog/messages.h"
@@ -46,10 +47,24 @@ void setupLimit(CLI::App& command, CareOptions& options) {
                   store::Cause::Damaged);
 }
 
+// The pages of an archive may be sound, and what is in them not.
+void requireReadableRows(const std::string& db) {
+    if (store::Ask(db, "SELECT 1 FROM sqlite_schema WHERE name = 'logs' AND sql LIKE 'CREATE VIRTUAL%'", "1").empty()) {
+        return;
+    }
+    std::string counts;
+    for (const store::StoredColumn& column : store::StoredColumns(db)) {
+        counts += (counts.empty() ? "SELECT count(" : ", count(") + column.name + ")";
+    }
+    (void)store::Ask(db, counts + " FROM logs", "");
+}
+
 std::vector<std::string> findings(const std::string& db, bool full) {
     const char* check = full ? "integrity_check" : "quick_check";
     try {
-        return store::Ask(db, std::string("PRAGMA ") + check, check);
+        std::vector<std::string> found = store::Ask(db, std::string("PRAGMA ") + check, check);
+        requireReadableRows(db);
+        return found;
     } catch (const Failure& failure) {
         if (failure.cause() != store::Cause::Damaged) {
             throw;

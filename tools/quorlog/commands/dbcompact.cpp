@@ -46,6 +46,7 @@ int report(const store::Exchanged& done, const std::string& db, uint64_t before)
 int run(const CompactOptions& options) {
     const std::string db = store::RequireReplaceable(store::RequireLogDatabase(options.db));
     const store::FolderLock alone(db);
+    RemoveDrafts(db);
     store::RequireSoundLogs(db);
     const uint64_t before = store::WholeSizeOf(db);
     const uint64_t free = store::FreeBytes(db);

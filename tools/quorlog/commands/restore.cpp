@@ -69,6 +69,7 @@ int run(const RestoreOptions& options) {
         return kNothing;
     }
     const store::FolderLock alone(db);
+    RemoveDrafts(db);
     store::RequireRoom(std::filesystem::path(db).parent_path(), store::WholeSizeOf(backup), "the restored database",
                        "make room there");
     const Draft draft(db);
@@ -77,6 +78,7 @@ int run(const RestoreOptions& options) {
         return kFailed;
     }
     store::RequireSoundLogs(draft.path());  // the backup may be another file by now
+    store::RequireWritableLogs(draft.path());
     const store::Exchanged done = Exchange(draft.path(), db, "before-restore", store::Fill::Nothing, true);
     RecordDeed("Restored " + db + " from " + backup +
                (done.aside.empty() ? "" : "; the former database is " + done.aside));

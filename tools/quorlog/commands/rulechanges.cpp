@@ -89,6 +89,7 @@ void tell(const std::string& name, const std::string& type, const std::string& t
 // ---- rules.conf
 
 int runRule(const ChangeOptions& options, RuleKind kind) {
+    const RulesLock alone;
     CheckRuleName(options.name);
     if (IsNotifyRule(options.name)) {
         throw Failure("rule '" + options.name +
@@ -101,6 +102,9 @@ int runRule(const ChangeOptions& options, RuleKind kind) {
     if (rule.kind != kind) {
         throw Failure("rule '" + options.name + "' is of kind " + rules::kKindNames[static_cast<size_t>(rule.kind)] +
                       "; give another name, or delete it first");
+    }
+    if (options.eps != 0) {
+        throw Failure("--eps: rule '" + options.name + "' is not for the rate of all logs; give another name");
     }
     for (const auto& [key, text] : options.given) {
         rules::FieldOf(kind, key)->set(rule, text, "--" + key);
@@ -176,6 +180,7 @@ bool isLoaded(const std::string& name) {
 }
 
 int runPlain(const ChangeOptions& options) {
+    const RulesLock alone;
     checkTexts(options);
     const std::optional<NotifyRule> known = IsNotifyRule(options.name) ? LoadNotifyRule(options.name) : std::nullopt;
     if (!known && options.given.empty() && options.eps == 0) {

@@ -86,6 +86,7 @@ rules::Rule requireRule(const std::string& name) {
 }
 
 int runDelete(const NameOptions& options) {
+    const RulesLock alone;
     if (IsNotifyRule(options.name)) {
         RemoveNotifyRule(options.name);
     } else {
@@ -98,6 +99,7 @@ int runDelete(const NameOptions& options) {
 }
 
 int runRename(const NameOptions& options) {
+    const RulesLock alone;
     CheckRuleName(options.newName);
     const bool notify = IsNotifyRule(options.name);
     std::optional<rules::Rule> rule = notify ? std::nullopt : std::optional(requireRule(options.name));
@@ -126,6 +128,7 @@ void enableNotifyRule(const std::string& name, bool enable) {
 }
 
 int enable(const std::string& name, bool enable) {
+    const RulesLock alone;
     if (IsNotifyRule(name)) {
         enableNotifyRule(name, enable);
     } else {

@@ -40,18 +40,20 @@ void setup(CLI::App& command, StatsOptions& options) {
 }
 
 void setupDevice(CLI::App& command, StatsOptions& options) {
-    command.add_option("device", options.device, "Name of the device, as in the column host")
+    RefuseEmpty(command.add_option("device", options.device, "Name of the device, as in the column host"))
         ->type_name("NAME")
         ->required();
     setup(command, options);
 }
 
 void addSpan(CLI::App& command, StatsOptions& options, const std::string& last) {
-    CLI::Option* span = command.add_option("--last", options.last, last)->type_name("SPAN");
-    command.add_option("--from,--since", options.from, "First day or second: 6h, 10:00, today, YYYY-MM-DD")
+    CLI::Option* span = RefuseEmpty(command.add_option("--last", options.last, last))->type_name("SPAN");
+    RefuseEmpty(command.add_option("--from,--since", options.from, "First day or second: 6h, 10:00, today, YYYY-MM-DD"))
         ->type_name("TIME")
         ->excludes(span);
-    command.add_option("--to,--until", options.to, "Last day or second, inclusive")->type_name("TIME")->excludes(span);
+    RefuseEmpty(command.add_option("--to,--until", options.to, "Last day or second, inclusive"))
+        ->type_name("TIME")
+        ->excludes(span);
 }
 
 void setupTop(CLI::App& command, StatsOptions& options) {
@@ -63,9 +65,8 @@ void setupTop(CLI::App& command, StatsOptions& options) {
 void setupEps(CLI::App& command, StatsOptions& options) {
     setup(command, options);
     addSpan(command, options, "How far to look back: 90s, 10m, 6h, 1d; 10m by default");
-    command
-        .add_option("--every", options.every,
-                    "Put samples together: 10s, 1m, 1h; by itself on a terminal when there are many")
+    RefuseEmpty(command.add_option("--every", options.every,
+                                   "Put samples together: 10s, 1m, 1h; by itself on a terminal when there are many"))
         ->type_name("SPAN");
 }
 
