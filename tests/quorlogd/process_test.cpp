@@ -416,7 +416,7 @@ TEST_F(QuorlogdProcess, AnnouncesWhoHoldsTheConnectionsOfAPort) {
     ASSERT_TRUE(daemon.started());
     usleep(1500000);
     EXPECT_EQ(events(), Strings{});
-    for (const size_t count : {9, 7, 9}) {  // told once
+    for (const size_t count : {9U, 7U, 9U}) {  // told once
         hold(count);
         usleep(1500000);
     }
